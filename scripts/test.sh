@@ -1,0 +1,25 @@
+#!/usr/bin/env bash
+# Installs what is missing, builds, and runs every test: the fuzz targets for a short smoke
+# time under AddressSanitizer, then the whole CTest suite under Xvfb (the display tests need
+# an X server; one is started here when there is none).
+set -euo pipefail
+cd "$(dirname "$0")/.."
+
+./scripts/install-deps.sh
+./scripts/build.sh
+
+# Tests write nothing into the home folder, and settings start empty.
+scratch=$(mktemp -d)
+trap 'rm -rf "$scratch"' EXIT
+mkdir -m 700 "$scratch/runtime"
+mkdir -p "$scratch/config" "$scratch/cache"
+export XDG_RUNTIME_DIR="$scratch/runtime" XDG_CONFIG_HOME="$scratch/config" XDG_CACHE_HOME="$scratch/cache"
+
+./scripts/fuzz.sh "${LUMEK_FUZZ_SECONDS:-10}"
+
+ctest_args=(--test-dir "${BUILD_DIR:-build}" --output-on-failure -j "$(nproc)")
+if [ -n "${DISPLAY:-}" ]; then
+  ctest "${ctest_args[@]}"
+else
+  xvfb-run -a -s "-screen 0 1920x1080x24 -nolisten tcp" ctest "${ctest_args[@]}"
+fi

@@ -1,0 +1,1 @@
+#include "utils/UtilsFileSystem/LongPath.h"

@@ -1,0 +1,1 @@
+#include "utils/UtilsIO/VLargeFile.h"

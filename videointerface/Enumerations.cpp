@@ -1,0 +1,1 @@
+#include "videointerface/Enumerations.h"
