@@ -1,0 +1,45 @@
+#include "app/CommandLine/CommandLine.h"
+
+#include <boost/program_options.hpp>
+
+namespace po = boost::program_options;
+
+namespace LumekVideoViewer
+{
+  int ParseCommandLine( int i_ArgumentCount, const char* const* i_pArguments, const std::string& i_rDefaultServer,
+                        VCommandLine& o_rCommandLine, std::ostream& io_rErrors )
+  {
+    // The table is never printed: no option prints it.
+    po::options_description Options( 80, 40 );
+    const std::string ServerDescription = "Version check server - default is \"" + i_rDefaultServer + "\"";
+    Options.add_options()( "developer", "Enable developer mode" )(
+        "version-server", po::value< std::string >()->default_value( i_rDefaultServer ), ServerDescription.c_str() )(
+        "spoof-version", po::value< std::string >()->default_value( "" ),
+        "Spoof the version (testing only). e.g. \"0.3.0.55914h\"" )(
+        "input-file", po::value< std::string >()->default_value( "" ), "input file" );
+    po::positional_options_description Positional;
+    Positional.add( "input-file", -1 );
+
+    po::variables_map Variables;
+    try
+    {
+      po::store( po::command_line_parser( i_ArgumentCount, i_pArguments ).options( Options ).positional( Positional ).run(),
+                 Variables );
+      po::notify( Variables );
+    }
+    catch( const std::exception& rException )
+    {
+      io_rErrors << "Error parsing command line: " << rException.what() << std::endl;
+      io_rErrors << "Use --help for more information." << std::endl;
+      return CommandLineErrorExitCode;
+    }
+
+    // The map's keys have no dashes, so this is false in every run: developer mode is kept out of
+    // reach of the command line although the option is accepted.
+    o_rCommandLine.bDeveloper = Variables.count( "--developer" ) != 0;
+    o_rCommandLine.VersionServer = Variables[ "version-server" ].as< std::string >();
+    o_rCommandLine.SpoofVersion = Variables[ "spoof-version" ].as< std::string >();
+    o_rCommandLine.InputFile = Variables[ "input-file" ].as< std::string >();
+    return 0;
+  }
+}

@@ -1,0 +1,75 @@
+#pragma once
+
+#include "videointerface/AttributeRecords.h"
+#include "videointerface/BufferAllocators.h"
+#include "videointerface/IVideoReader.h"
+
+#include <cstdint>
+#include <memory>
+#include <string>
+
+namespace ZOL
+{
+  class IH264Decoder;
+}
+
+namespace LumekVideoViewer
+{
+  // The one object between the user interface and the file. Every frame asked of it is read and
+  // decoded on the calling thread at the moment of the call: no timing, no caching, no prefetch.
+  // The command-line tool uses it too, so that it shows exactly what the viewer shows.
+  class VVideoSource
+  {
+  public:
+    VVideoSource();
+    ~VVideoSource();
+    VVideoSource( const VVideoSource& ) = delete;
+    VVideoSource& operator=( const VVideoSource& ) = delete;
+
+    // Picks a reader by the path's name alone and opens it; false when no reader takes the file.
+    bool Open( const std::string& i_rPath );
+    bool Close();
+    bool IsOpen() const { return m_pReader != nullptr; }
+
+    // Reads and decodes one frame. The record gets the frame's description and buffer also when
+    // decoding fails; false with no reader, or when the frame cannot be read or decoded.
+    bool GetFrame( std::uint64_t i_Index, ZOL::IVideoFrame& o_rFrame );
+
+    // These need an open file.
+    std::uint64_t GetFrameCount() const;
+    double GetFrameRate() const;
+    double GetDurationInSeconds() const;
+    std::string GetFrameTimecodeText( std::uint64_t i_Index ) const;
+
+    std::int32_t GetMissingFrameCount() const { return m_MissingFrames; }
+    const std::string& GetFilePath() const { return m_FilePath; }
+
+    // With no reader these answer from default records.
+    ZOL::EAudioPayload GetAudioPayload() const;
+    ZOL::EVideoPayload GetVideoPayload() const;
+    const ZOL::IAudioFrameInfo& GetAudioFrameInfo() const;
+    const ZOL::IVideoFrameInfo& GetVideoFrameInfo() const;
+    const ZOL::IVideoSettings& GetVideoSettings() const;
+    const ZOL::IVideoAttributes& GetAttributes() const;
+    const ZOL::IVideoTiming& GetVideoTiming() const;
+    const ZOL::ITimecode& GetTimecode() const;
+
+    const CoreLumekTypes::VLensDistortionCalibration& GetLensDistortionCalibration() const { return m_Lens; }
+    const CoreLumekTypes::VCameraHardware& GetCameraHardware() const { return m_Camera; }
+    // A lens model and a camera to place it on both came with the file.
+    bool HasLensDistortion() const;
+
+    // The open reader, for the command-line tool's structure dump; null when closed.
+    const std::shared_ptr< ZOL::IVideoReader >& GetReader() const { return m_pReader; }
+
+  private:
+    std::shared_ptr< ZOL::IVideoReader > m_pReader;
+    std::string m_FilePath;
+    std::int32_t m_MissingFrames = 0;
+    std::shared_ptr< ZOL::VFrameBufferAllocator > m_pFirstAllocator;
+    std::shared_ptr< ZOL::VFrameBufferAllocator > m_pSecondAllocator;
+    std::shared_ptr< ZOL::IH264Decoder > m_pH264Decoder;
+    CoreLumekTypes::VLensDistortionCalibration m_Lens;
+    CoreLumekTypes::VCameraHardware m_Camera;
+  };
+}
