@@ -1,1 +1,363 @@
 #include "videointerface/Enumerations.h"
+
+#include <unordered_map>
+
+namespace ZOL
+{
+  namespace
+  {
+    constexpr IEnumRow s_PixelFormatRows[] = {
+        { PixelFormat_Unspecified, "Unspecified", "" },
+        { PixelFormat_Luminance8, "Luminance8", "" },
+        { PixelFormat_BayerRG8, "BayerRG8", "" },
+        { PixelFormat_BayerGB8, "BayerGB8", "" },
+        { PixelFormat_BayerGR8, "BayerGR8", "" },
+        { PixelFormat_BayerBG8, "BayerBG8", "" },
+        { PixelFormat_R5G6B5, "R5G6B5", "" },
+        { PixelFormat_R8G8B8, "R8G8B8", "" },
+        { PixelFormat_B8G8R8, "B8G8R8", "" },
+        { PixelFormat_R8G8B8u8, "R8G8B8u8", "" },
+        { PixelFormat_B8G8R8u8, "B8G8R8u8", "" },
+        { PixelFormat_U8Y8V8Y8, "U8Y8V8Y8", "" },
+        { PixelFormat_Y8U8Y8V8, "Y8U8Y8V8", "" },
+        { PixelFormat_U10Y10V10Y10, "U10Y10V10Y10", "" },
+        { PixelFormat_BayerGB7, "BayerGB7", "" },
+        { PixelFormat_BayerGB6, "BayerGB6", "" },
+        { PixelFormat_Luminance7, "Luminance7", "" },
+        { PixelFormat_Luminance6, "Luminance6", "" },
+        { PixelFormat_PlanarY8U8V8, "PlanarY8U8V8", "" },
+        { PixelFormat_PlanarR8G8B8, "PlanarR8G8B8", "" },
+    };
+
+    constexpr IEnumRow s_VideoPayloadRows[] = {
+        { VideoPayload_None, "None", "No video present." },
+        { VideoPayload_Uncompressed, "Uncompressed",
+          "Uncompressed data.  Pixel format must be given with ZOL::IPixelFormat." },
+        { VideoPayload_ImageJPEG, "ImageJPEG", "Image sequence of JPEG with complete headers." },
+        { VideoPayload_ImagePNG, "ImagePNG", "Image sequence of PNG." },
+        { VideoPayload_ImageTIFF, "ImageTIFF", "Image sequence of TIFF." },
+        { VideoPayload_VideoH264, "VideoH264", "Video compressed as H.264." },
+    };
+
+    constexpr IEnumRow s_AudioPayloadRows[] = {
+        { AudioPayload_None, "None", "No audio present." },
+        { AudioPayload_Uncompressed, "Uncompressed",
+          "Uncompressed data.  Pixel format must be given with ZOL::ISampleFormat." },
+        { AudioPayload_LosslessFLAC, "LosslessFLAC", "Lossless encoding with FLAC." },
+    };
+
+    // Row order and numbers differ on purpose (UInt8 is 7, Float32 is 6): files store the
+    // names and code compares the numbers, so neither order may be "tidied" into the other.
+    constexpr IEnumRow s_AudioSampleFormatRows[] = {
+        { AudioSampleFormat_Unspecified, "Unspecified", "Unspecified sample format." },
+        { AudioSampleFormat_Int8, "Int8", "8-bit signed integer sample (-128 to 127)." },
+        { AudioSampleFormat_Int16, "Int16", "16-bit signed integer sample (-32768 to 32767)." },
+        { AudioSampleFormat_Int24, "Int24", "24-bit signed integer sample (-8388608 to 8388607)." },
+        { AudioSampleFormat_Int32, "Int32", "32-bit signed integer sample (-2147483648 to 2147483647)." },
+        { AudioSampleFormat_UInt8, "UInt8", "8-bit unsigned integer sample (0 to 255)." },
+        { AudioSampleFormat_UInt16, "UInt16", "16-bit unsigned integer sample (0 to 65535)." },
+        { AudioSampleFormat_UInt24, "UInt24", "24-bit unsigned integer sample (0 to 16777216)." },
+        { AudioSampleFormat_UInt32, "UInt32", "32-bit unsigned integer sample (0 to 4294967296)." },
+        { AudioSampleFormat_Float32, "Float32", "IEEE floating point sample (using full range)." },
+    };
+
+    constexpr IEnumRow s_InterlacedFormatRows[] = {
+        { InterlacedFormat_Unspecified, "Unspecified", "" },
+        { InterlacedFormat_NotInterlaced, "NotInterlaced", "" },
+        { InterlacedFormat_InterlacedFrameEvenOlder, "InterlacedFrameEvenOlder", "" },
+        { InterlacedFormat_InterlacedFrameOddOlder, "InterlacedFrameOddOlder", "" },
+        { InterlacedFormat_InterlacedFrameUnspecifiedLineTiming, "InterlacedFrameUnspecifiedLineTiming", "" },
+    };
+
+    constexpr IEnumRow s_VideoContainerRows[] = {
+        { VideoContainer_MOV, "MOV", "Apple QuickTime container format (*.mov, *.moov)" },
+        { VideoContainer_MP4, "MP4", "MPEG4 container based on Apple QuickTime (*.mp4)" },
+        { VideoContainer_AVI, "AVI",
+          "Container developed by Microsoft and used for VideoForWindows/DirectShow (*.avi)" },
+        { VideoContainer_LVID, "LVID", "Lumek video container (*.lvid)" },
+        { VideoContainer_MKV, "MKV", "Matroska container (*.mkv, *.mka)" },
+        { VideoContainer_IMAGES, "IMAGES",
+          "Sequence of image files in directory containing attributes file (*.lumekimagesequence)" },
+    };
+
+    constexpr IEnumRow s_RadialModelRows[] = {
+        { RadialModel_Lumek2Parameter, "Lumek2Parameter", "" },
+        { RadialModel_Lumek3Parameter, "Lumek3Parameter", "" },
+        { RadialModel_Lumek0Parameter, "Lumek0Parameter", "" },
+        { RadialModel_BadRadialModel, "BadRadialModel", "" },
+    };
+
+    template < std::size_t Count >
+    constexpr IEnumTable MakeTable( const char* i_pName, const char* i_pDescription,
+                                    const IEnumRow ( &i_rRows )[Count] )
+    {
+      return IEnumTable{ i_pName, i_pDescription, i_rRows, Count };
+    }
+
+    constexpr IEnumTable s_PixelFormatTable = MakeTable( "PixelFormat.Enum", "Enumeration.", s_PixelFormatRows );
+    constexpr IEnumTable s_VideoPayloadTable =
+        MakeTable( "VideoPayload.Enum", "Enumeration of payload types.", s_VideoPayloadRows );
+    constexpr IEnumTable s_AudioPayloadTable =
+        MakeTable( "AudioPayload.Enum", "Enumeration of payload types.", s_AudioPayloadRows );
+    constexpr IEnumTable s_AudioSampleFormatTable = MakeTable( "AudioSampleFormat.Enum", "", s_AudioSampleFormatRows );
+    constexpr IEnumTable s_InterlacedFormatTable = MakeTable( "InterlacedFormat.Enum", "", s_InterlacedFormatRows );
+    constexpr IEnumTable s_VideoContainerTable =
+        MakeTable( "VideoContainer.Enum", "Enumeration of container formats.", s_VideoContainerRows );
+    constexpr IEnumTable s_RadialModelTable =
+        MakeTable( "LensDistortionCalibration.ERadialModel", "Possible lens model types", s_RadialModelRows );
+
+    constexpr char s_ImageSequenceExtension[] = "lumekimagesequence";
+
+    // The extension column of the container table, indexed by container value.
+    constexpr const char* s_ContainerExtensions[] = { "mov", "mp4", "avi", "lvid", "mkv", s_ImageSequenceExtension };
+
+    struct VResultRow
+    {
+      ResultCode Code;
+      const char* Message;
+    };
+
+    constexpr VResultRow s_ResultRows[] = {
+        { 0x0, "Ok: The function succeeded" },
+        { 0x1, "OkButNoEffect: The function succeeded but had no effect" },
+        { 0x2, "OkButPartial: The function succeeded but was only partially applicable" },
+        { 0x3, "OkButFinished: Successfully finished - no further operation possible" },
+        { 0x4, "OkButModified: The function succeeded but one or more values or parameters were modified" },
+        { 0x80000000u, "Failed: The function failed" },
+        { 0x80000001u, "FailedWithException: The function generated an exception" },
+        { 0x80000002u, "Finished: The service requested has finished" },
+        { 0x80000003u, "Stopping: The service requested is stopping" },
+        { 0x80000004u, "NotImplemented: The function is not implemented in this version" },
+        { 0x80000005u, "NotSupported: The function is not supported" },
+        { 0x80000006u, "NotPermitted: The function is not permitted at this time" },
+        { 0x80000007u, "NotAvailable: The information requested was not available" },
+        { 0x80000008u, "NotConnected: The required connection is not present" },
+        { 0x80000009u, "NotSet: The requested information has not been set" },
+        { 0x8000000Au, "NotFound: The requested information, instance or type was not found" },
+        { 0x8000000Bu, "NotRequired: The action requested is not necessary" },
+        { 0x8000000Cu, "AlreadyPresent: The data or item being set was already present" },
+        { 0x8000000Du, "AlreadyInProgress: The operation requested is already in progress" },
+        { 0x8000000Eu, "AlreadySet: The data or item being set is already set" },
+        { 0x8000000Fu, "InvalidArgument: A supplied argument was invalid" },
+        { 0x80000010u, "InvalidIndex: A supplied index was invalid or out of range" },
+        { 0x80000011u, "InvalidName: A supplied name was invalid or unrecognized" },
+        { 0x80000012u, "InvalidId: A supplied id was invalid or unrecognized" },
+        { 0x80000013u, "InvalidHandle: A supplied handle was invalid" },
+        { 0x80000014u, "InvalidToken: A supplied token was invalid" },
+        { 0x80000015u, "InvalidPointer: A supplied pointer was invalid" },
+        { 0x80000016u, "InvalidFormat: The data provided or requested was not in the expected format" },
+        { 0x80000017u, "InvalidType: An incorrect type was provided" },
+        { 0x80000018u, "InvalidVersion: An object or file was the wrong version" },
+        { 0x80000019u, "InvalidSession: The session specified was not valid" },
+        { 0x8000001Au, "InvalidInfo: The information supplied was not valid" },
+        { 0x8000001Bu, "InvalidValue: A value supplied was not valid" },
+        { 0x8000001Cu, "InvalidSettings: The settings supplied were not valid" },
+        { 0x8000001Du, "ProtocolFailure: A protocol error was detected" },
+        { 0x8000001Eu, "NetworkFailure: A network error occurred" },
+        { 0x8000001Fu, "AllocationFailure: Failed to allocate memory or item" },
+        { 0x80000020u, "SerialisationFailure: Failed during serialization/deserialization of data" },
+        { 0x80000021u, "FileIOFailure: An operation to read or write a file failed" },
+        { 0x80000022u, "TimedOut: The operation timed out" },
+        { 0x80000023u, "WouldBlock: The operation failed as it would have had to block" },
+        { 0x80000024u, "EndOfData: The operation failed as the end of a data stream has been reached" },
+        { 0x80000025u, "Conflict: The operation detected a conflict" },
+        { 0x80000026u, "FileNotOpen: The file is not open or could not be opened" },
+        { 0x80000027u, "ShuttingDown: The operation failed because the component is shutting down" },
+        { 0x80000028u, "DiskFull: No space left on device" },
+        { 0x80000029u, "Canceled: The operation has been canceled" },
+        { 0x8000002Au, "FileNotFound: The file does not exist or is unreadable" },
+        { 0x80010000u, "RPCUnknown: The specified remote function or callback is not known" },
+        { 0x80010001u, "RPCFailed: The remote function or callback invocation could not be invoked" },
+        { 0x80010002u, "RPCInvalid: The remote function or callback invocation was badly formed or otherwise invalid" },
+        { 0x80010003u, "RPCNotConnected: The connection to the remote function or callback is not open" },
+        { 0x40000u, "Upload in progress" },
+        { 0x40001u, "Download in progress" },
+        { 0x40002u, "Bundle installing" },
+        { 0x40003u, "IP address has changed" },
+        { 0x80040000u, "Bad bundle filename" },
+        { 0x80040001u, "Bundle in use" },
+        { 0x80040002u, "Bundle being modified" },
+        { 0x80040003u, "Bundle extraction failed" },
+        { 0x80040004u, "Failed to find capture information" },
+        { 0x80040005u, "Get capture error" },
+        { 0x80040006u, "Get capture write error" },
+        { 0x80040007u, "Bundle already installed" },
+    };
+    static_assert( sizeof( s_ResultRows ) / sizeof( s_ResultRows[0] ) == 64, "the result table has 64 rows" );
+
+    const IEnumRow* FindRow( const IEnumTable& i_rTable, std::uint32_t i_Value )
+    {
+      for( std::size_t i = 0; i < i_rTable.RowCount; ++i )
+        if( i_rTable.Rows[i].Value == i_Value )
+          return &i_rTable.Rows[i];
+      return nullptr;
+    }
+
+    template < typename E > bool FromTable( const IEnumTable& i_rTable, std::string_view i_Name, E& o_rValue )
+    {
+      const std::optional< std::uint32_t > Value = i_rTable.FromName( i_Name );
+      if( !Value )
+        return false;
+      o_rValue = static_cast< E >( *Value );
+      return true;
+    }
+  } // namespace
+
+  const char* IEnumTable::ToName( std::uint32_t i_Value, const char* i_pFallback ) const
+  {
+    const IEnumRow* pRow = FindRow( *this, i_Value );
+    return pRow ? pRow->Name : i_pFallback;
+  }
+
+  std::optional< std::string > IEnumTable::ToNameOptional( std::uint32_t i_Value ) const
+  {
+    const IEnumRow* pRow = FindRow( *this, i_Value );
+    if( pRow == nullptr )
+      return std::nullopt;
+    return std::string( pRow->Name );
+  }
+
+  std::optional< std::uint32_t > IEnumTable::FromName( std::string_view i_Name ) const
+  {
+    // Exact bytes and length: a file that says "bayerGB8" has no pixel format.
+    for( std::size_t i = 0; i < RowCount; ++i )
+      if( i_Name == std::string_view( Rows[i].Name ) )
+        return Rows[i].Value;
+    return std::nullopt;
+  }
+
+  const char* IEnumTable::ToDescription( std::uint32_t i_Value ) const
+  {
+    const IEnumRow* pRow = FindRow( *this, i_Value );
+    return pRow ? pRow->Description : "";
+  }
+
+  const IEnumTable& PixelFormatTable()
+  {
+    return s_PixelFormatTable;
+  }
+  const IEnumTable& VideoPayloadTable()
+  {
+    return s_VideoPayloadTable;
+  }
+  const IEnumTable& AudioPayloadTable()
+  {
+    return s_AudioPayloadTable;
+  }
+  const IEnumTable& AudioSampleFormatTable()
+  {
+    return s_AudioSampleFormatTable;
+  }
+  const IEnumTable& InterlacedFormatTable()
+  {
+    return s_InterlacedFormatTable;
+  }
+  const IEnumTable& VideoContainerTable()
+  {
+    return s_VideoContainerTable;
+  }
+  const IEnumTable& RadialModelTable()
+  {
+    return s_RadialModelTable;
+  }
+
+  const char* ToString( EPixelFormat i_Value, const char* i_pFallback )
+  {
+    return s_PixelFormatTable.ToName( i_Value, i_pFallback );
+  }
+  std::optional< std::string > ToStringOptional( EPixelFormat i_Value )
+  {
+    return s_PixelFormatTable.ToNameOptional( i_Value );
+  }
+  const char* ToString( EVideoPayload i_Value, const char* i_pFallback )
+  {
+    return s_VideoPayloadTable.ToName( i_Value, i_pFallback );
+  }
+  const char* ToString( EAudioPayload i_Value, const char* i_pFallback )
+  {
+    return s_AudioPayloadTable.ToName( i_Value, i_pFallback );
+  }
+  const char* ToString( EAudioSampleFormat i_Value, const char* i_pFallback )
+  {
+    return s_AudioSampleFormatTable.ToName( i_Value, i_pFallback );
+  }
+  const char* ToString( EInterlacedFormat i_Value, const char* i_pFallback )
+  {
+    return s_InterlacedFormatTable.ToName( i_Value, i_pFallback );
+  }
+  const char* ToString( EVideoContainer i_Value, const char* i_pFallback )
+  {
+    return s_VideoContainerTable.ToName( i_Value, i_pFallback );
+  }
+  const char* ToString( ERadialModel i_Value, const char* i_pFallback )
+  {
+    return s_RadialModelTable.ToName( i_Value, i_pFallback );
+  }
+
+  bool FromString( std::string_view i_Name, EPixelFormat& o_rValue )
+  {
+    return FromTable( s_PixelFormatTable, i_Name, o_rValue );
+  }
+  bool FromString( std::string_view i_Name, EVideoPayload& o_rValue )
+  {
+    return FromTable( s_VideoPayloadTable, i_Name, o_rValue );
+  }
+  bool FromString( std::string_view i_Name, EAudioPayload& o_rValue )
+  {
+    return FromTable( s_AudioPayloadTable, i_Name, o_rValue );
+  }
+  bool FromString( std::string_view i_Name, EAudioSampleFormat& o_rValue )
+  {
+    return FromTable( s_AudioSampleFormatTable, i_Name, o_rValue );
+  }
+  bool FromString( std::string_view i_Name, EInterlacedFormat& o_rValue )
+  {
+    return FromTable( s_InterlacedFormatTable, i_Name, o_rValue );
+  }
+  bool FromString( std::string_view i_Name, EVideoContainer& o_rValue )
+  {
+    return FromTable( s_VideoContainerTable, i_Name, o_rValue );
+  }
+  bool FromString( std::string_view i_Name, ERadialModel& o_rValue )
+  {
+    return FromTable( s_RadialModelTable, i_Name, o_rValue );
+  }
+
+  const char* const ImageSequenceExtension = s_ImageSequenceExtension;
+
+  const char* ContainerExtension( EVideoContainer i_Container )
+  {
+    constexpr std::size_t Count = sizeof( s_ContainerExtensions ) / sizeof( s_ContainerExtensions[0] );
+    return i_Container < Count ? s_ContainerExtensions[i_Container] : "";
+  }
+
+  int RadialModelParameterCount( ERadialModel i_Model )
+  {
+    switch( i_Model )
+    {
+    case RadialModel_Lumek2Parameter:
+      return 2;
+    case RadialModel_Lumek3Parameter:
+      return 3;
+    case RadialModel_Lumek0Parameter:
+      return 0;
+    default:
+      return -1;
+    }
+  }
+
+  const std::string& GetResultText( ResultCode i_Code )
+  {
+    // Built once; never changed afterwards, so lookups need no lock.
+    static const std::unordered_map< ResultCode, std::string > s_Texts = []
+    {
+      std::unordered_map< ResultCode, std::string > Texts;
+      for( const VResultRow& rRow : s_ResultRows )
+        Texts.emplace( rRow.Code, rRow.Message );
+      return Texts;
+    }();
+    static const std::string s_Unknown = "Unknown result code";
+    const auto It = s_Texts.find( i_Code );
+    return It != s_Texts.end() ? It->second : s_Unknown;
+  }
+} // namespace ZOL
