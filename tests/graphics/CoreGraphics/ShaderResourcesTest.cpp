@@ -1,0 +1,300 @@
+#include "graphics/Shaders/ShaderResources.h"
+#include "graphics/CoreGraphics/MurmurHash3.h"
+#include "graphics/CoreGraphics/VMesh.h"
+#include "graphics/CoreGraphics/VRenderContext.h"
+#include "graphics/CoreGraphics/VResources.h"
+#include "graphics/CoreGraphics/VShaderProgram.h"
+#include "services/Log.h"
+#include "tests/graphics/CoreGraphics/DisplayTestMain.h"
+
+#include <QDir>
+#include <QFile>
+#include <QImage>
+#include <QOffscreenSurface>
+#include <QOpenGLContext>
+#include <QOpenGLExtraFunctions>
+#include <QOpenGLFramebufferObject>
+#include <QOpenGLShaderProgram>
+#include <QTemporaryDir>
+
+#include <memory>
+#include <string>
+#include <vector>
+
+namespace
+{
+  using CoreGraphics::VResources;
+  using CoreGraphics::VShader;
+  using CoreGraphics::VShaderProgram;
+
+  // Collects what the "CoreGraphics" category logs while it lives.
+  class VLogCapture
+  {
+  public:
+    VLogCapture()
+    {
+      m_Handle = ZOL::GlobalLog().AddSink(
+          [this]( const ZOL::ILogRecord& i_rRecord )
+          {
+            if( i_rRecord.Category == "CoreGraphics" )
+              Messages.push_back( i_rRecord.Message );
+          },
+          ZOL::LogDetail );
+    }
+    ~VLogCapture() { ZOL::GlobalLog().RemoveSink( m_Handle ); }
+    bool Contains( const std::string& i_rText ) const
+    {
+      for( const std::string& rMessage : Messages )
+        if( rMessage.find( i_rText ) != std::string::npos )
+          return true;
+      return false;
+    }
+    std::vector< std::string > Messages;
+
+  private:
+    int m_Handle = 0;
+  };
+
+  class ShaderResourcesTest : public ::testing::Test
+  {
+  protected:
+    void SetUp() override
+    {
+      LUMEK_REQUIRE_DISPLAY();
+      Shaders::RegisterResources();
+      m_Surface.create();
+      ASSERT_TRUE( m_Context.create() );
+      ASSERT_TRUE( m_Context.makeCurrent( &m_Surface ) );
+    }
+    void TearDown() override
+    {
+      if( QOpenGLContext::currentContext() == &m_Context )
+        m_Context.doneCurrent();
+    }
+
+    QOffscreenSurface m_Surface;
+    QOpenGLContext m_Context;
+  };
+
+  const char* const VertexStages[] = { "ColoredLine",
+                                       "Simple",
+                                       "Simple3D",
+                                       "Simple3DModel",
+                                       "Simple3DModelColour",
+                                       "Simple3DModelWireframe",
+                                       "Simple3DPointSize",
+                                       "Simple3DUniformColour",
+                                       "Simple3DVertexColour",
+                                       "SimpleColour",
+                                       "Video" };
+  const char* const FragmentStages[] = { "Colour",         "ImageSet",      "SimpleLighting",
+                                         "StippledLine",   "UniformColour", "VideoBayer",
+                                         "VideoLuminance", "VideoRaw",      "VideoYUV" };
+
+  TEST_F( ShaderResourcesTest, EveryStageOfTheResourcesCompiles )
+  {
+    VLogCapture Log;
+    VResources Resources( false, QDir::currentPath() );
+    Resources.Load();
+
+    QStringList ExpectedVertex, ExpectedFragment;
+    for( const char* pName : VertexStages )
+      ExpectedVertex << pName;
+    for( const char* pName : FragmentStages )
+      ExpectedFragment << pName;
+    EXPECT_EQ( Resources.GetShaderNames( VShader::Kind_Vertex ), ExpectedVertex );
+    EXPECT_EQ( Resources.GetShaderNames( VShader::Kind_Fragment ), ExpectedFragment );
+    for( const char* pName : VertexStages )
+      EXPECT_TRUE( Resources.GetShader( VShader::Kind_Vertex, pName )->IsCompiled() ) << pName;
+    for( const char* pName : FragmentStages )
+      EXPECT_TRUE( Resources.GetShader( VShader::Kind_Fragment, pName )->IsCompiled() ) << pName;
+    EXPECT_FALSE( Log.Contains( "Failed" ) );
+  }
+
+  struct VProgramCase
+  {
+    const char* Vertex;
+    const char* Fragment;
+    std::vector< std::string > Uniforms;
+  };
+
+  class ProgramLinkTest : public ShaderResourcesTest, public ::testing::WithParamInterface< VProgramCase >
+  {
+  };
+
+  // The five programs of the viewer, and the general-purpose stages in the pairs they are written for.
+  TEST_P( ProgramLinkTest, LinksAndFindsItsUniformsByHash )
+  {
+    VResources Resources( false, QDir::currentPath() );
+    Resources.Load();
+    const VProgramCase& rCase = GetParam();
+    std::shared_ptr< VShaderProgram > pProgram = Resources.GetProgram( rCase.Vertex, rCase.Fragment );
+    ASSERT_TRUE( pProgram );
+    ASSERT_TRUE( pProgram->IsLinked() );
+    EXPECT_EQ( Resources.GetProgram( rCase.Vertex, rCase.Fragment ), pProgram ) << "a pair is linked once";
+
+    for( const std::string& rName : rCase.Uniforms )
+    {
+      const int Location = pProgram->UniformLocation( rName.c_str() );
+      EXPECT_GE( Location, 0 ) << rName;
+      EXPECT_EQ( pProgram->UniformLocationByHash( CoreGraphics::MurmurHash3_32( rName ) ), Location ) << rName;
+    }
+    EXPECT_EQ( pProgram->UniformLocation( "u_NotThere" ), -1 );
+    EXPECT_EQ( pProgram->UniformLocationByHash( CoreGraphics::MurmurHash3_32( "u_NotThere" ) ), -1 );
+  }
+
+  const VProgramCase ProgramCases[] = {
+      { "Video",
+        "VideoRaw",
+        { "u_View2D", "u_SensorSize", "u_RadialDistortionCentre", "u_RadialDistortionParameters", "u_Rotation",
+          "u_RotationCentre", "u_VideoScaleAndOffset", "u_Inverted", "t_DiffuseTexture", "u_Swizzle" } },
+      { "Video", "VideoBayer", { "t_DiffuseTexture", "u_Resolution", "u_FirstRed", "u_ColourCorrection" } },
+      { "Video", "VideoLuminance", { "t_DiffuseTexture", "u_Inverted" } },
+      { "Video", "VideoYUV", { "t_DiffuseTexture", "u_Swizzle", "u_Resolution" } },
+      { "Video", "UniformColour", { "u_colour", "u_View2D" } },
+      { "Video", "ImageSet", { "t_DiffuseTexture", "u_ColourTint" } },
+      { "Simple", "UniformColour", { "u_colour" } },
+      { "SimpleColour", "Colour", {} },
+      { "Simple3D", "UniformColour", { "u_ViewProjection", "u_colour" } },
+      { "Simple3DPointSize", "UniformColour", { "u_ViewProjection", "u_PointSize" } },
+      { "Simple3DUniformColour", "Colour", { "u_ViewProjection", "u_Colour" } },
+      { "Simple3DVertexColour", "Colour", { "u_ViewProjection" } },
+      { "Simple3DModel", "SimpleLighting", { "u_ViewProjection", "u_ModelTransform", "u_View", "u_Up" } },
+      { "Simple3DModelColour", "SimpleLighting", { "u_ModelTransform", "u_ModelColour" } },
+      { "Simple3DModelWireframe", "Colour", { "u_ViewProjection", "u_ModelTransform" } },
+      { "ColoredLine", "StippledLine", { "u_ViewProjection", "u_SourcePoint", "u_ModelColour" } },
+  };
+
+  INSTANTIATE_TEST_SUITE_P( Resources, ProgramLinkTest, ::testing::ValuesIn( ProgramCases ),
+                            []( const ::testing::TestParamInfo< VProgramCase >& i_rInfo )
+                            { return std::string( i_rInfo.param.Vertex ) + "_" + i_rInfo.param.Fragment; } );
+
+  TEST_F( ShaderResourcesTest, MissingOrBrokenStagesGiveNoProgramAndALogLine )
+  {
+    QTemporaryDir Directory;
+    ASSERT_TRUE( Directory.isValid() );
+    const QString BrokenPath = Directory.filePath( "Broken.glsl" );
+    {
+      QFile File( BrokenPath );
+      ASSERT_TRUE( File.open( QIODevice::WriteOnly ) );
+      File.write( "void main() { gl_FragColor = undeclared; }\n" );
+    }
+
+    VLogCapture Log;
+    VResources Resources( false, QDir::currentPath() );
+    Resources.Load();
+    Resources.AddShaderFile( "Broken", BrokenPath, VShader::Kind_Fragment );
+    Resources.AddShaderFile( "Absent", Directory.filePath( "Absent.glsl" ), VShader::Kind_Fragment );
+
+    EXPECT_TRUE( Log.Contains( "Shader Failed To Compile<" + BrokenPath.toStdString() + "> Log=<" ) );
+    EXPECT_TRUE( Log.Contains( "Failed to open " + Directory.filePath( "Absent.glsl" ).toStdString() ) );
+    EXPECT_EQ( Resources.GetProgram( "Video", "Broken" ), nullptr );
+    EXPECT_EQ( Resources.GetProgram( "Video", "Absent" ), nullptr );
+    EXPECT_EQ( Resources.GetProgram( "NoSuchStage", "VideoRaw" ), nullptr );
+  }
+
+  TEST_F( ShaderResourcesTest, OverrideDirectoryWinsAndReloadRelinksInPlace )
+  {
+    QTemporaryDir Directory;
+    ASSERT_TRUE( QDir( Directory.path() ).mkpath( "FragmentShaders" ) );
+    const QString Path = Directory.filePath( "FragmentShaders/UniformColour.glsl" );
+    auto Write = [&]( const char* i_pText )
+    {
+      QFile File( Path );
+      ASSERT_TRUE( File.open( QIODevice::WriteOnly | QIODevice::Truncate ) );
+      File.write( i_pText );
+    };
+    Write( "uniform vec4 u_Overridden;\nvoid main() { gl_FragColor = u_Overridden; }\n" );
+
+    VResources Resources( true, QDir::currentPath() );
+    Resources.AddOverrideDirectory( Directory.path() );
+    Resources.Load();
+    // The vertex stages were not overridden and still come from the resources.
+    EXPECT_TRUE( Resources.GetShader( VShader::Kind_Vertex, "Video" ) );
+    std::shared_ptr< VShaderProgram > pProgram = Resources.GetProgram( "Video", "UniformColour" );
+    ASSERT_TRUE( pProgram && pProgram->IsLinked() );
+    EXPECT_GE( pProgram->UniformLocation( "u_Overridden" ), 0 );
+
+    Write( "uniform vec4 u_Reloaded;\nvoid main() { gl_FragColor = u_Reloaded; }\n" );
+    Resources.ReloadAll();
+    ASSERT_TRUE( pProgram->IsLinked() );
+    EXPECT_EQ( pProgram->UniformLocation( "u_Overridden" ), -1 );
+    EXPECT_GE( pProgram->UniformLocation( "u_Reloaded" ), 0 );
+  }
+
+  TEST_F( ShaderResourcesTest, UseProgramRefusesAnAbsentProgramAndKeepsTheCurrentOne )
+  {
+    VResources Resources( false, QDir::currentPath() );
+    Resources.Load();
+    CoreGraphics::VRenderContext Context;
+    Context.Initialise();
+    std::shared_ptr< VShaderProgram > pProgram = Resources.GetProgram( "Video", "VideoRaw" );
+    ASSERT_TRUE( Context.UseProgram( pProgram ) );
+    EXPECT_FALSE( Context.UseProgram( nullptr ) );
+    EXPECT_EQ( Context.GetCurrentProgram(), pProgram );
+  }
+
+  TEST_F( ShaderResourcesTest, BuffersCountWhatTheyHoldAndRefuseWritesPastTheEnd )
+  {
+    CoreGraphics::VIndexBuffer Empty;
+    ASSERT_TRUE( Empty.Create( std::vector< std::uint16_t >() ) );
+    EXPECT_EQ( Empty.GetIndexCount(), 0u );
+    ASSERT_TRUE( Empty.GetBuffer().bind() );
+    EXPECT_EQ( Empty.GetBuffer().size(), 0 );
+    Empty.GetBuffer().release();
+
+    CoreGraphics::VIndexBuffer Wide;
+    ASSERT_TRUE( Wide.Create( std::vector< std::uint32_t >{ 0, 1, 2 } ) );
+    EXPECT_EQ( Wide.GetIndexType(), GLenum( GL_UNSIGNED_INT ) );
+    EXPECT_EQ( Wide.GetIndexCount(), 3u );
+
+    CoreGraphics::VVertexBuffer Vertices;
+    ASSERT_TRUE( Vertices.Reserve( CoreGraphics::VVertexLayout::PositionColour(), 64 ) );
+    EXPECT_EQ( Vertices.GetVertexCount(), 4u );
+    const std::uint8_t Bytes[16] = {};
+    EXPECT_TRUE( Vertices.Write( 48, Bytes, 16 ) );
+    EXPECT_FALSE( Vertices.Write( 49, Bytes, 16 ) );
+    EXPECT_FALSE( Vertices.Write( 80, Bytes, 1 ) );
+  }
+
+  // Draws a quad of the position-only layout through (Simple3D, UniformColour) into a framebuffer
+  // object and reads it back: the layout, the standard uniforms and the state come together.
+  TEST_F( ShaderResourcesTest, DrawsAnIndexedQuadWithTheStandardUniforms )
+  {
+    VResources Resources( false, QDir::currentPath() );
+    Resources.Load();
+    CoreGraphics::VRenderContext Context;
+    Context.Initialise();
+    QOpenGLFramebufferObject Framebuffer( 8, 8 );
+    ASSERT_TRUE( Framebuffer.isValid() );
+    Context.BindFramebuffer( &Framebuffer );
+    ASSERT_TRUE( Context.FramebufferComplete() );
+    Context.SetViewport( QRect( 0, 0, 8, 8 ) );
+    Context.Clear( true, false );
+
+    // The projection halves x, so the quad of the whole clip square covers the middle columns only.
+    QMatrix4x4 Projection;
+    Projection.scale( 0.5f, 1.0f, 1.0f );
+    Context.SetProjection( Projection );
+    std::shared_ptr< VShaderProgram > pProgram = Resources.GetProgram( "Simple3D", "UniformColour" );
+    ASSERT_TRUE( Context.UseProgram( pProgram ) );
+    pProgram->SetUniform( pProgram->UniformLocation( "u_colour" ), QVector4D( 1.0f, 0.5f, 0.0f, 1.0f ) );
+
+    CoreGraphics::VMesh Mesh;
+    const float Corners[] = { -1, -1, 0, 1, -1, 0, 1, 1, 0, -1, 1, 0 };
+    ASSERT_TRUE( Mesh.Vertices.Create( CoreGraphics::VVertexLayout::Position3D(), Corners, sizeof( Corners ) ) );
+    ASSERT_TRUE( Mesh.Indices.Create( std::vector< std::uint16_t >{ 0, 1, 2, 0, 2, 3 } ) );
+    Context.ApplyState( CoreGraphics::VRenderState() );
+    Context.BindVertexBuffer( Mesh.Vertices );
+    Context.DrawIndexed( GL_TRIANGLES, Mesh.Indices );
+
+    const QImage Picture = Framebuffer.toImage();
+    Context.ResetState();
+    Context.UnbindFramebuffer();
+    for( int x = 0; x < 8; ++x )
+    {
+      const QRgb Expected = ( x >= 2 && x < 6 ) ? qRgb( 255, 128, 0 ) : qRgb( 25, 25, 25 );
+      EXPECT_EQ( Picture.pixel( x, 4 ) & 0xffffff, Expected & 0xffffff ) << "column " << x;
+    }
+  }
+} // namespace
