@@ -2,6 +2,8 @@
 
 #include <boost/program_options.hpp>
 
+#include <vector>
+
 namespace po = boost::program_options;
 
 namespace LumekVideoViewer
@@ -20,11 +22,28 @@ namespace LumekVideoViewer
     po::positional_options_description Positional;
     Positional.add( "input-file", -1 );
 
+    // "--version-server=" names an empty server, which is a legal choice; the option library
+    // would refuse the empty text after the equal sign, but takes it as a separate argument.
+    std::vector< std::string > Arguments;
+    for( int i = 1; i < i_ArgumentCount; ++i )
+    {
+      const std::string Argument = i_pArguments[ i ];
+      const bool bEmptyValue = Argument.size() > 3 && Argument.compare( 0, 2, "--" ) == 0 && Argument.back() == '=' &&
+                               Argument.find( '=' ) == Argument.size() - 1;
+      const std::string Name = bEmptyValue ? Argument.substr( 2, Argument.size() - 3 ) : std::string();
+      if( bEmptyValue && Name != "developer" && Options.find_nothrow( Name, false ) != nullptr )
+      {
+        Arguments.push_back( "--" + Name );
+        Arguments.push_back( "" );
+      }
+      else
+        Arguments.push_back( Argument );
+    }
+
     po::variables_map Variables;
     try
     {
-      po::store( po::command_line_parser( i_ArgumentCount, i_pArguments ).options( Options ).positional( Positional ).run(),
-                 Variables );
+      po::store( po::command_line_parser( Arguments ).options( Options ).positional( Positional ).run(), Variables );
       po::notify( Variables );
     }
     catch( const std::exception& rException )
