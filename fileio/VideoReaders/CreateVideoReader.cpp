@@ -1,0 +1,37 @@
+#include "fileio/VideoReaders/CreateVideoReader.h"
+
+#include "fileio/LumekVideo/VReader.h"
+
+#include <iterator>
+
+namespace
+{
+  using VReaderFactory = std::shared_ptr< ZOL::IVideoReader > ( * )();
+
+  template < typename TReader > std::shared_ptr< ZOL::IVideoReader > MakeReader()
+  {
+    return std::make_shared< TReader >();
+  }
+
+  struct VReaderRow
+  {
+    ZOL::EVideoContainer Container;
+    VReaderFactory Create;
+  };
+
+  // One row per container that has a reader; a container without a row gives no reader.
+  constexpr VReaderRow s_Readers[] = {
+      { ZOL::VideoContainer_LVID, &MakeReader< LumekVideo::VReader > },
+  };
+} // namespace
+
+std::shared_ptr< ZOL::IVideoReader > CreateVideoReader( const std::string& i_FileName )
+{
+  const std::optional< ZOL::EVideoContainer > Container = ZOL::FindVideoContainer( i_FileName );
+  if( !Container )
+    return nullptr;
+  for( const VReaderRow& rRow : s_Readers )
+    if( rRow.Container == *Container )
+      return rRow.Create();
+  return nullptr;
+}
