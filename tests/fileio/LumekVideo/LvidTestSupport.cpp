@@ -1,0 +1,219 @@
+#include "tests/fileio/LumekVideo/LvidTestSupport.h"
+
+#include "utils/MemoryStream.h"
+#include "videointerface/AttributeRecords.h"
+
+#include <boost/filesystem.hpp>
+
+#include <cstring>
+#include <fstream>
+#include <iterator>
+
+namespace LumekVideoTest
+{
+  VByteWriter& VByteWriter::U8( std::uint8_t i_Value )
+  {
+    Bytes.push_back( i_Value );
+    return *this;
+  }
+
+  VByteWriter& VByteWriter::U16( std::uint16_t i_Value )
+  {
+    return U8( static_cast< std::uint8_t >( i_Value ) ).U8( static_cast< std::uint8_t >( i_Value >> 8 ) );
+  }
+
+  VByteWriter& VByteWriter::U32( std::uint32_t i_Value )
+  {
+    return U16( static_cast< std::uint16_t >( i_Value ) ).U16( static_cast< std::uint16_t >( i_Value >> 16 ) );
+  }
+
+  VByteWriter& VByteWriter::U64( std::uint64_t i_Value )
+  {
+    return U32( static_cast< std::uint32_t >( i_Value ) ).U32( static_cast< std::uint32_t >( i_Value >> 32 ) );
+  }
+
+  VByteWriter& VByteWriter::F64( double i_Value )
+  {
+    std::uint64_t Bits = 0;
+    std::memcpy( &Bits, &i_Value, sizeof( Bits ) );
+    return U64( Bits );
+  }
+
+  VByteWriter& VByteWriter::Raw( const void* i_pData, std::size_t i_Size )
+  {
+    const auto* pBytes = static_cast< const std::uint8_t* >( i_pData );
+    Bytes.insert( Bytes.end(), pBytes, pBytes + i_Size );
+    return *this;
+  }
+
+  VByteWriter& VByteWriter::Zeros( std::size_t i_Count )
+  {
+    Bytes.resize( Bytes.size() + i_Count, 0 );
+    return *this;
+  }
+
+  VByteWriter& VByteWriter::PadTo( std::uint64_t i_Alignment )
+  {
+    while( Bytes.size() % i_Alignment != 0 )
+      Bytes.push_back( 0 );
+    return *this;
+  }
+
+  void PatchU32( VBytes& io_rBytes, std::size_t i_Offset, std::uint32_t i_Value )
+  {
+    for( int i = 0; i < 4; ++i )
+      io_rBytes.at( i_Offset + i ) = static_cast< std::uint8_t >( i_Value >> ( 8 * i ) );
+  }
+
+  void PatchU64( VBytes& io_rBytes, std::size_t i_Offset, std::uint64_t i_Value )
+  {
+    for( int i = 0; i < 8; ++i )
+      io_rBytes.at( i_Offset + i ) = static_cast< std::uint8_t >( i_Value >> ( 8 * i ) );
+  }
+
+  VBytes PatternBytes( std::size_t i_Size, std::uint32_t i_Seed )
+  {
+    // A small xorshift: every byte position and every seed gives different content, so a frame
+    // read from the wrong place or shifted by a byte cannot match.
+    VBytes Bytes( i_Size );
+    std::uint32_t State = i_Seed * 2654435761u + 0x9E3779B9u;
+    for( auto& rByte : Bytes )
+    {
+      State ^= State << 13;
+      State ^= State >> 17;
+      State ^= State << 5;
+      rByte = static_cast< std::uint8_t >( State >> 24 );
+    }
+    return Bytes;
+  }
+
+  VBytes SerialiseStore( const ZOL::IVideoAttributes& i_rStore )
+  {
+    UtilsIO::VMemoryStream Stream;
+    i_rStore.WriteTo( Stream );
+    return Stream.GetData();
+  }
+
+  VBytes DescriptionBlock( const ZOL::IVideoFrameInfo& i_rVideo, const ZOL::IAudioFrameInfo& i_rAudio )
+  {
+    ZOL::IVideoAttributes Store;
+    ZOL::WriteVideoFrameInfo( Store, i_rVideo );
+    ZOL::WriteAudioFrameInfo( Store, "", i_rAudio );
+    return SerialiseStore( Store );
+  }
+
+  VAssembled Assemble( const VRecordingPlan& i_rPlan )
+  {
+    VAssembled Result;
+    VByteWriter File;
+    File.Text( "###LumekVideoFile###" ).U32( 0xF355BDACu ).U32( 1 ).U32( 3 ).U64( i_rPlan.Alignment ).U64( 0 );
+    File.Raw( i_rPlan.DescriptionBlock ).Raw( i_rPlan.AttributeBlock ).PadTo( i_rPlan.Alignment );
+    for( const VRecord& rRecord : i_rPlan.Records )
+    {
+      Result.RecordOffsets.push_back( File.Size() );
+      File.Raw( rRecord.Video ).PadTo( i_rPlan.Alignment );
+      if( rRecord.Audio )
+      {
+        File.U32( rRecord.AudioByteCount ? *rRecord.AudioByteCount
+                                         : static_cast< std::uint32_t >( rRecord.Audio->size() ) );
+        File.Raw( *rRecord.Audio ).PadTo( i_rPlan.Alignment );
+      }
+    }
+    Result.IndexOffset = File.Size();
+    if( i_rPlan.Index )
+    {
+      File.U64( i_rPlan.Index->size() );
+      for( const auto& rEntry : *i_rPlan.Index )
+        File.U64( rEntry.first ).U64( rEntry.second );
+    }
+    else
+    {
+      File.U64( i_rPlan.Records.size() );
+      for( std::size_t i = 0; i < i_rPlan.Records.size(); ++i )
+        File.U64( i_rPlan.Records[i].FrameNumber ).U64( Result.RecordOffsets[i] );
+    }
+    PatchU64( File.Bytes, 40, Result.IndexOffset );
+    Result.Bytes = std::move( File.Bytes );
+    return Result;
+  }
+
+  VAssembled AssembleWithIndex( VRecordingPlan i_Plan,
+                                const std::vector< std::pair< std::uint64_t, std::size_t > >& i_rFrameToRecord )
+  {
+    const VAssembled Plain = Assemble( i_Plan );
+    std::vector< std::pair< std::uint64_t, std::uint64_t > > Index;
+    for( const auto& rEntry : i_rFrameToRecord )
+      Index.emplace_back( rEntry.first, Plain.RecordOffsets.at( rEntry.second ) );
+    i_Plan.Index = std::move( Index );
+    return Assemble( i_Plan );
+  }
+
+  ZOL::IVideoFrameInfo MakeVideo( ZOL::EPixelFormat i_Format, int i_Width, int i_Height )
+  {
+    ZOL::IVideoFrameInfo Info;
+    Info.ImageWidth = i_Width;
+    Info.ImageHeight = i_Height;
+    Info.PixelFormat = i_Format;
+    Info.PixelAspectRatio = 1.0;
+    Info.InterlacedFormat = ZOL::InterlacedFormat_NotInterlaced;
+    return Info;
+  }
+
+  ZOL::IAudioFrameInfo MakeAudio( ZOL::EAudioSampleFormat i_Format, int i_Channels, int i_Rate )
+  {
+    ZOL::IAudioFrameInfo Info;
+    Info.SampleFormat = i_Format;
+    Info.SampleRate = i_Rate;
+    Info.Channels = i_Channels;
+    return Info;
+  }
+
+  ZOL::IVideoAttributes MakeFileAttributes()
+  {
+    ZOL::IVideoAttributes Attributes;
+    ZOL::IVideoTiming Timing;
+    Timing.FramePeriodInTicks = 135000000u / 100u;
+    Timing.StartOffsetInTicks = -270000;
+    ZOL::WriteVideoTiming( Attributes, Timing );
+    ZOL::IVideoSettings Settings;
+    Settings.Saturation = 1.25f;
+    Settings.GammaCorrection = 0.5f;
+    ZOL::WriteVideoSettings( Attributes, "", Settings );
+    Attributes.Set( "Recording.Take", std::uint32_t( 7 ) );
+    Attributes.Set( "Recording.Note", "lvid test" );
+    return Attributes;
+  }
+
+  VTempDir::VTempDir()
+  {
+    const boost::filesystem::path Base = boost::filesystem::temp_directory_path();
+    const boost::filesystem::path Dir = Base / boost::filesystem::unique_path( "lvid-test-%%%%-%%%%-%%%%" );
+    boost::filesystem::create_directories( Dir );
+    m_Path = Dir.string();
+  }
+
+  VTempDir::~VTempDir()
+  {
+    boost::system::error_code Error;
+    boost::filesystem::remove_all( m_Path, Error );
+  }
+
+  std::string VTempDir::File( const std::string& i_rName ) const
+  {
+    return ( boost::filesystem::path( m_Path ) / i_rName ).string();
+  }
+
+  bool WriteFile( const std::string& i_rPath, const VBytes& i_rBytes )
+  {
+    std::ofstream Stream( i_rPath, std::ios::binary | std::ios::trunc );
+    Stream.write( reinterpret_cast< const char* >( i_rBytes.data() ),
+                  static_cast< std::streamsize >( i_rBytes.size() ) );
+    return static_cast< bool >( Stream );
+  }
+
+  VBytes ReadFile( const std::string& i_rPath )
+  {
+    std::ifstream Stream( i_rPath, std::ios::binary );
+    return VBytes( std::istreambuf_iterator< char >( Stream ), std::istreambuf_iterator< char >() );
+  }
+} // namespace LumekVideoTest

@@ -1,0 +1,103 @@
+#pragma once
+
+// Recordings for the .lvid tests, assembled byte by byte here, apart from the writer, so that a
+// mistake in the writer's layout cannot hide behind the same mistake in the reader.
+
+#include "videointerface/IVideoAttributes.h"
+#include "videointerface/IVideoFrameInfo.h"
+
+#include <cstdint>
+#include <memory>
+#include <optional>
+#include <string>
+#include <vector>
+
+namespace LumekVideoTest
+{
+  using VBytes = std::vector< std::uint8_t >;
+
+  // Little-endian assembly with its own encoding.
+  class VByteWriter
+  {
+  public:
+    VByteWriter& U8( std::uint8_t i_Value );
+    VByteWriter& U16( std::uint16_t i_Value );
+    VByteWriter& U32( std::uint32_t i_Value );
+    VByteWriter& U64( std::uint64_t i_Value );
+    VByteWriter& F64( double i_Value );
+    VByteWriter& Raw( const void* i_pData, std::size_t i_Size );
+    VByteWriter& Raw( const VBytes& i_rBytes ) { return Raw( i_rBytes.data(), i_rBytes.size() ); }
+    VByteWriter& Text( const std::string& i_rText ) { return Raw( i_rText.data(), i_rText.size() ); }
+    VByteWriter& Zeros( std::size_t i_Count );
+    VByteWriter& PadTo( std::uint64_t i_Alignment );
+
+    std::size_t Size() const { return Bytes.size(); }
+    VBytes Bytes;
+  };
+
+  void PatchU32( VBytes& io_rBytes, std::size_t i_Offset, std::uint32_t i_Value );
+  void PatchU64( VBytes& io_rBytes, std::size_t i_Offset, std::uint64_t i_Value );
+
+  // Deterministic bytes that differ from frame to frame and from seed to seed.
+  VBytes PatternBytes( std::size_t i_Size, std::uint32_t i_Seed );
+
+  // The serial form of a store, as its own WriteTo gives it.
+  VBytes SerialiseStore( const ZOL::IVideoAttributes& i_rStore );
+  // The frame description block of a recording with this video and audio.
+  VBytes DescriptionBlock( const ZOL::IVideoFrameInfo& i_rVideo, const ZOL::IAudioFrameInfo& i_rAudio );
+
+  struct VRecord
+  {
+    std::uint64_t FrameNumber = 0;
+    VBytes Video;
+    // Absent: the recording has no audio. Its AudioByteCount may claim other than its size.
+    std::optional< VBytes > Audio;
+    std::optional< std::uint32_t > AudioByteCount;
+  };
+
+  // A recording as a capture lays it out: header, both blocks, aligned records, index last.
+  struct VRecordingPlan
+  {
+    VBytes DescriptionBlock;
+    VBytes AttributeBlock;
+    std::uint64_t Alignment = 64;
+    std::vector< VRecord > Records;
+    // Entries to write instead of one per record, in order; offsets are those of the records'
+    // positions when given as a record number through RecordOffset.
+    std::optional< std::vector< std::pair< std::uint64_t, std::uint64_t > > > Index;
+  };
+
+  struct VAssembled
+  {
+    VBytes Bytes;
+    std::vector< std::uint64_t > RecordOffsets;
+    std::uint64_t IndexOffset = 0;
+  };
+
+  VAssembled Assemble( const VRecordingPlan& i_rPlan );
+  // The same plan with the index replaced, now that the record offsets are known.
+  VAssembled AssembleWithIndex( VRecordingPlan i_Plan,
+                                const std::vector< std::pair< std::uint64_t, std::size_t > >& i_rFrameToRecord );
+
+  // A frame description for tests: a size and a format, all else at the usual values.
+  ZOL::IVideoFrameInfo MakeVideo( ZOL::EPixelFormat i_Format, int i_Width, int i_Height );
+  ZOL::IAudioFrameInfo MakeAudio( ZOL::EAudioSampleFormat i_Format, int i_Channels, int i_Rate = 48000 );
+  // File attributes with timing, settings and a key of the recording's own.
+  ZOL::IVideoAttributes MakeFileAttributes();
+
+  // A folder of its own under the test temp folder, removed with everything in it.
+  class VTempDir
+  {
+  public:
+    VTempDir();
+    ~VTempDir();
+    std::string File( const std::string& i_rName ) const;
+    const std::string& Path() const { return m_Path; }
+
+  private:
+    std::string m_Path;
+  };
+
+  bool WriteFile( const std::string& i_rPath, const VBytes& i_rBytes );
+  VBytes ReadFile( const std::string& i_rPath );
+} // namespace LumekVideoTest
