@@ -1,0 +1,287 @@
+// The window's decisions, checked without a display.
+
+#include "app/Window/VideoWindowLogic.h"
+
+#include "services/IApplicationVersion.h"
+#include "videointerface/BufferAllocators.h"
+#include "videointerface/IBuffer.h"
+
+#include <QKeySequence>
+#include <QSettings>
+#include <QTemporaryDir>
+
+#include <gtest/gtest.h>
+
+#include <set>
+
+using namespace LumekVideoViewer;
+
+namespace
+{
+  QString StorePath( const QTemporaryDir& i_rDir )
+  {
+    return i_rDir.filePath( "viewer.ini" );
+  }
+
+  // A recording whose frames exist only at the given indices.
+  VFrameReader GappyFile( std::set< std::uint64_t > i_Present, std::vector< std::uint64_t >* o_pReads = nullptr )
+  {
+    return [i_Present, o_pReads]( std::uint64_t i_Index, ZOL::IVideoFrame& o_rFrame )
+    {
+      if( o_pReads )
+        o_pReads->push_back( i_Index );
+      if( i_Present.count( i_Index ) == 0 )
+        return;
+      o_rFrame.VideoFrameInfo.ImageWidth = 8;
+      o_rFrame.VideoFrameInfo.ImageHeight = 4;
+      o_rFrame.VideoFrameInfo.PixelFormat = ZOL::PixelFormat_Luminance8;
+    };
+  }
+} // namespace
+
+TEST( ViewerSettings, EmptyStoreGivesFirstStartDefaults )
+{
+  QTemporaryDir Dir;
+  QSettings Store( StorePath( Dir ), QSettings::IniFormat );
+  const VViewerSettings Settings = ReadViewerSettings( Store );
+  EXPECT_TRUE( Settings.Looping );
+  EXPECT_TRUE( Settings.SkipFrames );
+  EXPECT_FALSE( Settings.SoftwareDecoder );
+  EXPECT_TRUE( Settings.FullScreen );
+  EXPECT_TRUE( Settings.ControlsVisible );
+  EXPECT_TRUE( Settings.VideoInfoVisible );
+  EXPECT_TRUE( Settings.CorrectLensDistortion );
+}
+
+// Each value flipped alone must come back alone: a swapped key or a shared member shows here.
+TEST( ViewerSettings, EachValueSurvivesARestartOnItsOwn )
+{
+  for( const VSettingRow& rRow : ViewerSettingRows() )
+  {
+    SCOPED_TRACE( rRow.Key );
+    QTemporaryDir Dir;
+    VViewerSettings Written;
+    Written.*rRow.pValue = !( Written.*rRow.pValue );
+    {
+      QSettings Store( StorePath( Dir ), QSettings::IniFormat );
+      WriteViewerSettings( Store, Written );
+    }
+    QSettings Store( StorePath( Dir ), QSettings::IniFormat );
+    const VViewerSettings Read = ReadViewerSettings( Store );
+    for( const VSettingRow& rOther : ViewerSettingRows() )
+      EXPECT_EQ( Read.*rOther.pValue, Written.*rOther.pValue ) << rOther.Key;
+  }
+}
+
+TEST( ViewerSettings, KeysLiveInTheGeneralGroupAndReadAnyBooleanText )
+{
+  QTemporaryDir Dir;
+  {
+    QSettings Store( StorePath( Dir ), QSettings::IniFormat );
+    Store.setValue( "General/ControlsVisible", "false" );
+    Store.setValue( "General/SoftwareDecoder", 1 );
+    Store.setValue( "Looping", false ); // outside the group: not ours
+  }
+  QSettings Store( StorePath( Dir ), QSettings::IniFormat );
+  const VViewerSettings Settings = ReadViewerSettings( Store );
+  EXPECT_FALSE( Settings.ControlsVisible );
+  EXPECT_TRUE( Settings.SoftwareDecoder );
+  EXPECT_TRUE( Settings.Looping );
+
+  WriteViewerSettings( Store, Settings );
+  Store.sync();
+  Store.beginGroup( SettingsGroup );
+  EXPECT_EQ( Store.childKeys().size(), 7 );
+}
+
+struct VChoiceCase
+{
+  const char* Name;
+  int Asked;
+  bool bPlaying;
+  int Shown;
+  bool bWarning;
+};
+
+class FrameChoice : public testing::TestWithParam< VChoiceCase >
+{
+};
+
+// Frames 0, 1, 2 and 5 of 8 exist.
+TEST_P( FrameChoice, FallsBackToTheNearestEarlierFrame )
+{
+  const VChoiceCase& rCase = GetParam();
+  const VFrameChoice Choice = ChooseFrame( rCase.Asked, 8, rCase.bPlaying, GappyFile( { 0, 1, 2, 5 } ) );
+  EXPECT_EQ( Choice.ShownIndex, rCase.Shown );
+  EXPECT_EQ( Choice.bMissingWarning, rCase.bWarning );
+  EXPECT_EQ( IsEmptyFrame( Choice.Frame ), rCase.Shown < 0 );
+}
+
+INSTANTIATE_TEST_SUITE_P( GappyFile, FrameChoice,
+                          testing::Values( VChoiceCase{ "PresentPaused", 2, false, 2, false },
+                                           VChoiceCase{ "PresentPlaying", 5, true, 5, false },
+                                           VChoiceCase{ "GapPausedWarns", 4, false, 2, true },
+                                           VChoiceCase{ "GapPlayingIsQuiet", 3, true, 2, false },
+                                           VChoiceCase{ "AfterLastPresent", 7, false, 5, true },
+                                           VChoiceCase{ "PastTheEndWhilePlaying", 11, true, 5, false },
+                                           VChoiceCase{ "Negative", -1, false, -1, false } ),
+                          []( const testing::TestParamInfo< VChoiceCase >& i_rInfo ) { return i_rInfo.param.Name; } );
+
+TEST( FrameChoiceEdges, NothingBeforeAMissingFirstFrame )
+{
+  const VFrameChoice Choice = ChooseFrame( 3, 10, false, GappyFile( { 4, 5 } ) );
+  EXPECT_EQ( Choice.ShownIndex, -1 );
+  EXPECT_TRUE( Choice.bMissingWarning );
+  EXPECT_TRUE( IsEmptyFrame( Choice.Frame ) );
+}
+
+// The clock overshoots the end; a wild index must not walk billions of empty indices.
+TEST( FrameChoiceEdges, IndicesPastTheEndAreNotRead )
+{
+  std::vector< std::uint64_t > Reads;
+  const VFrameChoice Choice = ChooseFrame( 2000000000, 3, true, GappyFile( { 0, 1, 2 }, &Reads ) );
+  EXPECT_EQ( Choice.ShownIndex, 2 );
+  EXPECT_EQ( Reads, std::vector< std::uint64_t >{ 2 } );
+}
+
+TEST( SurfaceGeometry, OffsetsNeedASensorToBeMeasuredOn )
+{
+  ZOL::IVideoFrameInfo Info;
+  Info.TwiceOffsetX = 20;
+  Info.TwiceOffsetY = 0;
+  Info.ImageWidth = 64;
+  CoreLumekTypes::VCameraHardware NoSensor;
+  EXPECT_EQ( SurfaceGeometry( Info, NoSensor ).TwiceOffsetX, 0 );
+  EXPECT_EQ( SurfaceGeometry( Info, NoSensor ).ImageWidth, 64 );
+
+  CoreLumekTypes::VCameraHardware Camera;
+  Camera.SensorWidthInPixels = 128;
+  Camera.SensorHeightInPixels = 96;
+  EXPECT_EQ( SurfaceGeometry( Info, Camera ).TwiceOffsetX, 20 );
+}
+
+TEST( WindowTexts, TitleNamesTheFileOnly )
+{
+  EXPECT_EQ( WindowTitle( "/tmp/some folder/take 3.lvid" ), "take 3.lvid - Lumek Video Viewer" );
+  EXPECT_EQ( WindowTitle( QString() ), "Lumek Video Viewer" );
+}
+
+TEST( WindowTexts, AboutAndHelpOfThisRelease )
+{
+  const ZOL::IApplicationVersion& rVersion = ApplicationVersion();
+  EXPECT_EQ( AboutVersionLine( rVersion ), "Lumek Video Viewer 1.10.0.137509h  x64" );
+  EXPECT_TRUE( AboutRevisionLine( rVersion ).startsWith( "137509:" ) );
+  EXPECT_TRUE( HelpUrl( rVersion ).toString().endsWith( "/display/LVV110/" ) )
+      << HelpUrl( rVersion ).toString().toStdString();
+  EXPECT_TRUE( HelpUrl( rVersion ).isValid() );
+}
+
+TEST( Timebar, TickIntervalGuardsAnEmptyFile )
+{
+  EXPECT_EQ( TimebarTickInterval( 700, 1 ), 700 );
+  EXPECT_EQ( TimebarTickInterval( 700, 100 ), 7 );
+  EXPECT_EQ( TimebarTickInterval( 700, 1000 ), 0 );
+  EXPECT_EQ( TimebarTickInterval( 700, 0 ), 0 );
+}
+
+TEST( DisplaySettings, OnlyUncompressedBayerFrames )
+{
+  const std::set< std::uint32_t > Bayer = { 2, 3, 4, 5, 14, 15 };
+  for( std::uint32_t Format = 0; Format < ZOL::PixelFormatCount; ++Format )
+  {
+    const auto PixelFormat = static_cast< ZOL::EPixelFormat >( Format );
+    EXPECT_EQ( HasDisplaySettings( ZOL::VideoPayload_Uncompressed, PixelFormat ), Bayer.count( Format ) == 1 )
+        << Format;
+    EXPECT_FALSE( HasDisplaySettings( ZOL::VideoPayload_ImageJPEG, PixelFormat ) ) << Format;
+    EXPECT_FALSE( HasDisplaySettings( ZOL::VideoPayload_VideoH264, PixelFormat ) ) << Format;
+  }
+}
+
+struct VAudioCase
+{
+  ZOL::EAudioSampleFormat Format;
+  int SampleSize;
+  QAudioFormat::SampleType Type;
+};
+
+TEST( AudioOutput, FormatFollowsTheFileAndKeepsTheDeviceForTheRest )
+{
+  QAudioFormat Preferred;
+  Preferred.setSampleType( QAudioFormat::Float );
+  Preferred.setSampleRate( 44100 );
+  Preferred.setByteOrder( QAudioFormat::BigEndian );
+
+  const VAudioCase Cases[] = {
+      { ZOL::AudioSampleFormat_Int8, 8, QAudioFormat::SignedInt },
+      { ZOL::AudioSampleFormat_UInt8, 8, QAudioFormat::UnSignedInt },
+      { ZOL::AudioSampleFormat_Int16, 16, QAudioFormat::SignedInt },
+      { ZOL::AudioSampleFormat_UInt16, 16, QAudioFormat::UnSignedInt },
+      { ZOL::AudioSampleFormat_Int24, 24, QAudioFormat::SignedInt },
+      { ZOL::AudioSampleFormat_UInt24, 24, QAudioFormat::UnSignedInt },
+      { ZOL::AudioSampleFormat_Int32, 32, QAudioFormat::SignedInt },
+      { ZOL::AudioSampleFormat_UInt32, 32, QAudioFormat::UnSignedInt },
+      { ZOL::AudioSampleFormat_Float32, 32, QAudioFormat::Float },
+      { ZOL::AudioSampleFormat_Unspecified, 0, QAudioFormat::Float },
+  };
+  for( const VAudioCase& rCase : Cases )
+  {
+    SCOPED_TRACE( ZOL::ToString( rCase.Format ) );
+    ZOL::IAudioFrameInfo Info;
+    Info.SampleFormat = rCase.Format;
+    Info.SampleRate = 48000;
+    Info.Channels = 2;
+    const QAudioFormat Format = AudioOutputFormat( Info, Preferred );
+    EXPECT_EQ( Format.sampleSize(), rCase.SampleSize );
+    EXPECT_EQ( Format.sampleType(), rCase.Type );
+    EXPECT_EQ( Format.sampleRate(), 48000 );
+    EXPECT_EQ( Format.channelCount(), 2 );
+    EXPECT_EQ( Format.byteOrder(), QAudioFormat::LittleEndian );
+    EXPECT_EQ( Format.codec(), "audio/pcm" );
+  }
+}
+
+TEST( AudioOutput, OnlyTheFirstBlockOfAUsableFrameIsWritten )
+{
+  const auto pAllocator = std::make_shared< ZOL::VReaderBufferAllocator >();
+  ZOL::IVideoFrame Frame;
+  Frame.AudioFrameInfo = { ZOL::AudioSampleFormat_Int16, 48000, 2 };
+  EXPECT_EQ( AudioBlockToWrite( Frame ), nullptr );
+
+  std::shared_ptr< ZOL::IBuffer > pFirst, pSecond;
+  pAllocator->Allocate( pFirst, 16 );
+  pAllocator->Allocate( pSecond, 16 );
+  Frame.Audio = { pFirst, pSecond };
+  EXPECT_EQ( AudioBlockToWrite( Frame ), pFirst.get() );
+
+  Frame.AudioFrameInfo.Channels = 0;
+  EXPECT_EQ( AudioBlockToWrite( Frame ), nullptr );
+  Frame.AudioFrameInfo = { ZOL::AudioSampleFormat_Unspecified, 48000, 2 };
+  EXPECT_EQ( AudioBlockToWrite( Frame ), nullptr );
+}
+
+// Two actions on one key make Qt fire neither; every key must be unique, and every action must
+// land in a menu that exists.
+TEST( MenuTable, KeysAreUniqueAndEveryActionHasItsMenu )
+{
+  std::set< QString > Keys;
+  std::set< EMenu > Menus;
+  for( const VMenuRow& rMenu : MenuRows() )
+    Menus.insert( rMenu.Menu );
+  std::set< EAction > Actions;
+  for( const VActionRow& rRow : ActionRows() )
+  {
+    SCOPED_TRACE( rRow.Text );
+    EXPECT_EQ( Menus.count( rRow.Menu ), 1u );
+    EXPECT_TRUE( Actions.insert( rRow.Id ).second );
+    EXPECT_EQ( &ActionRow( rRow.Id ), &rRow );
+    if( *rRow.Shortcut == '\0' )
+      continue;
+    const QString Key = QKeySequence( rRow.Shortcut ).toString();
+    EXPECT_FALSE( Key.isEmpty() );
+    EXPECT_TRUE( Keys.insert( Key ).second ) << Key.toStdString();
+    EXPECT_NE( rRow.Menu, EMenu::Help );
+  }
+  EXPECT_EQ( Actions.size(), static_cast< std::size_t >( EAction::Count ) );
+  EXPECT_EQ( ActionText( ActionRow( EAction::About ) ), "&About Lumek Video Viewer..." );
+  EXPECT_EQ( ActionText( ActionRow( EAction::ViewHelp ) ), QString( "View Latest &Help on " ) + DocumentationSiteName );
+}
