@@ -1,0 +1,160 @@
+#include "ConversionTestSupport.h"
+#include "graphics/CoreVideoUtils/DisplayConversion.h"
+
+#include <gtest/gtest.h>
+
+#include <cmath>
+
+namespace
+{
+  using namespace CoreVideoUtilsTest;
+  using namespace ZOL;
+  using CoreVideoUtils::VColourCorrector;
+
+  IVideoSettings Settings( float i_Saturation, float i_Gamma )
+  {
+    return { i_Saturation, i_Gamma };
+  }
+
+  // Gamma 2 is a square root: entry i is 16 sqrt(i), which is never within float error of a
+  // whole number unless it is one. Gamma 0.5 squares: i x i / 256, exact in floats.
+  TEST( ColourCorrector, GammaTablesMatchTheirClosedForms )
+  {
+    VColourCorrector Corrector;
+    Corrector.Set( Settings( 1.0f, 2.0f ) );
+    for( int i = 0; i < 256; ++i )
+      ASSERT_EQ( Corrector.GetTable()[i], std::min( 255, static_cast< int >( std::floor( 16.0 * std::sqrt( i ) ) ) ) )
+          << i;
+    Corrector.Set( Settings( 1.0f, 0.5f ) );
+    for( int i = 0; i < 256; ++i )
+      ASSERT_EQ( Corrector.GetTable()[i], i * i / 256 ) << i;
+  }
+
+  TEST( ColourCorrector, TableStaysWhenGammaReturnsToOne )
+  {
+    VColourCorrector Corrector;
+    Corrector.Set( Settings( 1.0f, 0.5f ) );
+    const auto Table = Corrector.GetTable();
+    Corrector.Set( Settings( 1.0f, 1.0f ) );
+    EXPECT_EQ( Corrector.GetTable(), Table );
+    EXPECT_TRUE( Corrector.IsIdentity() );
+    Bytes Pixel = { 64, 128, 255 };
+    EXPECT_TRUE( Corrector.Apply( 1, 1, PixelFormat_R8G8B8, Pixel.data() ) );
+    EXPECT_EQ( Pixel, ( Bytes{ 64, 128, 255 } ) );
+  }
+
+  struct VCorrection
+  {
+    const char* Name;
+    float Saturation, Gamma;
+    EPixelFormat Format;
+    Bytes Before, After;
+  };
+
+  std::ostream& operator<<( std::ostream& o, const VCorrection& i_rCase )
+  {
+    return o << i_rCase.Name;
+  }
+
+  class Corrections : public ::testing::TestWithParam< VCorrection >
+  {
+  };
+
+  TEST_P( Corrections, GiveTheHandComputedBytes )
+  {
+    const VCorrection& rCase = GetParam();
+    VColourCorrector Corrector;
+    Corrector.Set( Settings( rCase.Saturation, rCase.Gamma ) );
+    Bytes Data = rCase.Before;
+    const unsigned Step = rCase.Format >= PixelFormat_R8G8B8u8 ? 4 : 3;
+    ASSERT_TRUE( Corrector.Apply( static_cast< std::int32_t >( Data.size() / Step ), 1, rCase.Format, Data.data() ) );
+    EXPECT_EQ( Data, rCase.After );
+  }
+
+  const VCorrection s_Corrections[] = {
+      // The mean of 30, 60, 90 is 60; saturation 0 is all grey, 2 doubles the distance from grey.
+      { "SaturationZeroIsGrey", 0.0f, 1.0f, PixelFormat_R8G8B8, { 30, 60, 90 }, { 60, 60, 60 } },
+      { "SaturationHalf", 0.5f, 1.0f, PixelFormat_R8G8B8, { 30, 60, 90 }, { 45, 60, 75 } },
+      { "SaturationTwoClampsAtZero", 2.0f, 1.0f, PixelFormat_B8G8R8, { 30, 60, 90 }, { 0, 60, 120 } },
+      { "SaturationTwoClampsAt255", 2.0f, 1.0f, PixelFormat_R8G8B8, { 250, 100, 100 }, { 255, 50, 50 } },
+      { "SaturationBelowZeroStopsAtGrey", -3.0f, 1.0f, PixelFormat_R8G8B8, { 30, 60, 90 }, { 60, 60, 60 } },
+      // Gamma first, then saturation: 64, 128, 255 square to 16, 64, 254; their mean is 111.33.
+      { "GammaBeforeSaturation", 0.0f, 0.5f, PixelFormat_R8G8B8, { 64, 128, 255 }, { 111, 111, 111 } },
+      { "FourthByteUntouched", 0.0f, 0.5f, PixelFormat_R8G8B8u8, { 64, 128, 255, 7 }, { 111, 111, 111, 7 } },
+      { "GammaAloneOnFourBytePixels", 1.0f, 0.5f, PixelFormat_B8G8R8u8, { 16, 32, 255, 9 }, { 1, 4, 254, 9 } },
+  };
+
+  INSTANTIATE_TEST_SUITE_P( Rules, Corrections, ::testing::ValuesIn( s_Corrections ),
+                            []( const auto& i_rInfo ) { return std::string( i_rInfo.param.Name ); } );
+
+  TEST( ColourCorrector, OnlyTheRGBFamilyIsCorrected )
+  {
+    VColourCorrector Corrector;
+    Corrector.Set( Settings( 0.0f, 2.0f ) );
+    Bytes Data( 8, 40 );
+    for( int F = 0; F < 22; ++F )
+    {
+      const bool bRGB = F >= 7 && F <= 10;
+      EXPECT_EQ( Corrector.Apply( 2, 1, static_cast< EPixelFormat >( F ), Data.data() ), bRGB ) << F;
+    }
+  }
+
+  // After a conversion from the Bayer family into R8G8B8 to B8G8R8u8 the corrector runs once;
+  // other targets and other sources are left as converted.
+  TEST( ColourCorrector, ConversionsCorrectBayerFramesIntoRGBTargetsOnly )
+  {
+    const int W = 21, H = 5;
+    const IVideoSettings Display = Settings( 0.4f, 1.8f );
+    VColourCorrector Corrector;
+    Corrector.Set( Display );
+    struct VCase
+    {
+      EPixelFormat From, To;
+      bool bCorrected;
+    };
+    const VCase Cases[] = {
+        { PixelFormat_BayerGB8, PixelFormat_R8G8B8, true },    { PixelFormat_BayerRG8, PixelFormat_B8G8R8u8, true },
+        { PixelFormat_BayerGB7, PixelFormat_R8G8B8u8, true },  { PixelFormat_BayerBG8, PixelFormat_Luminance8, false },
+        { PixelFormat_BayerGR8, PixelFormat_U8Y8V8Y8, false }, { PixelFormat_BayerGB8, PixelFormat_BayerGB6, false },
+        { PixelFormat_BayerGB8, PixelFormat_BayerGB8, false }, { PixelFormat_U8Y8V8Y8, PixelFormat_R8G8B8, false },
+        { PixelFormat_R8G8B8u8, PixelFormat_R8G8B8, false },   { PixelFormat_R8G8B8, PixelFormat_R8G8B8, false },
+    };
+    for( const VCase& rCase : Cases )
+    {
+      const Bytes Source = RandomBytes( CoreVideoUtils::FrameSizeInBytes( W, H, rCase.From ), rCase.To );
+      Bytes Plain, Displayed;
+      ASSERT_TRUE( Convert( Source, W, H, rCase.From, rCase.To, Plain ) );
+      ASSERT_TRUE(
+          Convert( Source, W, H, rCase.From, rCase.To, Displayed, CoreVideoUtils::BestInstructionSet(), Display ) );
+      if( rCase.bCorrected )
+      {
+        ASSERT_TRUE( Corrector.Apply( W, H, rCase.To, Plain.data() ) );
+      }
+      EXPECT_EQ( Displayed, Plain ) << ToString( rCase.From ) << " to " << ToString( rCase.To );
+    }
+  }
+
+  TEST( DisplayConversion, BayerIsCorrectedOnceAndRGBPassesUntouched )
+  {
+    const int W = 9, H = 4;
+    const IVideoSettings Display = Settings( 1.5f, 0.7f );
+    VColourCorrector Corrector;
+    Corrector.Set( Display );
+
+    const Bytes Bayer = RandomBytes( W * H, 1 );
+    Bytes Expected = MustConvert( Bayer, W, H, PixelFormat_BayerBG8, PixelFormat_R8G8B8 );
+    Corrector.Apply( W, H, PixelFormat_R8G8B8, Expected.data() );
+    std::vector< std::uint8_t > Shown;
+    ASSERT_TRUE( CoreVideoUtils::ConvertToDisplayRGB( Info( W, H, PixelFormat_BayerBG8 ), Bayer.data(), Bayer.size(),
+                                                      Display, Shown ) );
+    EXPECT_EQ( Shown, Expected );
+
+    const Bytes RGB = RandomBytes( W * H * 3, 2 );
+    ASSERT_TRUE( CoreVideoUtils::ConvertToDisplayRGB( Info( W, H, PixelFormat_R8G8B8 ), RGB.data(), RGB.size(), Display,
+                                                      Shown ) );
+    EXPECT_EQ( Shown, RGB );
+
+    EXPECT_FALSE( CoreVideoUtils::ConvertToDisplayRGB( Info( 100000, 100000, PixelFormat_R8G8B8 ), RGB.data(),
+                                                       RGB.size(), Display, Shown ) );
+  }
+} // namespace

@@ -1,0 +1,332 @@
+// Tiny frames whose converted pixels were worked out by hand (or, for the YUV products, with a
+// calculator and checked against the floating-point constants to within one step).
+
+#include "ConversionTestSupport.h"
+
+#include <gtest/gtest.h>
+
+namespace
+{
+  using namespace CoreVideoUtilsTest;
+  using namespace ZOL;
+
+  struct VHandCase
+  {
+    const char* Name;
+    std::int32_t Width, Height;
+    EPixelFormat From;
+    Bytes Source;
+    EPixelFormat To;
+    Bytes Expected;
+  };
+
+  std::ostream& operator<<( std::ostream& o, const VHandCase& i_rCase )
+  {
+    return o << i_rCase.Name;
+  }
+
+  Bytes SwapRedBlue( Bytes i_RGB )
+  {
+    for( std::size_t i = 0; i + 2 < i_RGB.size(); i += 3 )
+      std::swap( i_RGB[i], i_RGB[i + 2] );
+    return i_RGB;
+  }
+
+  // 10 20 30 / 40 50 60 / 70 80 90, demosaiced with neighbours outside read as 0.
+  const Bytes s_Mosaic = { 10, 20, 30, 40, 50, 60, 70, 80, 90 };
+  const Bytes s_FromRG = { 10, 15, 12, 20, 20, 25, 30, 20, 12, 40, 40, 25, 50, 50,
+                           50, 60, 60, 25, 70, 30, 12, 80, 80, 25, 90, 35, 12 };
+  const Bytes s_FromGB = { 20, 10, 10, 25, 22, 20, 30, 30, 10, 40, 32, 25, 50, 50,
+                           50, 60, 42, 25, 20, 70, 40, 25, 52, 80, 30, 90, 40 };
+
+  // One 10-bit row of two pixels: U 360, Y 324, V 960, Y 580, padded to 48 pixels.
+  Bytes TenBitRow()
+  {
+    Bytes Row( 128, 0 );
+    const std::uint32_t Words[2] = { 0x3C051168u, 580u };
+    for( int w = 0; w < 2; ++w )
+      for( int b = 0; b < 4; ++b )
+        Row[4 * w + b] = static_cast< std::uint8_t >( Words[w] >> ( 8 * b ) );
+    return Row;
+  }
+
+  const VHandCase s_HandCases[] = {
+      { "Luminance8_to_R8G8B8",
+        2,
+        1,
+        PixelFormat_Luminance8,
+        { 10, 200 },
+        PixelFormat_R8G8B8,
+        { 10, 10, 10, 200, 200, 200 } },
+      { "Luminance8_to_R8G8B8u8", 1, 1, PixelFormat_Luminance8, { 7 }, PixelFormat_R8G8B8u8, { 7, 7, 7, 255 } },
+      { "Luminance8_to_PlanarR8G8B8",
+        2,
+        1,
+        PixelFormat_Luminance8,
+        { 7, 9 },
+        PixelFormat_PlanarR8G8B8,
+        { 7, 9, 7, 9, 7, 9 } },
+      { "BayerRG8_to_R8G8B8", 3, 3, PixelFormat_BayerRG8, s_Mosaic, PixelFormat_R8G8B8, s_FromRG },
+      { "BayerBG8_to_R8G8B8", 3, 3, PixelFormat_BayerBG8, s_Mosaic, PixelFormat_R8G8B8, SwapRedBlue( s_FromRG ) },
+      { "BayerGB8_to_R8G8B8", 3, 3, PixelFormat_BayerGB8, s_Mosaic, PixelFormat_R8G8B8, s_FromGB },
+      { "BayerGR8_to_R8G8B8", 3, 3, PixelFormat_BayerGR8, s_Mosaic, PixelFormat_R8G8B8, SwapRedBlue( s_FromGB ) },
+      { "BayerRG8_to_B8G8R8", 3, 3, PixelFormat_BayerRG8, s_Mosaic, PixelFormat_B8G8R8, SwapRedBlue( s_FromRG ) },
+      // (10 + 5 + 0) / 3, (20 + 20 + 0) / 3, (30 + 5 + 0) / 3: one row, so nothing above or below.
+      { "BayerRG8_to_Luminance8", 3, 1, PixelFormat_BayerRG8, { 10, 20, 30 }, PixelFormat_Luminance8, { 5, 13, 11 } },
+      { "BayerGB6_to_BayerGB8",
+        4,
+        1,
+        PixelFormat_BayerGB6,
+        { 0x04, 0x20, 0xC4 },
+        PixelFormat_BayerGB8,
+        { 4, 8, 12, 16 } },
+      // 21 bits of samples; the last 3 bits keep the target's 0xCD.
+      { "BayerGB8_to_BayerGB7",
+        3,
+        1,
+        PixelFormat_BayerGB8,
+        { 0xFF, 0x01, 0xAB },
+        PixelFormat_BayerGB7,
+        { 0xFE, 0x02, 0xAD } },
+      { "R5G6B5_to_R8G8B8",
+        2,
+        1,
+        PixelFormat_R5G6B5,
+        { 0x1F, 0xF8, 0xE0, 0x07 },
+        PixelFormat_R8G8B8,
+        { 248, 0, 248, 0, 252, 0 } },
+      // Magenta: green 0, blue 31, red 31: (0 + 62 + 62) x 4 / 3 = 165; green alone: 63 x 4 / 3 = 84.
+      { "R5G6B5_to_Luminance8",
+        2,
+        1,
+        PixelFormat_R5G6B5,
+        { 0x1F, 0xF8, 0xE0, 0x07 },
+        PixelFormat_Luminance8,
+        { 165, 84 } },
+      { "R8G8B8_to_R5G6B5",
+        2,
+        1,
+        PixelFormat_R8G8B8,
+        { 255, 255, 255, 0x12, 0x34, 0x56 },
+        PixelFormat_R5G6B5,
+        { 0xFF, 0xFF, 0xAA, 0x11 } },
+      { "R8G8B8_to_Luminance8", 1, 1, PixelFormat_R8G8B8, { 10, 20, 31 }, PixelFormat_Luminance8, { 20 } },
+      { "B8G8R8_to_R8G8B8", 1, 1, PixelFormat_B8G8R8, { 3, 2, 1 }, PixelFormat_R8G8B8, { 1, 2, 3 } },
+      { "R8G8B8u8_to_R8G8B8", 1, 1, PixelFormat_R8G8B8u8, { 1, 2, 3, 99 }, PixelFormat_R8G8B8, { 1, 2, 3 } },
+      { "B8G8R8u8_to_R8G8B8", 1, 1, PixelFormat_B8G8R8u8, { 3, 2, 1, 99 }, PixelFormat_R8G8B8, { 1, 2, 3 } },
+      { "B8G8R8u8_to_B8G8R8", 1, 1, PixelFormat_B8G8R8u8, { 3, 2, 1, 99 }, PixelFormat_B8G8R8, { 3, 2, 1 } },
+      // Red then green: U from the red pixel, V from the green one, no averaging.
+      { "R8G8B8_to_U8Y8V8Y8",
+        2,
+        1,
+        PixelFormat_R8G8B8,
+        { 255, 0, 0, 0, 255, 0 },
+        PixelFormat_U8Y8V8Y8,
+        { 90, 76, 0, 149 } },
+      { "R8G8B8_to_Y8U8Y8V8",
+        2,
+        1,
+        PixelFormat_R8G8B8,
+        { 0, 0, 255, 255, 255, 255 },
+        PixelFormat_Y8U8Y8V8,
+        { 29, 239, 254, 128 } },
+      { "R8G8B8_to_PlanarY8U8V8",
+        2,
+        1,
+        PixelFormat_R8G8B8,
+        { 255, 0, 0, 0, 255, 0 },
+        PixelFormat_PlanarY8U8V8,
+        { 76, 149, 90, 0 } },
+      { "U8Y8V8Y8_to_R8G8B8",
+        4,
+        1,
+        PixelFormat_U8Y8V8Y8,
+        { 90, 81, 240, 145, 54, 145, 34, 210 },
+        PixelFormat_R8G8B8,
+        { 238, 14, 13, 255, 78, 77, 13, 237, 14, 78, 255, 79 } },
+      { "Y8U8Y8V8_to_R8G8B8",
+        2,
+        1,
+        PixelFormat_Y8U8Y8V8,
+        { 81, 90, 145, 240 },
+        PixelFormat_R8G8B8,
+        { 238, 14, 13, 255, 78, 77 } },
+      { "U8Y8V8Y8_greys_to_R8G8B8",
+        2,
+        1,
+        PixelFormat_U8Y8V8Y8,
+        { 128, 16, 128, 235 },
+        PixelFormat_R8G8B8,
+        { 16, 16, 16, 235, 235, 235 } },
+      { "U8Y8V8Y8_to_Luminance8",
+        2,
+        1,
+        PixelFormat_U8Y8V8Y8,
+        { 90, 81, 240, 145 },
+        PixelFormat_Luminance8,
+        { 81, 145 } },
+      { "U8Y8V8Y8_to_Y8U8Y8V8", 2, 1, PixelFormat_U8Y8V8Y8, { 1, 2, 3, 4 }, PixelFormat_Y8U8Y8V8, { 2, 1, 4, 3 } },
+      { "U8Y8V8Y8_to_U10Y10V10Y10",
+        2,
+        1,
+        PixelFormat_U8Y8V8Y8,
+        { 90, 81, 240, 145 },
+        PixelFormat_U10Y10V10Y10,
+        TenBitRow() },
+      { "U10Y10V10Y10_to_R8G8B8",
+        2,
+        1,
+        PixelFormat_U10Y10V10Y10,
+        TenBitRow(),
+        PixelFormat_R8G8B8,
+        { 238, 14, 13, 255, 78, 77 } },
+      { "U10Y10V10Y10_to_U8Y8V8Y8",
+        2,
+        1,
+        PixelFormat_U10Y10V10Y10,
+        TenBitRow(),
+        PixelFormat_U8Y8V8Y8,
+        { 90, 81, 240, 145 } },
+      { "Luminance7_to_Luminance8",
+        8,
+        1,
+        PixelFormat_Luminance7,
+        { 0x02, 0x08, 0x18, 0x40, 0xA1, 0x83, 0x88 },
+        PixelFormat_Luminance8,
+        { 2, 4, 6, 8, 10, 12, 14, 16 } },
+      { "Luminance6_to_R8G8B8",
+        4,
+        1,
+        PixelFormat_Luminance6,
+        { 0x04, 0x20, 0xC4 },
+        PixelFormat_R8G8B8,
+        { 4, 4, 4, 8, 8, 8, 12, 12, 12, 16, 16, 16 } },
+      { "Luminance8_to_Luminance7",
+        3,
+        1,
+        PixelFormat_Luminance8,
+        { 0xFF, 0x01, 0xAB },
+        PixelFormat_Luminance7,
+        { 0xFE, 0x02, 0xAD } },
+      { "PlanarY8U8V8_to_R8G8B8u8",
+        2,
+        1,
+        PixelFormat_PlanarY8U8V8,
+        { 81, 145, 90, 240 },
+        PixelFormat_R8G8B8u8,
+        { 238, 14, 13, 255, 255, 78, 77, 255 } },
+      { "PlanarR8G8B8_to_R8G8B8",
+        2,
+        1,
+        PixelFormat_PlanarR8G8B8,
+        { 1, 2, 3, 4, 5, 6 },
+        PixelFormat_R8G8B8,
+        { 1, 3, 5, 2, 4, 6 } },
+      { "PlanarR8G8B8_to_Luminance8",
+        2,
+        1,
+        PixelFormat_PlanarR8G8B8,
+        { 10, 255, 20, 255, 31, 254 },
+        PixelFormat_Luminance8,
+        { 20, 254 } },
+  };
+
+  class HandComputedPixels : public ::testing::TestWithParam< VHandCase >
+  {
+  };
+
+  TEST_P( HandComputedPixels, EveryInstructionSetGivesTheHandComputedBytes )
+  {
+    const VHandCase& rCase = GetParam();
+    for( auto Set : { CoreVideoUtils::EInstructionSet::Scalar, CoreVideoUtils::EInstructionSet::SSE2,
+                      CoreVideoUtils::EInstructionSet::AVX2 } )
+    {
+      if( !CoreVideoUtils::IsSupported( Set ) )
+        continue;
+      Bytes Target;
+      ASSERT_TRUE( Convert( rCase.Source, rCase.Width, rCase.Height, rCase.From, rCase.To, Target, Set ) )
+          << CoreVideoUtils::ToString( Set );
+      EXPECT_EQ( Target, rCase.Expected ) << CoreVideoUtils::ToString( Set );
+    }
+  }
+
+  INSTANTIATE_TEST_SUITE_P( Formats, HandComputedPixels, ::testing::ValuesIn( s_HandCases ),
+                            []( const auto& i_rInfo ) { return std::string( i_rInfo.param.Name ); } );
+
+  // The demosaic written a second way: by the colour of each site in the 2 x 2 pattern and the
+  // neighbours of the colour wanted, instead of the converter's walking site kind.
+  Bytes ReferenceDemosaic( const Bytes& i_rMosaic, int W, int H, const char* i_pPattern )
+  {
+    auto At = [&]( int x, int y ) -> int { return x < 0 || y < 0 || x >= W || y >= H ? 0 : i_rMosaic[y * W + x]; };
+    auto ColourAt = [&]( int x, int y ) { return i_pPattern[( y & 1 ) * 2 + ( x & 1 )]; };
+    Bytes Result( 3 * W * H );
+    for( int y = 0; y < H; ++y )
+      for( int x = 0; x < W; ++x )
+      {
+        const char Site = ColourAt( x, y );
+        const int Cross = ( At( x, y - 1 ) + At( x, y + 1 ) + At( x - 1, y ) + At( x + 1, y ) ) >> 2;
+        const int Diagonal = ( At( x - 1, y - 1 ) + At( x + 1, y - 1 ) + At( x - 1, y + 1 ) + At( x + 1, y + 1 ) ) >> 2;
+        const int Vertical = ( At( x, y - 1 ) + At( x, y + 1 ) ) >> 1;
+        const int Horizontal = ( At( x - 1, y ) + At( x + 1, y ) ) >> 1;
+        for( int c = 0; c < 3; ++c )
+        {
+          const char Wanted = "RGB"[c];
+          int Value;
+          if( Site == Wanted )
+            Value = At( x, y );
+          else if( Wanted == 'G' )
+            Value = Cross;
+          else if( Site == 'G' )
+            Value = ColourAt( x + 1, y ) == Wanted ? Horizontal : Vertical; // the wanted colour's row or column
+          else
+            Value = Diagonal; // red and blue sites face each other across corners
+          Result[3 * ( y * W + x ) + c] = static_cast< std::uint8_t >( Value );
+        }
+      }
+    return Result;
+  }
+
+  struct VPatternCase
+  {
+    EPixelFormat Format;
+    const char* Pattern;
+  };
+
+  class DemosaicAgainstSecondMethod
+      : public ::testing::TestWithParam< std::tuple< VPatternCase, std::pair< int, int > > >
+  {
+  };
+
+  TEST_P( DemosaicAgainstSecondMethod, Matches )
+  {
+    const auto& [Pattern, Size] = GetParam();
+    const Bytes Mosaic = RandomBytes( Size.first * Size.second, 77 );
+    const Bytes Expected = ReferenceDemosaic( Mosaic, Size.first, Size.second, Pattern.Pattern );
+    for( auto Set : { CoreVideoUtils::EInstructionSet::Scalar, CoreVideoUtils::EInstructionSet::SSE2,
+                      CoreVideoUtils::EInstructionSet::AVX2 } )
+    {
+      if( !CoreVideoUtils::IsSupported( Set ) )
+        continue;
+      Bytes Target;
+      ASSERT_TRUE( Convert( Mosaic, Size.first, Size.second, Pattern.Format, PixelFormat_R8G8B8, Target, Set ) );
+      EXPECT_EQ( Target, Expected ) << CoreVideoUtils::ToString( Set );
+    }
+  }
+
+  std::string PatternCaseName( const ::testing::TestParamInfo< DemosaicAgainstSecondMethod::ParamType >& i_rInfo )
+  {
+    const auto& [Pattern, Size] = i_rInfo.param;
+    return std::string( ZOL::ToString( Pattern.Format ) ) + "_" + std::to_string( Size.first ) + "x" +
+           std::to_string( Size.second );
+  }
+
+  INSTANTIATE_TEST_SUITE_P( Patterns, DemosaicAgainstSecondMethod,
+                            ::testing::Combine( ::testing::Values( VPatternCase{ PixelFormat_BayerRG8, "RGGB" },
+                                                                   VPatternCase{ PixelFormat_BayerGB8, "GBRG" },
+                                                                   VPatternCase{ PixelFormat_BayerGR8, "GRBG" },
+                                                                   VPatternCase{ PixelFormat_BayerBG8, "BGGR" } ),
+                                                ::testing::Values( std::make_pair( 1, 1 ), std::make_pair( 2, 2 ),
+                                                                   std::make_pair( 5, 3 ), std::make_pair( 37, 9 ),
+                                                                   std::make_pair( 64, 4 ) ) ),
+                            PatternCaseName );
+} // namespace

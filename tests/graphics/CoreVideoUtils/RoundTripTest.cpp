@@ -1,0 +1,124 @@
+// Conversions that have an inverse: going there and back loses exactly the bits the narrower
+// format cannot hold, and nothing else.
+
+#include "ConversionTestSupport.h"
+#include "graphics/CoreVideoUtils/PixelKernels.h"
+
+#include <gtest/gtest.h>
+
+namespace
+{
+  using namespace CoreVideoUtilsTest;
+  using namespace ZOL;
+
+  struct VRoundTrip
+  {
+    const char* Name;
+    EPixelFormat From, Via;
+    std::uint8_t Mask[4]; // the bits of each byte of a pixel of From that survive
+    unsigned Step;
+  };
+
+  std::ostream& operator<<( std::ostream& o, const VRoundTrip& i_rTrip )
+  {
+    return o << i_rTrip.Name;
+  }
+
+  const VRoundTrip s_RoundTrips[] = {
+      { "R8G8B8_via_B8G8R8", PixelFormat_R8G8B8, PixelFormat_B8G8R8, { 0xFF, 0xFF, 0xFF }, 3 },
+      { "R8G8B8_via_R8G8B8u8", PixelFormat_R8G8B8, PixelFormat_R8G8B8u8, { 0xFF, 0xFF, 0xFF }, 3 },
+      { "R8G8B8_via_B8G8R8u8", PixelFormat_R8G8B8, PixelFormat_B8G8R8u8, { 0xFF, 0xFF, 0xFF }, 3 },
+      { "R8G8B8_via_PlanarR8G8B8", PixelFormat_R8G8B8, PixelFormat_PlanarR8G8B8, { 0xFF, 0xFF, 0xFF }, 3 },
+      { "R8G8B8_via_R5G6B5", PixelFormat_R8G8B8, PixelFormat_R5G6B5, { 0xF8, 0xFC, 0xF8 }, 3 },
+      { "U8Y8V8Y8_via_Y8U8Y8V8", PixelFormat_U8Y8V8Y8, PixelFormat_Y8U8Y8V8, { 0xFF, 0xFF }, 2 },
+      { "U8Y8V8Y8_via_U10Y10V10Y10", PixelFormat_U8Y8V8Y8, PixelFormat_U10Y10V10Y10, { 0xFF, 0xFF }, 2 },
+      { "Y8U8Y8V8_via_U10Y10V10Y10", PixelFormat_Y8U8Y8V8, PixelFormat_U10Y10V10Y10, { 0xFF, 0xFF }, 2 },
+      { "Luminance8_via_Luminance7", PixelFormat_Luminance8, PixelFormat_Luminance7, { 0xFE }, 1 },
+      { "Luminance8_via_Luminance6", PixelFormat_Luminance8, PixelFormat_Luminance6, { 0xFC }, 1 },
+      { "BayerGB8_via_BayerGB7", PixelFormat_BayerGB8, PixelFormat_BayerGB7, { 0xFE }, 1 },
+      { "BayerGB8_via_BayerGB6", PixelFormat_BayerGB8, PixelFormat_BayerGB6, { 0xFC }, 1 },
+  };
+
+  class RoundTrips : public ::testing::TestWithParam< std::tuple< VRoundTrip, std::pair< int, int > > >
+  {
+  };
+
+  TEST_P( RoundTrips, LoseOnlyTheNarrowFormatsBits )
+  {
+    const auto& [Trip, Size] = GetParam();
+    const auto [W, H] = Size;
+    const Bytes Source = RandomBytes( CoreVideoUtils::FrameSizeInBytes( W, H, Trip.From ), W * 7 + H );
+    const Bytes Via = MustConvert( Source, W, H, Trip.From, Trip.Via );
+    ASSERT_FALSE( Via.empty() );
+    const Bytes Back = MustConvert( Via, W, H, Trip.Via, Trip.From );
+    ASSERT_EQ( Back.size(), Source.size() );
+    Bytes Expected = Source;
+    for( std::size_t i = 0; i < Expected.size(); ++i )
+      Expected[i] &= Trip.Mask[i % Trip.Step];
+    EXPECT_EQ( Back, Expected );
+  }
+
+  std::string RoundTripName( const ::testing::TestParamInfo< RoundTrips::ParamType >& i_rInfo )
+  {
+    const auto& [Trip, Size] = i_rInfo.param;
+    return std::string( Trip.Name ) + "_" + std::to_string( Size.first ) + "x" + std::to_string( Size.second );
+  }
+
+  INSTANTIATE_TEST_SUITE_P( Pairs, RoundTrips,
+                            ::testing::Combine( ::testing::ValuesIn( s_RoundTrips ),
+                                                // Widths around the 48-pixel rows of the 10-bit format and an odd run
+                                                // longer than the converter's 4608-pixel runs.
+                                                ::testing::Values( std::make_pair( 2, 1 ), std::make_pair( 47, 2 ),
+                                                                   std::make_pair( 48, 3 ), std::make_pair( 98, 2 ),
+                                                                   std::make_pair( 4610, 2 ),
+                                                                   std::make_pair( 7, 5 ) ) ),
+                            RoundTripName );
+
+  // Samples read one bit at a time, most significant first: the second method for the packed forms.
+  std::uint8_t SampleByBits( const Bytes& i_rStream, unsigned i_Bits, std::uint64_t i_Index )
+  {
+    unsigned Value = 0;
+    for( unsigned b = 0; b < i_Bits; ++b )
+    {
+      const std::uint64_t Bit = i_Index * i_Bits + b;
+      Value = ( Value << 1 ) | ( ( i_rStream[Bit / 8] >> ( 7 - Bit % 8 ) ) & 1u );
+    }
+    return static_cast< std::uint8_t >( Value << ( 8 - i_Bits ) );
+  }
+
+  class PackedSamples : public ::testing::TestWithParam< std::tuple< unsigned, int, int > >
+  {
+  };
+
+  // Any start and length, including ones that begin and end inside a byte.
+  TEST_P( PackedSamples, UnpackMatchesBitByBitAndPackLeavesOtherBitsAlone )
+  {
+    const auto [Bits, First, Count] = GetParam();
+    const std::uint64_t StreamBytes = ( ( First + Count ) * Bits + 7 ) / 8;
+    const Bytes Stream = RandomBytes( StreamBytes, Bits * 1000 + First + Count );
+    Bytes Unpacked( Count );
+    CoreVideoUtils::Kernels::UnpackSamples( Stream.data(), Stream.size(), Bits, First, Count, Unpacked.data() );
+    for( int i = 0; i < Count; ++i )
+      ASSERT_EQ( Unpacked[i], SampleByBits( Stream, Bits, First + i ) ) << "sample " << i;
+
+    // Packing new values over the same samples changes those bits only.
+    const Bytes Values = RandomBytes( Count, 99 );
+    Bytes Packed = Stream;
+    CoreVideoUtils::Kernels::PackSamples( Values.data(), Bits, First, Count, Packed.data(), Packed.size() );
+    for( std::uint64_t Bit = 0; Bit < StreamBytes * 8; ++Bit )
+    {
+      const bool bInSamples = Bit >= First * Bits && Bit < ( First + Count ) * Bits;
+      if( !bInSamples )
+      {
+        ASSERT_EQ( ( Packed[Bit / 8] >> ( 7 - Bit % 8 ) ) & 1, ( Stream[Bit / 8] >> ( 7 - Bit % 8 ) ) & 1 )
+            << "bit " << Bit;
+      }
+    }
+    for( int i = 0; i < Count; ++i )
+      ASSERT_EQ( SampleByBits( Packed, Bits, First + i ), Values[i] & ( 0xFF << ( 8 - Bits ) ) ) << "sample " << i;
+  }
+
+  INSTANTIATE_TEST_SUITE_P( Runs, PackedSamples,
+                            ::testing::Combine( ::testing::Values( 6u, 7u ), ::testing::Values( 0, 1, 5, 8, 13 ),
+                                                ::testing::Values( 1, 7, 8, 9, 31, 32, 33, 100, 1001 ) ) );
+} // namespace
