@@ -1,0 +1,32 @@
+#pragma once
+
+// One call turns the stored bytes of a frame into pixels, whatever the payload: every reader
+// and the video source go through VideoFrameDecoder.
+
+#include "fileio/VideoEncoding/IH264Decoder.h"
+#include "videointerface/IBuffer.h"
+#include "videointerface/IVideoFrameInfo.h"
+
+#include <cstdint>
+#include <memory>
+
+namespace VideoEncoding
+{
+  // Decodes io_rBuffer in place of itself: on entry it holds the stored frame, on success the
+  // decoded one (the same buffer for Uncompressed, which is never copied). io_VideoFrameInfo
+  // describes the result; decoders may change its format and size. i_rH264Decoder may be null
+  // for all payloads but VideoH264.
+  bool VideoFrameDecoder( ZOL::EVideoPayload i_Payload, ZOL::IVideoFrameInfo& io_VideoFrameInfo,
+                          std::shared_ptr< ZOL::IBuffer >& io_rBuffer,
+                          const std::shared_ptr< ZOL::IBufferAllocator >& i_rAllocator,
+                          const std::shared_ptr< ZOL::IBufferAllocator >& i_rTemporaryAllocator,
+                          const std::shared_ptr< ZOL::IH264Decoder >& i_rH264Decoder );
+
+  // The pixel format that decoded frames of a payload will have, given the format stored in
+  // the file. False, with a log line and o_rPixelFormat untouched, for an unknown payload.
+  bool PixelFormatForPayloadFormat( ZOL::EVideoPayload i_Payload, ZOL::EPixelFormat i_PixelFormat,
+                                    ZOL::EPixelFormat& o_rPixelFormat, bool i_bForceColour );
+
+  // Bytes of a decoded frame of that description, truncated to 32 bits as the decoders take it.
+  std::uint32_t FrameBufferSize( const ZOL::IVideoFrameInfo& i_rVideoFrameInfo );
+} // namespace VideoEncoding
