@@ -1,0 +1,247 @@
+#include "fileio/VideoEncoding/VideoFrameDecoder.h"
+
+#include "services/Log.h"
+#include "videointerface/BufferAllocators.h"
+
+#include <gtest/gtest.h>
+
+#include <cstring>
+#include <string>
+#include <vector>
+
+namespace
+{
+  using namespace ZOL;
+  using VideoEncoding::VideoFrameDecoder;
+
+  class VLogCapture
+  {
+  public:
+    explicit VLogCapture( std::string i_Category ) : m_Category( std::move( i_Category ) )
+    {
+      m_Handle = GlobalLog().AddSink(
+          [this]( const ILogRecord& i_rRecord )
+          {
+            if( i_rRecord.Category == m_Category )
+              m_Lines.push_back( std::to_string( i_rRecord.Level ) + " " + i_rRecord.Message );
+          },
+          LogDetail );
+    }
+    ~VLogCapture() { GlobalLog().RemoveSink( m_Handle ); }
+    const std::vector< std::string >& Lines() const { return m_Lines; }
+
+  private:
+    std::string m_Category;
+    std::vector< std::string > m_Lines;
+    int m_Handle = 0;
+  };
+
+  IVideoFrameInfo Info( std::int32_t i_Width, std::int32_t i_Height, EPixelFormat i_Format )
+  {
+    IVideoFrameInfo Result;
+    Result.ImageWidth = i_Width;
+    Result.ImageHeight = i_Height;
+    Result.PixelFormat = i_Format;
+    return Result;
+  }
+
+  class FrameDecoder : public ::testing::Test
+  {
+  protected:
+    std::shared_ptr< IBuffer > Payload( const std::vector< std::uint8_t >& i_rBytes )
+    {
+      std::shared_ptr< IBuffer > pBuffer;
+      m_pReaderAllocator->Allocate( pBuffer, i_rBytes.size() );
+      if( !i_rBytes.empty() )
+        std::memcpy( pBuffer->GetData(), i_rBytes.data(), i_rBytes.size() );
+      return pBuffer;
+    }
+
+    bool Decode( EVideoPayload i_Payload, IVideoFrameInfo& io_rInfo, std::shared_ptr< IBuffer >& io_rBuffer,
+                 const std::shared_ptr< IH264Decoder >& i_pH264 = nullptr )
+    {
+      return VideoFrameDecoder( i_Payload, io_rInfo, io_rBuffer, m_pFrameAllocator, m_pTemporaryAllocator, i_pH264 );
+    }
+
+    std::shared_ptr< IBufferAllocator > m_pReaderAllocator = std::make_shared< VReaderBufferAllocator >();
+    std::shared_ptr< IBufferAllocator > m_pFrameAllocator = std::make_shared< VFrameBufferAllocator >();
+    std::shared_ptr< IBufferAllocator > m_pTemporaryAllocator = std::make_shared< VFrameBufferAllocator >();
+  };
+
+  TEST_F( FrameDecoder, UncompressedKeepsTheVeryBuffer )
+  {
+    auto pBuffer = Payload( std::vector< std::uint8_t >( 4 * 3 * 3, 9 ) );
+    IBuffer* pBefore = pBuffer.get();
+    IVideoFrameInfo FrameInfo = Info( 4, 3, PixelFormat_B8G8R8 );
+    EXPECT_TRUE( Decode( VideoPayload_Uncompressed, FrameInfo, pBuffer ) );
+    EXPECT_EQ( pBuffer.get(), pBefore );
+    EXPECT_EQ( FrameInfo, Info( 4, 3, PixelFormat_B8G8R8 ) );
+  }
+
+  // A description that promises more bytes than the buffer holds would have the surface read
+  // past its end: it is refused.
+  TEST_F( FrameDecoder, UncompressedFrameSmallerThanItsDescriptionFails )
+  {
+    struct VCase
+    {
+      IVideoFrameInfo FrameInfo;
+      std::size_t Bytes;
+    };
+    const VCase Cases[] = {
+        { Info( 4, 3, PixelFormat_R8G8B8 ), 35 },
+        { Info( 64, 2, PixelFormat_U10Y10V10Y10 ), 2 * 128 * 2 - 1 },
+        { Info( 9, 1, PixelFormat_Luminance7 ), 7 },
+        { Info( 4, 3, PixelFormat_Unspecified ), 100 },
+        { Info( 0x7FFFFFFF, 0x7FFFFFFF, PixelFormat_R8G8B8u8 ), 100 },
+        { Info( -4, 3, PixelFormat_Luminance8 ), 100 },
+    };
+    for( const VCase& rCase : Cases )
+    {
+      VLogCapture Log( "VideoEncoding" );
+      auto pBuffer = Payload( std::vector< std::uint8_t >( rCase.Bytes ) );
+      IVideoFrameInfo FrameInfo = rCase.FrameInfo;
+      EXPECT_FALSE( Decode( VideoPayload_Uncompressed, FrameInfo, pBuffer ) ) << rCase.Bytes;
+      EXPECT_EQ( Log.Lines().size(), 1u );
+    }
+    auto pBuffer = Payload( std::vector< std::uint8_t >( 35 ) );
+    VLogCapture Log( "VideoEncoding" );
+    IVideoFrameInfo FrameInfo = Info( 4, 3, PixelFormat_R8G8B8 );
+    Decode( VideoPayload_Uncompressed, FrameInfo, pBuffer );
+    EXPECT_EQ( Log.Lines(),
+               std::vector< std::string >{ "2 Uncompressed frame of 35 bytes does not hold a 4 x 3 frame of "
+                                           "pixel format 'R8G8B8' (36 bytes)." } );
+  }
+
+  TEST_F( FrameDecoder, NoBufferIsNoFrame )
+  {
+    std::shared_ptr< IBuffer > pNone;
+    IVideoFrameInfo FrameInfo = Info( 4, 3, PixelFormat_R8G8B8 );
+    for( EVideoPayload Payload : { VideoPayload_Uncompressed, VideoPayload_ImageJPEG, VideoPayload_VideoH264 } )
+      EXPECT_FALSE( Decode( Payload, FrameInfo, pNone ) );
+  }
+
+  TEST_F( FrameDecoder, H264WithoutDecoderLogsEveryFrameAndKeepsTheBuffer )
+  {
+    VLogCapture Log( "VideoEncoding" );
+    auto pBuffer = Payload( { 0, 0, 0, 1, 0x65 } );
+    IBuffer* pBefore = pBuffer.get();
+    IVideoFrameInfo FrameInfo = Info( 16, 16, PixelFormat_U8Y8V8Y8 );
+    EXPECT_FALSE( Decode( VideoPayload_VideoH264, FrameInfo, pBuffer ) );
+    EXPECT_FALSE( Decode( VideoPayload_VideoH264, FrameInfo, pBuffer ) );
+    EXPECT_EQ( pBuffer.get(), pBefore );
+    EXPECT_EQ( Log.Lines(),
+               std::vector< std::string >( 2, "2 H.264 video for decoding but no H.264 decoder provided." ) );
+  }
+
+  // A stand-in decoder: checks what it is given and answers as told.
+  class VFakeH264Decoder : public IH264Decoder
+  {
+  public:
+    VFakeH264Decoder( std::shared_ptr< IBufferAllocator > i_pAllocator, bool i_bSucceed, bool i_bGiveFrame )
+        : m_pAllocator( std::move( i_pAllocator ) ), m_bSucceed( i_bSucceed ), m_bGiveFrame( i_bGiveFrame )
+    {
+    }
+    bool Decode( const IBufferConst& i_rInput, EPixelFormat i_PixelFormat, std::shared_ptr< IBuffer >& o_rOutput,
+                 IVideoFrameInfo& io_VideoFrameInfo ) override
+    {
+      InputSize = i_rInput.GetSize();
+      Wished = i_PixelFormat;
+      if( m_bGiveFrame )
+      {
+        io_VideoFrameInfo.ImageWidth = 2;
+        io_VideoFrameInfo.ImageHeight = 2;
+        io_VideoFrameInfo.PixelFormat = PixelFormat_U8Y8V8Y8;
+        m_pAllocator->Allocate( o_rOutput, 8 );
+      }
+      return m_bSucceed;
+    }
+    std::uint64_t InputSize = 0;
+    EPixelFormat Wished = PixelFormat_Unspecified;
+
+  private:
+    std::shared_ptr< IBufferAllocator > m_pAllocator;
+    bool m_bSucceed, m_bGiveFrame;
+  };
+
+  TEST_F( FrameDecoder, H264DecoderOutputReplacesTheStoredBytes )
+  {
+    auto pDecoder = std::make_shared< VFakeH264Decoder >( m_pFrameAllocator, true, true );
+    auto pBuffer = Payload( { 0, 0, 0, 1, 0x65, 0x88 } );
+    IVideoFrameInfo FrameInfo = Info( 640, 480, PixelFormat_Y8U8Y8V8 );
+    EXPECT_TRUE( Decode( VideoPayload_VideoH264, FrameInfo, pBuffer, pDecoder ) );
+    EXPECT_EQ( pDecoder->InputSize, 6u );
+    EXPECT_EQ( pDecoder->Wished, PixelFormat_Y8U8Y8V8 );
+    ASSERT_TRUE( pBuffer );
+    EXPECT_EQ( pBuffer->GetSize(), 8u );
+    EXPECT_EQ( FrameInfo, Info( 2, 2, PixelFormat_U8Y8V8Y8 ) );
+  }
+
+  TEST_F( FrameDecoder, H264SuccessWithoutAFrameIsAFailure )
+  {
+    for( const auto& [bSucceed, bGiveFrame] :
+         { std::make_pair( true, false ), std::make_pair( false, true ), std::make_pair( false, false ) } )
+    {
+      auto pDecoder = std::make_shared< VFakeH264Decoder >( m_pFrameAllocator, bSucceed, bGiveFrame );
+      auto pBuffer = Payload( { 0, 0, 1, 0x67 } );
+      IVideoFrameInfo FrameInfo = Info( 640, 480, PixelFormat_U8Y8V8Y8 );
+      EXPECT_FALSE( Decode( VideoPayload_VideoH264, FrameInfo, pBuffer, pDecoder ) );
+      // The stored bytes are released either way; what the decoder gave, if anything, is kept.
+      EXPECT_EQ( pBuffer != nullptr, bGiveFrame );
+    }
+  }
+
+  // No JPEG, PNG or TIFF reader is built into this program yet: their frames are missing, and
+  // the signatures are still checked for PNG and TIFF.
+  struct VStillImage
+  {
+    const char* Name;
+    EVideoPayload Payload;
+    std::vector< std::uint8_t > Bytes;
+    const char* Assertion; // expected text of the failed check, or null
+  };
+
+  std::ostream& operator<<( std::ostream& o, const VStillImage& i_rCase )
+  {
+    return o << i_rCase.Name;
+  }
+
+  class StillImages : public FrameDecoder, public ::testing::WithParamInterface< VStillImage >
+  {
+  };
+
+  TEST_P( StillImages, AreMissingFramesWithTheirSignatureChecked )
+  {
+    const VStillImage& rCase = GetParam();
+    VLogCapture Log( "System" );
+    auto pBuffer = Payload( rCase.Bytes );
+    IVideoFrameInfo FrameInfo = Info( 8, 8, PixelFormat_R8G8B8 );
+    EXPECT_FALSE( Decode( rCase.Payload, FrameInfo, pBuffer ) );
+    if( rCase.Assertion == nullptr )
+      EXPECT_TRUE( Log.Lines().empty() );
+    else
+    {
+      ASSERT_EQ( Log.Lines().size(), 1u );
+      EXPECT_NE( Log.Lines()[0].find( rCase.Assertion ), std::string::npos ) << Log.Lines()[0];
+    }
+  }
+
+  const char* const s_PNGCheck = "std::memcmp( pInData, s_MagicPNG, sizeof( s_MagicPNG ) ) == 0";
+  const char* const s_TIFFCheck = "std::memcmp( pInData, s_MagicTIFF, sizeof( s_MagicTIFF ) ) == 0";
+
+  const VStillImage s_StillImages[] = {
+      { "JPEG", VideoPayload_ImageJPEG, { 0xFF, 0xD8, 0xFF, 0xE0, 0, 0x10 }, nullptr },
+      { "EmptyJPEG", VideoPayload_ImageJPEG, {}, nullptr },
+      { "PNG", VideoPayload_ImagePNG, { 0x89, 'P', 'N', 'G', 0x0D, 0x0A, 0x1A, 0x0A, 0, 0, 0, 13 }, nullptr },
+      { "PNGWithBadSignature", VideoPayload_ImagePNG, { 0x89, 'P', 'N', 'G', 0x0D, 0x0A, 0x1A, 0x0B, 0 }, s_PNGCheck },
+      { "PNGCutInsideSignature", VideoPayload_ImagePNG, { 0x89, 'P', 'N' }, s_PNGCheck },
+      { "EmptyPNG", VideoPayload_ImagePNG, {}, s_PNGCheck },
+      { "LittleEndianTIFF", VideoPayload_ImageTIFF, { 0x49, 0x49, 0x2A, 0x00, 8, 0, 0, 0 }, nullptr },
+      { "BigEndianTIFF", VideoPayload_ImageTIFF, { 0x4D, 0x4D, 0x00, 0x2A, 0, 0, 0, 8 }, s_TIFFCheck },
+      { "TIFFCutInsideSignature", VideoPayload_ImageTIFF, { 0x49, 0x49 }, s_TIFFCheck },
+      { "PayloadNone", VideoPayload_None, { 1, 2, 3 }, nullptr },
+      { "PayloadOutOfRange", static_cast< EVideoPayload >( 6 ), { 1, 2, 3 }, nullptr },
+  };
+
+  INSTANTIATE_TEST_SUITE_P( Payloads, StillImages, ::testing::ValuesIn( s_StillImages ),
+                            []( const auto& i_rInfo ) { return std::string( i_rInfo.param.Name ); } );
+} // namespace
