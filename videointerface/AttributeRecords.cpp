@@ -150,7 +150,8 @@ namespace ZOL
     io_rInfo.SensorPixelsPerImagePixelX = 1;
     io_rInfo.SensorPixelsPerImagePixelY = 1;
     io_rInfo.PixelAspectRatio = 1.0;
-    io_rInfo.Flags &= ~static_cast< std::uint32_t >( IVideoFrameInfo::Flag_Inverted );
+    // Both flags are decided by this read: Inverted below, the conversion flag from the history.
+    io_rInfo.Flags = 0;
 
     i_rFrameKeys.Get( s_FrameSensorX, io_rInfo.SensorPixelsPerImagePixelX );
     i_rFrameKeys.Get( s_FrameSensorY, io_rInfo.SensorPixelsPerImagePixelY );
@@ -184,8 +185,6 @@ namespace ZOL
 
     if( HasConversionDistortion( i_rOuter ) )
       io_rInfo.Flags |= IVideoFrameInfo::Flag_HasConversionDistortion;
-    else
-      io_rInfo.Flags &= ~static_cast< std::uint32_t >( IVideoFrameInfo::Flag_HasConversionDistortion );
 
     FromString( PixelFormatText, io_rInfo.PixelFormat );
     return io_rInfo.IsValid();

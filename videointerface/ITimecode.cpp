@@ -73,11 +73,13 @@ namespace ZOL
       io_rTimecode.TickRemainder = static_cast< std::uint32_t >( Rest - Frame * TicksPerFrame );
       if( io_rTimecode.Standards == TimecodeStandard_29_97_DF )
       {
-        // Real frames to labels: two labels are skipped at the start of every minute but each
-        // tenth. The divisions truncate, as the counting does.
-        const std::int64_t TenMinutes = ( Frame - 2 ) / 17982;
-        const std::int64_t Minutes = ( Frame - 2 * TenMinutes - 2 ) / 1798;
-        Frame = Frame + 2 * Minutes - 2 * ( ( Frame + 2 * Minutes ) / 18000 );
+        // Real frames to labels: every ten minutes hold 17982 real frames, and each minute but
+        // the first of the ten skips labels 0 and 1. Computed per ten-minute block, so that the
+        // count stays exact at the end of every block and AddTicks, which counts labels back to
+        // frames, is its exact inverse.
+        const std::int64_t Blocks = Frame / 17982;
+        const std::int64_t InBlock = Frame % 17982;
+        Frame += 18 * Blocks + ( InBlock >= 2 ? 2 * ( ( InBlock - 2 ) / 1798 ) : 0 );
       }
       const std::int64_t Counted = pRow->FramesPerSecond;
       io_rTimecode.Frames = static_cast< std::uint8_t >( Frame % Counted );
