@@ -53,13 +53,18 @@ namespace VersionCheck
     QNetworkReply* pReply = m_pNetwork->get( QNetworkRequest( Url ) );
     if( pReply == nullptr )
       return false;
-    // The reply is held in memory whole; a server that sends without end is cut off.
-    connect( pReply, &QNetworkReply::downloadProgress, pReply,
-             [pReply]( qint64 i_Received, qint64 i_Total )
-             {
-               if( i_Received > MaximumReplyBytes || i_Total > MaximumReplyBytes )
-                 pReply->abort();
-             } );
+    // The reply is held in memory whole, so one that announces or delivers more than we accept is
+    // cut off. Qt pauses the transfer short of a full read buffer, by as much as one network chunk:
+    // the buffer is twice the limit so that the limit is always passed before the pause.
+    pReply->setReadBufferSize( 2 * MaximumReplyBytes );
+    const auto CutOffWhenTooLarge = [pReply]()
+    {
+      if( pReply->bytesAvailable() > MaximumReplyBytes ||
+          pReply->header( QNetworkRequest::ContentLengthHeader ).toLongLong() > MaximumReplyBytes )
+        pReply->abort();
+    };
+    connect( pReply, &QNetworkReply::metaDataChanged, pReply, CutOffWhenTooLarge );
+    connect( pReply, &QNetworkReply::readyRead, pReply, CutOffWhenTooLarge );
 
     auto* pListener = new VVersionCheckListener( QString::fromStdString( i_rName ), i_bStartupCheck,
                                                  std::move( i_pSettings ), m_pParent, m_DialogRunner, this );

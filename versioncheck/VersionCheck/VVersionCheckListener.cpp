@@ -36,7 +36,8 @@ namespace VersionCheck
       m_pSettings->Report( StatusNoReply, "", "NONE", "Unknown error" );
       return;
     }
-    const std::string Body = QString::fromUtf8( pReply->readAll() ).toStdString();
+    // A reply cut off for its size is closed already and has nothing more to give.
+    const std::string Body = pReply->isOpen() ? QString::fromUtf8( pReply->readAll() ).toStdString() : std::string();
     const std::string ErrorText = pReply->errorString().toStdString();
     const int Status = pReply->error();
     pReply->deleteLater();

@@ -1,0 +1,82 @@
+#include "tests/versioncheck/TestServer.h"
+
+#include <QTcpSocket>
+
+#include <memory>
+
+namespace
+{
+  const char* ReasonPhrase( int i_Status )
+  {
+    switch( i_Status )
+    {
+    case 200:
+      return "OK";
+    case 404:
+      return "Not Found";
+    default:
+      return "Status";
+    }
+  }
+} // namespace
+
+VTestServer::VTestServer()
+{
+  m_Server.listen( QHostAddress::LocalHost, 0 );
+  QObject::connect( &m_Server, &QTcpServer::newConnection, &m_Server, [this]() { Accept(); } );
+}
+
+void VTestServer::SetReply( int i_Status, const QByteArray& i_rBody )
+{
+  m_Status = i_Status;
+  m_Body = i_rBody;
+}
+
+QString VTestServer::Url() const
+{
+  return QStringLiteral( "http://127.0.0.1:%1/" ).arg( m_Server.serverPort() );
+}
+
+quint16 VTestServer::ClosedPort()
+{
+  QTcpServer Probe;
+  Probe.listen( QHostAddress::LocalHost, 0 );
+  const quint16 Port = Probe.serverPort();
+  Probe.close();
+  return Port;
+}
+
+void VTestServer::Accept()
+{
+  while( QTcpSocket* pSocket = m_Server.nextPendingConnection() )
+  {
+    QObject::connect( pSocket, &QTcpSocket::disconnected, pSocket, &QObject::deleteLater );
+    auto pRequest = std::make_shared< QByteArray >();
+    QObject::connect( pSocket, &QTcpSocket::readyRead, pSocket,
+                      [this, pSocket, pRequest]()
+                      {
+                        pRequest->append( pSocket->readAll() );
+                        const int HeaderEnd = pRequest->indexOf( "\r\n\r\n" );
+                        if( HeaderEnd < 0 || pSocket->property( "answered" ).toBool() )
+                          return;
+                        pSocket->setProperty( "answered", true );
+                        const QList< QByteArray > RequestLine =
+                            pRequest->left( pRequest->indexOf( "\r\n" ) ).split( ' ' );
+                        m_Requests << QString::fromLatin1( RequestLine.value( 1 ) );
+                        if( m_Mode == EMode::Silent )
+                          return;
+                        const bool bLarge = m_Mode == EMode::Flood || m_Mode == EMode::Stream;
+                        const QByteArray Body = bLarge ? QByteArray( 2 * 1024 * 1024, 'x' ) : m_Body;
+                        QByteArray Header =
+                            QStringLiteral( "HTTP/1.1 %1 %2\r\nContent-Type: text/html\r\nConnection: close\r\n" )
+                                .arg( m_Status )
+                                .arg( ReasonPhrase( m_Status ) )
+                                .toLatin1();
+                        if( m_Mode != EMode::Stream )
+                          Header += "Content-Length: " + QByteArray::number( Body.size() ) + "\r\n";
+                        pSocket->write( Header + "\r\n" );
+                        pSocket->write( Body );
+                        pSocket->disconnectFromHost();
+                      } );
+  }
+}
