@@ -142,6 +142,49 @@ namespace
   }
 } // namespace
 
+namespace
+{
+  // Opening reads the whole index into memory: a long capture at a high rate is the case to watch.
+  void BM_LvidOpenLongIndex( benchmark::State& io_rState )
+  {
+    const std::uint64_t Entries = static_cast< std::uint64_t >( io_rState.range( 0 ) );
+    const std::string Path =
+        ( boost::filesystem::temp_directory_path() / boost::filesystem::unique_path( "lvid-bench-%%%%-%%%%.lvid" ) )
+            .string();
+    ZOL::IVideoFrameInfo Video;
+    Video.ImageWidth = 4;
+    Video.ImageHeight = 4;
+    Video.PixelFormat = ZOL::PixelFormat_Luminance8;
+    Video.PixelAspectRatio = 1.0;
+    {
+      LumekVideo::VWriter Writer;
+      const std::vector< std::uint8_t > Frame( 16 );
+      bool bOk = Writer.Create( Path, Video, ZOL::IAudioFrameInfo(), ZOL::IVideoAttributes(), 16 );
+      for( std::uint64_t i = 0; i < Entries && bOk; ++i )
+        bOk = Writer.AppendFrame( i, Frame.data(), Frame.size() );
+      if( !bOk || !Writer.Close() )
+      {
+        io_rState.SkipWithError( "cannot make the recording" );
+        return;
+      }
+    }
+    for( auto _ : io_rState )
+    {
+      LumekVideo::VReader Reader;
+      if( !Reader.Open( Path ) )
+      {
+        io_rState.SkipWithError( "open failed" );
+        break;
+      }
+      benchmark::DoNotOptimize( Reader.GetFrameCount() );
+    }
+    io_rState.SetItemsProcessed( static_cast< std::int64_t >( io_rState.iterations() * Entries ) );
+    boost::system::error_code Error;
+    boost::filesystem::remove( Path, Error );
+  }
+} // namespace
+
+BENCHMARK( BM_LvidOpenLongIndex )->Arg( 1000 )->Arg( 100000 )->Unit( benchmark::kMillisecond );
 BENCHMARK_CAPTURE( BM_BarePread, BayerGB8, ZOL::PixelFormat_BayerGB8 )->Unit( benchmark::kMicrosecond );
 BENCHMARK_CAPTURE( BM_LvidReadFrameData, BayerGB8, ZOL::PixelFormat_BayerGB8 )->Unit( benchmark::kMicrosecond );
 BENCHMARK_CAPTURE( BM_BarePread, R8G8B8, ZOL::PixelFormat_R8G8B8 )->Unit( benchmark::kMicrosecond );
