@@ -134,8 +134,9 @@ namespace LumekVideo
         // The frame count is the last number plus one: the largest number has no count.
         if( FrameNumber == std::numeric_limits< std::uint64_t >::max() )
           return false;
-        // A later entry for the same frame replaces the earlier one.
-        m_Index[FrameNumber] = LoadLE64( pEntry + 8 );
+        // A later entry for the same frame replaces the earlier one. Captures write their index
+        // in frame order, so the end is nearly always the right place to look first.
+        m_Index.insert_or_assign( m_Index.end(), FrameNumber, LoadLE64( pEntry + 8 ) );
       }
       Remaining -= Entries;
     }
