@@ -15,7 +15,11 @@ namespace UtilsFileSystem
       if( i_Path.size() < 2 )
         return i_Path;
       const bool bNetwork = i_Path[0] == Backslash && i_Path[1] == Backslash;
-      const bool bDrive = i_Path.size() >= 3 && i_Path[1] == static_cast< Char >( ':' ) && i_Path[2] == Backslash;
+      const Char Letter = i_Path[0];
+      const bool bLetter = ( Letter >= static_cast< Char >( 'A' ) && Letter <= static_cast< Char >( 'Z' ) ) ||
+                           ( Letter >= static_cast< Char >( 'a' ) && Letter <= static_cast< Char >( 'z' ) );
+      const bool bDrive =
+          bLetter && i_Path.size() >= 3 && i_Path[1] == static_cast< Char >( ':' ) && i_Path[2] == Backslash;
       if( bNetwork )
       {
         if( i_Path.size() >= 3 && i_Path[2] == static_cast< Char >( '?' ) )

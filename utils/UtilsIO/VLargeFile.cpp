@@ -67,7 +67,7 @@ namespace UtilsIO
 
   bool VLargeFile::IsAtEnd()
   {
-    return m_pFile == nullptr || std::feof( m_pFile ) != 0;
+    return m_pFile != nullptr && std::feof( m_pFile ) != 0;
   }
 
   bool VLargeFile::Write( const void* i_pBuffer, std::uint64_t i_Size )

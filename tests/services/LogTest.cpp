@@ -1,0 +1,129 @@
+#include "services/Log.h"
+
+#include <gtest/gtest.h>
+
+#include <ostream>
+#include <vector>
+
+namespace
+{
+  // Prints itself and counts how often: the log must not format what nobody listens to.
+  struct VCountingValue
+  {
+    int Value;
+  };
+  int s_Formatted = 0;
+  std::ostream& operator<<( std::ostream& io_rStream, const VCountingValue& i_rValue )
+  {
+    ++s_Formatted;
+    return io_rStream << "<" << i_rValue.Value << ">";
+  }
+
+  // Listens at one level, with standard error quiet, for the life of a test.
+  class VLogCapture
+  {
+  public:
+    explicit VLogCapture( int i_Level )
+    {
+      m_StandardErrorLevel = ZOL::GlobalLog().GetStandardErrorLevel();
+      ZOL::GlobalLog().SetStandardErrorLevel( 0 );
+      m_Sink = ZOL::GlobalLog().AddSink( [this]( const ZOL::ILogRecord& i_rRecord ) { Records.push_back( i_rRecord ); },
+                                         i_Level );
+    }
+    ~VLogCapture()
+    {
+      ZOL::GlobalLog().RemoveSink( m_Sink );
+      ZOL::GlobalLog().SetStandardErrorLevel( m_StandardErrorLevel );
+    }
+    std::vector< ZOL::ILogRecord > Records;
+
+  private:
+    int m_Sink = 0;
+    int m_StandardErrorLevel = 0;
+  };
+} // namespace
+
+class LogLevelTest : public testing::TestWithParam< int >
+{
+};
+
+TEST_P( LogLevelTest, FormatsOnlyWhatTheLevelLetsThrough )
+{
+  const int Listening = GetParam();
+  VLogCapture Capture( Listening );
+  for( int Level = ZOL::LogFailure; Level <= ZOL::LogDetail; ++Level )
+  {
+    s_Formatted = 0;
+    Capture.Records.clear();
+    LUMEK_LOG( "LogTest", Level, "value %s", VCountingValue{ Level } );
+    const bool bThrough = Level <= Listening;
+    EXPECT_EQ( bThrough ? 1 : 0, s_Formatted ) << "level " << Level;
+    ASSERT_EQ( bThrough ? 1u : 0u, Capture.Records.size() ) << "level " << Level;
+    if( bThrough )
+    {
+      EXPECT_EQ( "value <" + std::to_string( Level ) + ">", Capture.Records[0].Message );
+      EXPECT_EQ( Level, Capture.Records[0].Level );
+    }
+  }
+}
+
+INSTANTIATE_TEST_SUITE_P( Levels, LogLevelTest, testing::Values( 2, 3, 4, 6 ) );
+
+TEST( Log, RecordCarriesCategorySourceAndLine )
+{
+  VLogCapture Capture( ZOL::LogDetail );
+  const int Line = __LINE__ + 1;
+  LUMEK_LOG( "MovIO", ZOL::LogWarning, "Bad atom size %d at %d", 7, 1024 );
+  ASSERT_EQ( 1u, Capture.Records.size() );
+  const ZOL::ILogRecord& rRecord = Capture.Records[0];
+  EXPECT_EQ( "Bad atom size 7 at 1024", rRecord.Message );
+  EXPECT_EQ( "MovIO", rRecord.Category );
+  EXPECT_EQ( Line, rRecord.Line );
+  EXPECT_NE( std::string::npos, rRecord.SourceFile.find( "LogTest.cpp" ) );
+}
+
+TEST( Log, ValuesPrintByTheirOwnType )
+{
+  VLogCapture Capture( ZOL::LogDetail );
+  LUMEK_LOG( "LogTest", ZOL::LogInfo, "%s|%s|%d|%s", 42, 2.5, std::string( "text" ), std::uint64_t( 1 ) << 40 );
+  ASSERT_EQ( 1u, Capture.Records.size() );
+  EXPECT_EQ( "42|2.5|text|1099511627776", Capture.Records[0].Message );
+}
+
+struct VBadFormatCase
+{
+  const char* Name;
+  const char* Format;
+  int Level;
+};
+
+class LogBadFormatTest : public testing::TestWithParam< VBadFormatCase >
+{
+};
+
+TEST_P( LogBadFormatTest, UnformattableMessageIsLoggedRawAsAFailure )
+{
+  VLogCapture Capture( ZOL::LogDetail );
+  LUMEK_LOG( "LogTest", GetParam().Level, GetParam().Format, 1 );
+  ASSERT_EQ( 1u, Capture.Records.size() );
+  EXPECT_EQ( std::string( "Cannot Format Log Message \"" ) + GetParam().Format + "\"", Capture.Records[0].Message );
+  EXPECT_EQ( ZOL::LogFailure, Capture.Records[0].Level );
+  EXPECT_EQ( "LogTest", Capture.Records[0].Category );
+}
+
+INSTANTIATE_TEST_SUITE_P( Formats, LogBadFormatTest,
+                          testing::Values( VBadFormatCase{ "TooFewArguments", "%d and %d", ZOL::LogInfo },
+                                           VBadFormatCase{ "TooManyArguments", "no placeholder", ZOL::LogDetail },
+                                           VBadFormatCase{ "BrokenDirective", "%1% then %", ZOL::LogWarning },
+                                           VBadFormatCase{ "PercentSignsInRawText", "100%% %q %", ZOL::LogFailure } ),
+                          []( const testing::TestParamInfo< VBadFormatCase >& i_rInfo )
+                          { return std::string( i_rInfo.param.Name ); } );
+
+TEST( Log, CategoriesAreSharedByName )
+{
+  const ZOL::ILogCategory& rFirst = ZOL::GlobalLog().GetCategory( "H264IO" );
+  const ZOL::ILogCategory& rSecond = ZOL::GlobalLog().GetCategory( "H264IO" );
+  EXPECT_EQ( &rFirst, &rSecond );
+  EXPECT_EQ( "H264IO", rFirst.GetName() );
+  EXPECT_NE( &rFirst, &ZOL::GlobalLog().GetCategory( "H264Utils" ) );
+}

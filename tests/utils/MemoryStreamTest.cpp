@@ -1,0 +1,98 @@
+#include "utils/MemoryStream.h"
+
+#include "videointerface/IBuffer.h"
+
+#include <gtest/gtest.h>
+
+#include <limits>
+
+using UtilsIO::VMemoryInputStream;
+using UtilsIO::VMemoryStream;
+
+TEST( MemoryStream, LittleEndianValuesRoundTripAndHaveTheirByteLayout )
+{
+  VMemoryStream Stream;
+  ASSERT_TRUE( ZOL::WriteLE( Stream, std::uint16_t( 0x0102 ) ) );
+  ASSERT_TRUE( ZOL::WriteLE( Stream, std::int32_t( -2 ) ) );
+  ASSERT_TRUE( ZOL::WriteLE( Stream, 1.0f ) );
+  ASSERT_TRUE( ZOL::WriteLE( Stream, -2.0 ) );
+  ASSERT_TRUE( ZOL::WriteLE( Stream, std::numeric_limits< std::uint64_t >::max() - 1 ) );
+  const std::vector< std::uint8_t > Expected = { 0x02, 0x01, 0xFE, 0xFF, 0xFF, 0xFF, 0x00, 0x00, 0x80,
+                                                 0x3F, 0x00, 0x00, 0x00, 0x00, 0x00, 0x00, 0x00, 0xC0,
+                                                 0xFE, 0xFF, 0xFF, 0xFF, 0xFF, 0xFF, 0xFF, 0xFF };
+  EXPECT_EQ( Expected, Stream.GetData() );
+
+  VMemoryInputStream Input( Expected.data(), Expected.size() );
+  std::uint16_t A = 0;
+  std::int32_t B = 0;
+  float C = 0;
+  double D = 0;
+  std::uint64_t E = 0;
+  ASSERT_TRUE( ZOL::ReadLE( Input, A ) && ZOL::ReadLE( Input, B ) && ZOL::ReadLE( Input, C ) &&
+               ZOL::ReadLE( Input, D ) && ZOL::ReadLE( Input, E ) );
+  EXPECT_EQ( 0x0102, A );
+  EXPECT_EQ( -2, B );
+  EXPECT_EQ( 1.0f, C );
+  EXPECT_EQ( -2.0, D );
+  EXPECT_EQ( std::numeric_limits< std::uint64_t >::max() - 1, E );
+  EXPECT_FALSE( Input.IsAtEnd() );
+  std::uint8_t Extra = 0;
+  EXPECT_FALSE( ZOL::ReadLE( Input, Extra ) );
+  EXPECT_TRUE( Input.IsAtEnd() );
+}
+
+TEST( MemoryStream, ReadAndWriteShareOnePosition )
+{
+  VMemoryStream Stream;
+  ASSERT_TRUE( Stream.Write( "abcdef", 6 ) );
+  ASSERT_TRUE( Stream.Seek( 2 ) );
+  ASSERT_TRUE( Stream.Write( "XY", 2 ) );
+  char Two[2] = {};
+  ASSERT_TRUE( Stream.Read( Two, 2 ) );
+  EXPECT_EQ( "ef", std::string( Two, 2 ) );
+  ASSERT_TRUE( ZOL::Skip( Stream, -6 ) );
+  char All[6] = {};
+  ASSERT_TRUE( Stream.Read( All, 6 ) );
+  EXPECT_EQ( "abXYef", std::string( All, 6 ) );
+  EXPECT_FALSE( ZOL::Skip( Stream, -7 ) );
+  // Writing past the end after a seek fills the gap with zeros.
+  ASSERT_TRUE( Stream.Seek( 8 ) );
+  ASSERT_TRUE( Stream.Write( "!", 1 ) );
+  std::uint64_t Size = 0;
+  ASSERT_TRUE( Stream.GetSize( Size ) );
+  EXPECT_EQ( 9u, Size );
+  EXPECT_EQ( 0, Stream.GetData()[6] );
+}
+
+TEST( MemoryStream, BlocksStopAtTheFirstFailure )
+{
+  const char Data[] = "0123456789";
+  VMemoryInputStream Input( Data, 10 );
+  char A[4] = {}, B[8] = {}, C[1] = {};
+  EXPECT_TRUE( Input.ReadAll( {} ) );
+  EXPECT_FALSE( Input.ReadAll( { { A, 4 }, { B, 8 }, { C, 1 } } ) );
+  EXPECT_EQ( "0123", std::string( A, 4 ) );
+  EXPECT_EQ( 0, C[0] ) << "the block after the failure is not read";
+
+  VMemoryStream Output;
+  ZOL::IStandardBuffer Buffer;
+  Buffer.Resize( 3 );
+  Buffer.GetData()[0] = 'x';
+  EXPECT_TRUE( Output.WriteAll( { { "ab", 2 }, { "", 0 } } ) );
+  EXPECT_TRUE( Output.WriteBuffer( Buffer ) );
+  EXPECT_EQ( ( std::vector< std::uint8_t >{ 'a', 'b', 'x', 0, 0 } ), Output.GetData() );
+}
+
+TEST( MemoryStream, ReadsBeyondTheEndFailWithoutOverrun )
+{
+  const std::uint8_t Data[4] = { 1, 2, 3, 4 };
+  VMemoryInputStream Input( Data, 4 );
+  ASSERT_TRUE( Input.Seek( 100 ) );
+  std::uint8_t Byte = 0;
+  EXPECT_FALSE( Input.Read( &Byte, 1 ) );
+  ASSERT_TRUE( Input.Seek( 3 ) );
+  std::uint8_t Huge[2];
+  EXPECT_FALSE( Input.Read( Huge, std::numeric_limits< std::uint64_t >::max() ) );
+  EXPECT_FALSE( Input.Seek( -1 ) );
+  EXPECT_TRUE( Input.Read( Huge, 0 ) );
+}

@@ -1,0 +1,257 @@
+#include "videointerface/BufferAllocators.h"
+
+#include <gtest/gtest.h>
+
+#include <atomic>
+#include <mutex>
+#include <set>
+#include <thread>
+
+using namespace ZOL;
+
+namespace
+{
+  // Counts live objects, so a test can see every object created and every one deleted, and
+  // marks which are handed out, so that two holders of one object show.
+  struct VCounted
+  {
+    VCounted() { ++s_Live; }
+    ~VCounted() { --s_Live; }
+    std::atomic< bool > InUse{ false };
+    static std::atomic< int > s_Live;
+  };
+  std::atomic< int > VCounted::s_Live{ 0 };
+
+  template < std::size_t N > using VRecycler = UtilsMemory::VThreadSafeRecycler< VCounted, N >;
+
+  template < typename F > void OnOtherThread( F&& i_rFunction )
+  {
+    std::thread Thread( std::forward< F >( i_rFunction ) );
+    Thread.join();
+  }
+} // namespace
+
+TEST( Recycler, FirstAcquireOfAThreadCreatesABlock )
+{
+  {
+    VRecycler< 4 > Recycler;
+    OnOtherThread(
+        [&]
+        {
+          std::vector< VCounted* > Held;
+          for( int i = 0; i < 4; ++i )
+            Held.push_back( Recycler.Acquire() );
+          EXPECT_EQ( 4, VCounted::s_Live );
+          Held.push_back( Recycler.Acquire() );
+          EXPECT_EQ( 8, VCounted::s_Live ) << "the fifth acquire creates a second block";
+          EXPECT_EQ( 3u, Recycler.GetLocalSize() );
+          EXPECT_EQ( 5u, std::set< VCounted* >( Held.begin(), Held.end() ).size() );
+          for( VCounted* p : Held )
+            Recycler.Release( p );
+          EXPECT_EQ( 8u, Recycler.GetLocalSize() );
+          EXPECT_EQ( 0u, Recycler.GetPoolSize() );
+        } );
+    // The thread's end deleted its cache; nothing went back to the pool.
+    EXPECT_EQ( 0, VCounted::s_Live );
+    EXPECT_EQ( 0u, Recycler.GetPoolSize() );
+  }
+  EXPECT_EQ( 0, VCounted::s_Live );
+}
+
+TEST( Recycler, AFullCacheSendsABlockToThePoolForOtherThreads )
+{
+  VRecycler< 4 > Recycler;
+  std::vector< VCounted* > Released;
+  OnOtherThread(
+      [&]
+      {
+        std::vector< VCounted* > Held;
+        for( int i = 0; i < 12; ++i )
+          Held.push_back( Recycler.Acquire() );
+        EXPECT_EQ( 12, VCounted::s_Live );
+        EXPECT_EQ( 0u, Recycler.GetLocalSize() );
+        for( int i = 0; i < 8; ++i )
+          Recycler.Release( Held[i] );
+        EXPECT_EQ( 8u, Recycler.GetLocalSize() );
+        EXPECT_EQ( 0u, Recycler.GetPoolSize() );
+        Recycler.Release( Held[8] ); // finds 2N cached and moves the last N first
+        EXPECT_EQ( 5u, Recycler.GetLocalSize() );
+        EXPECT_EQ( 4u, Recycler.GetPoolSize() );
+        Released.assign( Held.begin() + 4, Held.begin() + 8 );
+        for( int i = 9; i < 12; ++i )
+          Recycler.Release( Held[i] );
+        // Keep this thread's cache alive while another thread takes the block.
+        OnOtherThread(
+            [&]
+            {
+              std::set< VCounted* > Taken;
+              for( int i = 0; i < 4; ++i )
+                Taken.insert( Recycler.Acquire() );
+              EXPECT_EQ( 12, VCounted::s_Live ) << "the block came from the pool, not the heap";
+              EXPECT_EQ( std::set< VCounted* >( Released.begin(), Released.end() ), Taken );
+              EXPECT_EQ( 0u, Recycler.GetPoolSize() );
+              for( VCounted* p : Taken )
+                Recycler.Release( p );
+            } );
+        EXPECT_EQ( 8, VCounted::s_Live ) << "the other thread's end deleted its cache";
+      } );
+  EXPECT_EQ( 0, VCounted::s_Live );
+}
+
+TEST( Recycler, ManyThreadsNeverShareAnObject )
+{
+  constexpr int Threads = 4;
+  constexpr int Rounds = 20000;
+  std::atomic< int > Faults{ 0 };
+  {
+    VRecycler< 3 > Recycler;
+    std::vector< std::thread > Workers;
+    // Objects acquired on one thread and released on the next, as frames travel from the
+    // reading thread to the drawing thread.
+    std::vector< std::vector< VCounted* > > Handoff( Threads );
+    std::vector< std::mutex > Locks( Threads );
+    for( int t = 0; t < Threads; ++t )
+      Workers.emplace_back(
+          [&, t]
+          {
+            std::vector< VCounted* > Mine;
+            for( int r = 0; r < Rounds; ++r )
+            {
+              VCounted* p = Recycler.Acquire();
+              if( p->InUse.exchange( true ) )
+                ++Faults;
+              {
+                std::lock_guard< std::mutex > Lock( Locks[( t + 1 ) % Threads] );
+                Handoff[( t + 1 ) % Threads].push_back( p );
+              }
+              {
+                std::lock_guard< std::mutex > Lock( Locks[t] );
+                Mine.swap( Handoff[t] );
+              }
+              for( VCounted* q : Mine )
+              {
+                q->InUse = false;
+                Recycler.Release( q );
+              }
+              Mine.clear();
+            }
+          } );
+    for( auto& rWorker : Workers )
+      rWorker.join();
+    for( auto& rList : Handoff )
+      for( VCounted* q : rList )
+      {
+        q->InUse = false;
+        Recycler.Release( q );
+      }
+  }
+  EXPECT_EQ( 0, Faults );
+  EXPECT_EQ( 0, VCounted::s_Live );
+}
+
+// ---------------------------------------------------------------------------------------------
+// Allocators over the recycler.
+
+TEST( BufferAllocator, SizeZeroIsAValidEmptyBuffer )
+{
+  auto pAllocator = std::make_shared< VReaderBufferAllocator >();
+  std::shared_ptr< IBuffer > pBuffer;
+  pAllocator->Allocate( pBuffer, 0 );
+  ASSERT_TRUE( pBuffer );
+  EXPECT_EQ( 0u, pBuffer->GetSize() );
+  EXPECT_EQ( 0u, pBuffer->GetLength() );
+  EXPECT_EQ( 0u, pBuffer->GetByteCount() );
+}
+
+TEST( BufferAllocator, ARecycledBufferKeepsItsCapacityAndOldBytes )
+{
+  // N is 1, so the buffer released is the next one acquired on this thread.
+  using VAllocator = IStandardBufferAllocator< UtilsMemory::VThreadSafeRecycler< IStandardBuffer, 1 > >;
+  auto pAllocator = std::make_shared< VAllocator >();
+  std::shared_ptr< IBuffer > pBuffer;
+  pAllocator->Allocate( pBuffer, 100 );
+  for( int i = 0; i < 100; ++i )
+    pBuffer->GetData()[i] = static_cast< std::uint8_t >( i + 1 );
+  const IBuffer* pFirst = pBuffer.get();
+  pBuffer.reset();
+
+  pAllocator->Allocate( pBuffer, 10 );
+  ASSERT_EQ( pFirst, pBuffer.get() );
+  const std::uint8_t* pData = pBuffer->GetData();
+  pBuffer.reset();
+
+  pAllocator->Allocate( pBuffer, 100 );
+  ASSERT_EQ( pFirst, pBuffer.get() );
+  EXPECT_EQ( pData, pBuffer->GetData() ) << "no reallocation for a size it has held";
+  for( int i = 0; i < 10; ++i )
+    EXPECT_EQ( i + 1, pBuffer->GetData()[i] ) << i;
+  for( int i = 10; i < 100; ++i )
+    EXPECT_EQ( 0, pBuffer->GetData()[i] ) << i;
+}
+
+TEST( BufferAllocator, BuffersKeepTheirAllocatorAlive )
+{
+  std::weak_ptr< VFrameBufferAllocator > pWeak;
+  std::vector< std::shared_ptr< IBuffer > > Frames( 6 );
+  {
+    auto pAllocator = std::make_shared< VFrameBufferAllocator >();
+    pWeak = pAllocator;
+    for( auto& rpFrame : Frames )
+      pAllocator->Allocate( rpFrame, 64 );
+  } // the reader that made the allocator is gone
+  EXPECT_FALSE( pWeak.expired() );
+  // Released on another thread, as the drawing side would.
+  OnOtherThread(
+      [&]
+      {
+        for( std::size_t i = 0; i + 1 < Frames.size(); ++i )
+          Frames[i].reset();
+      } );
+  EXPECT_FALSE( pWeak.expired() );
+  Frames.back().reset();
+  EXPECT_TRUE( pWeak.expired() );
+}
+
+TEST( BufferAllocator, AnAllocatorNotOwnedBySharedPointerThrowsBadWeakPtr )
+{
+  VReaderBufferAllocator Allocator;
+  std::shared_ptr< IBuffer > pBuffer;
+  EXPECT_THROW( Allocator.Allocate( pBuffer, 8 ), std::bad_weak_ptr );
+}
+
+TEST( BufferAllocator, ImpossibleSizeGivesAnEmptyPointerAndALogLine )
+{
+  std::vector< ILogRecord > Records;
+  const int StandardErrorLevel = GlobalLog().GetStandardErrorLevel();
+  GlobalLog().SetStandardErrorLevel( 0 );
+  const int Sink =
+      GlobalLog().AddSink( [&]( const ILogRecord& i_rRecord ) { Records.push_back( i_rRecord ); }, LogFailure );
+  auto pAllocator = std::make_shared< VReaderBufferAllocator >();
+  std::shared_ptr< IBuffer > pBuffer;
+  pAllocator->Allocate( pBuffer, ~std::uint64_t( 0 ) );
+  GlobalLog().RemoveSink( Sink );
+  GlobalLog().SetStandardErrorLevel( StandardErrorLevel );
+  EXPECT_FALSE( pBuffer );
+  ASSERT_EQ( 1u, Records.size() );
+  EXPECT_EQ( "Could not create buffer of size 18446744073709551615 bytes.", Records[0].Message );
+  EXPECT_EQ( "Unnamed", Records[0].Category );
+  EXPECT_EQ( LogFailure, Records[0].Level );
+  EXPECT_EQ( "IBufferAllocator", Records[0].SourceFile );
+  // The failed buffer went back to the recycler and the allocator still works.
+  pAllocator->Allocate( pBuffer, 16 );
+  ASSERT_TRUE( pBuffer );
+  EXPECT_EQ( 16u, pBuffer->GetSize() );
+}
+
+namespace
+{
+  const std::uint8_t s_StartCode[4] = { 0, 0, 0, 1 };
+}
+
+TEST( TrivialBuffer, WrapsStaticBytesWithoutACopy )
+{
+  VTrivialBuffer< s_StartCode, 4 > StartCode;
+  const IBufferConst& rBuffer = StartCode;
+  EXPECT_EQ( s_StartCode, rBuffer.GetData() );
+  EXPECT_EQ( 4u, rBuffer.GetSize() );
+}
