@@ -4,6 +4,7 @@
 
 #include "versioncheck/VersionReply/VersionReply.h"
 #include "services/ILogCategorised.h"
+#include "versioncheck/VersionReply/DefaultServer.h"
 #include "versioncheck/VersionReply/HtmlReply.h"
 #include "versioncheck/VersionReply/MarkupDepth.h"
 #include "versioncheck/VersionReply/SystemText.h"
@@ -322,5 +323,33 @@ namespace
     EXPECT_EQ( Text.find( ' ' ), std::string::npos ) << Text;
     EXPECT_GT( Text.size(), std::string( "+64Bit" ).size() );
     EXPECT_EQ( Text.substr( Text.size() - 6 ), "+64Bit" );
+  }
+} // namespace
+
+namespace
+{
+  // A build that is never told a server must not reach a real host: every address the check knows
+  // by itself lies under the domain reserved for examples.
+  class BuiltInAddress : public testing::TestWithParam< const char* >
+  {
+  };
+
+  TEST_P( BuiltInAddress, StaysUnderTheExampleDomain )
+  {
+    const std::string Address = GetParam();
+    const auto HostStart = Address.find( "://" );
+    ASSERT_NE( HostStart, std::string::npos );
+    const std::string Host = Address.substr( HostStart + 3, Address.find( '/', HostStart + 3 ) - HostStart - 3 );
+    EXPECT_EQ( Host.substr( Host.size() - 8 ), ".example" ) << Address;
+    EXPECT_EQ( Address.back(), '/' ) << Address;
+  }
+
+  INSTANTIATE_TEST_SUITE_P( All, BuiltInAddress,
+                            testing::Values( VersionCheck::DefaultVersionServer, VersionCheck::BuiltInVersionServer,
+                                             VersionCheck::SupportPage ) );
+
+  TEST( BuiltInAddress, CommandLineDefaultIsHttps )
+  {
+    EXPECT_EQ( std::string( VersionCheck::DefaultVersionServer ).rfind( "https://", 0 ), 0u );
   }
 } // namespace

@@ -17,8 +17,9 @@ namespace VersionCheck
   // Nesting of JSON arrays and objects; brackets inside strings do not count.
   IMarkupDepth JsonNestingDepth( const std::string& i_rText, int i_Limit );
 
-  // Nesting of elements as RapidXml reads them: comments, CDATA, processing instructions and
-  // document types hold no elements, quoted attribute values hide "/>", and the scan ends where
-  // RapidXml would give up on a malformed tag. Never less than what RapidXml reaches.
+  // Nesting of elements with contents as RapidXml reads them: comments, CDATA, processing
+  // instructions and document types hold no elements, quoted attribute values hide "/>", and the
+  // scan ends where RapidXml would give up on a malformed tag. RapidXml never goes deeper than
+  // this plus one, for a self-closed element at the bottom.
   IMarkupDepth XmlNestingDepth( const std::string& i_rText, int i_Limit );
 } // namespace VersionCheck
