@@ -165,6 +165,11 @@ namespace LumekVideoViewer
 
   bool VGLWidget::ConvertForSoftwareDecoder( std::shared_ptr< ZOL::IBuffer >& io_pBuffer )
   {
+    // The frame's own size bounds the allocation: a description that its bytes can't fill
+    // is not converted at all.
+    const std::uint64_t SourceSize = ZOL::GetVideoFrameSizeInBytes64( m_PixelRecord );
+    if( SourceSize == 0 || io_pBuffer->GetSize() < SourceSize )
+      return false;
     const std::uint64_t Size =
         std::uint64_t( m_PixelRecord.ImageWidth ) * std::uint64_t( m_PixelRecord.ImageHeight ) * 3;
     std::shared_ptr< ZOL::IBuffer > pRGB;
@@ -175,8 +180,9 @@ namespace LumekVideoViewer
     // A failed conversion isn't examined: the buffer is shown as it was allocated.
     CoreVideoUtils::VPixelFormatConverter Converter;
     Converter.SetVideoSettings( m_VideoSettings );
-    Converter.Convert( m_PixelRecord, io_pBuffer->GetData(), io_pBuffer->GetSize(), ZOL::PixelFormat_R8G8B8,
-                       pRGB->GetData(), Size );
+    if( !Converter.Convert( m_PixelRecord, io_pBuffer->GetData(), io_pBuffer->GetSize(), ZOL::PixelFormat_R8G8B8,
+                            pRGB->GetData(), Size ) )
+      ConvertThroughRGBA( Converter, *io_pBuffer, *pRGB );
     // Bayer frames take gamma and saturation a second time on top of the converter's; the
     // software picture is defined that way.
     if( CoreVideoUtils::IsBayerFormat( m_PixelRecord.PixelFormat ) )
@@ -188,6 +194,20 @@ namespace LumekVideoViewer
     io_pBuffer = std::move( pRGB );
     m_PixelRecord.PixelFormat = ZOL::PixelFormat_R8G8B8;
     return true;
+  }
+
+  void VGLWidget::ConvertThroughRGBA( CoreVideoUtils::VPixelFormatConverter& io_rConverter,
+                                      const ZOL::IBuffer& i_rSource, ZOL::IBuffer& o_rRGB )
+  {
+    // Planar YUV frames convert to the four-byte RGB formats only; the picture goes through
+    // R8G8B8u8 on its way to R8G8B8.
+    ZOL::IVideoFrameInfo RGBA = m_PixelRecord;
+    RGBA.PixelFormat = ZOL::PixelFormat_R8G8B8u8;
+    m_Scratch.resize( std::size_t( ZOL::GetVideoFrameSizeInBytes64( RGBA ) ) );
+    if( io_rConverter.Convert( m_PixelRecord, i_rSource.GetData(), i_rSource.GetSize(), ZOL::PixelFormat_R8G8B8u8,
+                               m_Scratch.data(), m_Scratch.size() ) )
+      io_rConverter.Convert( RGBA, m_Scratch.data(), m_Scratch.size(), ZOL::PixelFormat_R8G8B8, o_rRGB.GetData(),
+                             o_rRGB.GetSize() );
   }
 
   void VGLWidget::SetDecoder( EDecoder i_PreferredDecoder )
@@ -266,6 +286,10 @@ namespace LumekVideoViewer
     QPainter Painter( this );
     Painter.setRenderHint( QPainter::Antialiasing );
     Painter.beginNativePainting();
+    // The framebuffer keeps its last picture between paints on these drivers: without a clear a
+    // pan leaves trails and a cleared surface would not turn black.
+    m_pRenderContext->SetClearColour( QColor( 0, 0, 0, 255 ) );
+    m_pRenderContext->Clear( true, false );
 
     const float Zoom = m_View.GetZoom();
     const QVector2D Scale( float( SensorSize.width() ) * Zoom / float( std::max( width(), 1 ) ),

@@ -25,6 +25,7 @@
 
 #include <array>
 #include <memory>
+#include <vector>
 
 namespace CoreGraphics
 {
@@ -39,7 +40,8 @@ namespace CoreGraphics
 namespace CoreVideoUtils
 {
   class VColourCorrector;
-}
+  class VPixelFormatConverter;
+} // namespace CoreVideoUtils
 
 namespace VideoGraphics
 {
@@ -112,6 +114,8 @@ namespace LumekVideoViewer
     void UpdateViewGeometry();
     // Replaces the frame by its R8G8B8 picture; false when no buffer could be had.
     bool ConvertForSoftwareDecoder( std::shared_ptr< ZOL::IBuffer >& io_pBuffer );
+    void ConvertThroughRGBA( CoreVideoUtils::VPixelFormatConverter& io_rConverter, const ZOL::IBuffer& i_rSource,
+                             ZOL::IBuffer& o_rRGB );
     void DrawFrame( const QSize& i_rSensorSize );
     void DrawOutline( const QSize& i_rSensorSize );
     void DrawOverlays( QPainter& io_rPainter );
@@ -140,5 +144,7 @@ namespace LumekVideoViewer
     VVideoView m_View;
     std::shared_ptr< CoreVideoUtils::VColourCorrector > m_pColourCorrector;
     VLensData m_Lens;
+    // Intermediate pictures of the software path, kept between frames.
+    std::vector< std::uint8_t > m_Scratch;
   };
 } // namespace LumekVideoViewer

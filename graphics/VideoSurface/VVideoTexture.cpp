@@ -6,6 +6,8 @@
 #include "graphics/VideoSurface/VSharedContext.h"
 #include "services/Log.h"
 
+#include <QOpenGLContext>
+#include <QOpenGLFunctions>
 #include <QOpenGLTexture>
 
 namespace VideoGraphics
@@ -31,12 +33,29 @@ namespace VideoGraphics
     return QSize( m_pTexture->width(), m_pTexture->height() );
   }
 
+  bool VVideoTexture::HoldsWholeFrame() const
+  {
+    const std::uint64_t Needed = ZOL::GetVideoFrameSizeInBytes64( m_Info );
+    return Needed != 0 && m_pBuffer->GetSize() >= Needed;
+  }
+
   void VVideoTexture::Bind( int i_Unit, CoreGraphics::VRenderContext& i_rContext, std::uint32_t i_Format )
   {
     if( !HasFrame() )
       return;
     const std::uint32_t Format = i_Format != 0 ? i_Format : std::uint32_t( m_Info.PixelFormat );
     const VPixelFormatRoute* pRoute = FindPixelFormatRoute( Format );
+
+    // The driver reads the frame's bytes without a bound of its own: a buffer shorter than its
+    // description says must never reach it, nor make storage for a size it cannot fill.
+    if( pRoute != nullptr && i_Format == 0 && !HoldsWholeFrame() )
+    {
+      if( m_UploadedFormat != Format )
+        LUMEK_LOG( "CoreGraphics", ZOL::LogWarning, "Frame buffer of %d bytes is too small for %d x %d",
+                   m_pBuffer->GetSize(), m_Info.ImageWidth, m_Info.ImageHeight );
+      m_UploadedFormat = Format;
+      return;
+    }
 
     bool bReallocated = false;
     QSize Size;
@@ -51,7 +70,8 @@ namespace VideoGraphics
     if( Format == m_UploadedFormat && !bReallocated )
       return;
     m_UploadedFormat = Format;
-    if( pRoute == nullptr || !m_pTexture || !m_pTexture->isStorageAllocated() )
+    // Storage that could not be made for this frame keeps the size of an earlier one.
+    if( pRoute == nullptr || GetStorageSize() != Size || m_StorageFormat != pRoute->InternalFormat )
       return;
     Upload( i_rContext, i_Format, Size, pRoute->InternalFormat, pRoute->UploadFormat != pRoute->Format,
             pRoute->UploadFormat );
@@ -64,6 +84,16 @@ namespace VideoGraphics
       return false;
     if( i_rSize.isEmpty() )
       return false;
+    if( QOpenGLContext::currentContext() == nullptr )
+      return false;
+    GLint MaxSize = 0;
+    QOpenGLContext::currentContext()->functions()->glGetIntegerv( GL_MAX_TEXTURE_SIZE, &MaxSize );
+    if( i_rSize.width() > MaxSize || i_rSize.height() > MaxSize )
+    {
+      LUMEK_LOG( "CoreGraphics", ZOL::LogFailure, "Cannot allocate a texture of %d x %d", i_rSize.width(),
+                 i_rSize.height() );
+      return false;
+    }
 
     VSharedContextScope Scope;
     if( !Scope.IsCurrent() )
@@ -93,16 +123,6 @@ namespace VideoGraphics
   void VVideoTexture::Upload( CoreGraphics::VRenderContext& i_rContext, std::uint32_t i_Format, const QSize& i_rSize,
                               GLenum i_InternalFormat, bool i_bConvert, ZOL::EPixelFormat i_UploadFormat )
   {
-    // The frame's bytes are read by the driver without any bound of its own: a buffer shorter
-    // than its description says must not reach it.
-    const std::uint64_t Needed = ZOL::GetVideoFrameSizeInBytes64( m_Info );
-    if( Needed == 0 || m_pBuffer->GetSize() < Needed )
-    {
-      LUMEK_LOG( "CoreGraphics", ZOL::LogWarning, "Frame buffer of %d bytes is too small for %d x %d",
-                 m_pBuffer->GetSize(), m_Info.ImageWidth, m_Info.ImageHeight );
-      return;
-    }
-
     const std::uint8_t* pPixels = m_pBuffer->GetData();
     if( i_Format != 0 )
       return;

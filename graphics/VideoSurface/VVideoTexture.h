@@ -48,6 +48,7 @@ namespace VideoGraphics
     QSize GetStorageSize() const;
 
   private:
+    bool HoldsWholeFrame() const;
     // True when storage was (re)allocated.
     bool EnsureStorage( const QSize& i_rSize, GLenum i_InternalFormat );
     void Upload( CoreGraphics::VRenderContext& i_rContext, std::uint32_t i_Format, const QSize& i_rSize,
