@@ -43,17 +43,29 @@ namespace VideoEncoding
       return LUMEK_ASSERT( std::memcmp( pInData, s_MagicTIFF, sizeof( s_MagicTIFF ) ) == 0 );
     }
 
-    // PNG and TIFF: the output is allocated here at the size of the described frame.
+    // No still-image format stored here expands more than this: deflate stops near 1032:1
+    // and 12-bit LZW near 2730:1. A description beyond it is not believed.
+    constexpr std::uint64_t MaxExpansion = 4096;
+
+    // PNG and TIFF: the output is allocated here at the size of the described frame, once the
+    // payload has shown that it is of the right kind and could hold such a frame.
     bool DecodeImage( ImageDecodeFunction i_Decode, bool ( *i_HasSignature )( const std::uint8_t*, std::uint64_t ),
                       const std::uint8_t* i_pData, std::uint64_t i_Size, IVideoFrameInfo& io_rInfo,
                       const std::shared_ptr< IBufferAllocator >& i_rAllocator, std::shared_ptr< IBuffer >& o_rOutput )
     {
+      if( !i_HasSignature( i_pData, i_Size ) || i_Decode == nullptr || !i_rAllocator )
+        return false;
       const std::uint32_t Bytes = FrameBufferSize( io_rInfo );
       // A size that does not survive the truncation to 32 bits is no frame this program can hold.
-      if( Bytes == 0 || Bytes != GetVideoFrameSizeInBytes64( io_rInfo ) || !i_rAllocator )
+      if( Bytes == 0 || Bytes != GetVideoFrameSizeInBytes64( io_rInfo ) || Bytes / MaxExpansion > i_Size )
+      {
+        LUMEK_LOG( "VideoEncoding", ZOL::LogFailure,
+                   "Image of %d bytes cannot hold a %d x %d frame of pixel format '%s'.", i_Size, io_rInfo.ImageWidth,
+                   io_rInfo.ImageHeight, ZOL::ToString( io_rInfo.PixelFormat, "Unspecified" ) );
         return false;
+      }
       i_rAllocator->Allocate( o_rOutput, Bytes );
-      if( !o_rOutput || !i_HasSignature( i_pData, i_Size ) || i_Decode == nullptr )
+      if( !o_rOutput )
         return false;
       return i_Decode( i_pData, i_Size, io_rInfo, o_rOutput->GetData(), o_rOutput->GetSize() );
     }
