@@ -730,15 +730,4 @@ namespace
     EXPECT_FALSE( UpdateCheck.CheckAtStartup() );
     EXPECT_FALSE( UpdateCheck.CheckOnRequest() );
   }
-
-  TEST( ApplicationVersionCheck, VersionText )
-  {
-    ZOL::IApplicationVersion Record = LumekVideoViewer::ApplicationVersion();
-    EXPECT_EQ( VersionText( Record, "" ), "1.10.0.137509h" );
-    EXPECT_EQ( VersionText( Record, "0.3.0.55914h" ), "0.3.0.55914h" );
-    Record.Major = 2;
-    Record.Point = 12;
-    Record.BuildTag = "1x";
-    EXPECT_EQ( VersionText( Record, "" ), "2.10.12.1x" );
-  }
 } // namespace
