@@ -64,7 +64,10 @@ namespace VideoGraphics
       Size = TextureSize( *pRoute, m_Info.ImageWidth, m_Info.ImageHeight );
       bReallocated = EnsureStorage( Size, pRoute->InternalFormat );
     }
-    if( m_pTexture && m_pTexture->isCreated() )
+    // A format that never goes to the card shows nothing, not the texture of an earlier frame.
+    if( pRoute == nullptr )
+      i_rContext.BindTexture( i_Unit, nullptr );
+    else if( m_pTexture && m_pTexture->isCreated() )
       i_rContext.BindTexture( i_Unit, m_pTexture.get() );
 
     if( Format == m_UploadedFormat && !bReallocated )

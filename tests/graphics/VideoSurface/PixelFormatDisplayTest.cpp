@@ -79,6 +79,7 @@ namespace
   const VFormatCase FormatCases[] = {
       { "Luminance8", ZOL::PixelFormat_Luminance8, 40, 24, Reference_Processor, 0, Grey },
       { "Luminance8_OddWidth", ZOL::PixelFormat_Luminance8, 37, 21, Reference_Processor, 0, Grey },
+      { "Luminance8_Width641", ZOL::PixelFormat_Luminance8, 641, 5, Reference_Processor, 0, Grey },
       { "BayerRG8", ZOL::PixelFormat_BayerRG8, 40, 24, Reference_Malvar, 2, Bayer },
       { "BayerGB8", ZOL::PixelFormat_BayerGB8, 40, 24, Reference_Malvar, 2, Bayer },
       { "BayerGR8", ZOL::PixelFormat_BayerGR8, 40, 24, Reference_Malvar, 2, Bayer },
@@ -163,8 +164,12 @@ namespace
     const ZOL::IVideoFrame Frame = RandomFrame( GetParam().Format, 40, 24 );
     std::unique_ptr< VGLWidget > pWidget = MakeWidget( 40 + 2 * Margin, 24 + 2 * Margin );
     pWidget->SetScaleMode( LumekVideoViewer::ScaleOneToOne );
-    pWidget->PrepareFrame( 0, Frame.VideoFrameInfo, Frame, false );
-    EXPECT_EQ( pWidget->GetDecoderName().toStdString(), "" );
+    // An earlier frame's texture doesn't show through either.
+    const ZOL::IVideoFrame Earlier = RandomFrame( ZOL::PixelFormat_BayerGB8, 40, 24 );
+    pWidget->PrepareFrame( 0, Earlier.VideoFrameInfo, Earlier, false );
+    Grab( *pWidget );
+    pWidget->PrepareFrame( 1, Frame.VideoFrameInfo, Frame, false );
+    EXPECT_EQ( pWidget->GetDecoderName().toStdString(), "Hardware Bayer Demosaic" ) << "unchanged";
     EXPECT_TRUE( SamePicture( Grab( *pWidget ), VRGBImage( 40, 24 ), QPoint( Margin, Margin ), 0 ) );
 
     pWidget->SetDecoder( LumekVideoViewer::Software );

@@ -211,6 +211,9 @@ namespace SurfaceTest
         if( D > Worst )
           Worst = D, WorstAt = QPoint( x, y );
       }
+    // LUMEK_SAVE_PICTURES=1 keeps the pictures of passing comparisons too, to look at.
+    if( Differing == 0 && qEnvironmentVariableIsSet( "LUMEK_SAVE_PICTURES" ) )
+      SavePictures( i_rActual, i_rExpected, i_Origin );
     if( Differing == 0 )
       return ::testing::AssertionSuccess() << "largest difference " << Worst;
     SavePictures( i_rActual, i_rExpected, i_Origin );
