@@ -36,6 +36,9 @@ namespace LumekVideoViewer
     setAcceptDrops( true );
     setFocusPolicy( Qt::StrongFocus );
     Shaders::RegisterResources();
+    // The window may connect the mode and decoder signals across a queue.
+    qRegisterMetaType< EScaleMode >( "LumekVideoViewer::EScaleMode" );
+    qRegisterMetaType< EDecoder >( "LumekVideoViewer::EDecoder" );
 
     m_RenderState.AlphaWrite = false;
     m_RenderState.BlendConstant = 1.0f;
