@@ -41,7 +41,8 @@ namespace
     pWidget->setFixedSize( i_Width, i_Height );
     pWidget->SetDecoder( i_Decoder );
     pWidget->show();
-    QTest::qWaitForWindowExposed( pWidget.get() );
+    if( !QTest::qWaitForWindowExposed( pWidget.get() ) )
+      std::fprintf( stderr, "the widget was not exposed\n" );
     return pWidget;
   }
 
