@@ -600,6 +600,7 @@ namespace
   {
     Serve( None );
     ASSERT_TRUE( m_Check.Check( "LumekVideoViewer", "1", "S", true, m_pSettings, 10, "1.0" ) );
+    EXPECT_TRUE( m_pSettings->Outcomes.empty() ) << "a check must return before its answer comes";
     ASSERT_TRUE( Run( false ) );
     EXPECT_EQ( m_pSettings->Outcomes.size(), 2u );
     std::sort( m_Completions.begin(), m_Completions.end() );
