@@ -14,7 +14,7 @@ packages=(
   librapidxml-dev
   libgtest-dev libgmock-dev libbenchmark-dev
   xvfb xauth libgl1-mesa-dri libglx-mesa0 mesa-utils
-  ffmpeg python3
+  ffmpeg python3 imagemagick
 )
 
 missing=()
