@@ -51,32 +51,37 @@ void VTestServer::Accept()
   while( QTcpSocket* pSocket = m_Server.nextPendingConnection() )
   {
     QObject::connect( pSocket, &QTcpSocket::disconnected, pSocket, &QObject::deleteLater );
-    auto pRequest = std::make_shared< QByteArray >();
+    // Everything up to the blank line that ends the request's header; nothing is read after it.
+    auto pHeader = std::make_shared< QByteArray >();
     QObject::connect( pSocket, &QTcpSocket::readyRead, pSocket,
-                      [this, pSocket, pRequest]()
+                      [this, pSocket, pHeader]()
                       {
-                        pRequest->append( pSocket->readAll() );
-                        const int HeaderEnd = pRequest->indexOf( "\r\n\r\n" );
-                        if( HeaderEnd < 0 || pSocket->property( "answered" ).toBool() )
+                        if( pHeader->endsWith( "\r\n\r\n" ) )
                           return;
-                        pSocket->setProperty( "answered", true );
-                        const QList< QByteArray > RequestLine =
-                            pRequest->left( pRequest->indexOf( "\r\n" ) ).split( ' ' );
-                        m_Requests << QString::fromLatin1( RequestLine.value( 1 ) );
-                        if( m_Mode == EMode::Silent )
-                          return;
-                        const bool bLarge = m_Mode == EMode::Flood || m_Mode == EMode::Stream;
-                        const QByteArray Body = bLarge ? QByteArray( 2 * 1024 * 1024, 'x' ) : m_Body;
-                        QByteArray Header =
-                            QStringLiteral( "HTTP/1.1 %1 %2\r\nContent-Type: text/html\r\nConnection: close\r\n" )
-                                .arg( m_Status )
-                                .arg( ReasonPhrase( m_Status ) )
-                                .toLatin1();
-                        if( m_Mode != EMode::Stream )
-                          Header += "Content-Length: " + QByteArray::number( Body.size() ) + "\r\n";
-                        pSocket->write( Header + "\r\n" );
-                        pSocket->write( Body );
-                        pSocket->disconnectFromHost();
+                        pHeader->append( pSocket->readAll() );
+                        if( pHeader->contains( "\r\n\r\n" ) )
+                        {
+                          pHeader->truncate( pHeader->indexOf( "\r\n\r\n" ) + 4 );
+                          Answer( *pSocket, *pHeader );
+                        }
                       } );
   }
+}
+
+void VTestServer::Answer( QTcpSocket& io_rSocket, const QByteArray& i_rHeader )
+{
+  const QList< QByteArray > RequestLine = i_rHeader.left( i_rHeader.indexOf( "\r\n" ) ).split( ' ' );
+  m_Requests << QString::fromLatin1( RequestLine.value( 1 ) );
+  if( m_Mode == EMode::Silent )
+    return;
+  const bool bLarge = m_Mode == EMode::Flood || m_Mode == EMode::Stream;
+  const QByteArray Body = bLarge ? QByteArray( 2 * 1024 * 1024, 'x' ) : m_Body;
+  QByteArray Header = QStringLiteral( "HTTP/1.1 %1 %2\r\nContent-Type: text/html\r\nConnection: close\r\n" )
+                          .arg( m_Status )
+                          .arg( ReasonPhrase( m_Status ) )
+                          .toLatin1();
+  if( m_Mode != EMode::Stream )
+    Header += "Content-Length: " + QByteArray::number( Body.size() ) + "\r\n";
+  io_rSocket.write( Header + "\r\n" + Body );
+  io_rSocket.disconnectFromHost();
 }

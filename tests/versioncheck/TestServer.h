@@ -5,6 +5,8 @@
 #include <QStringList>
 #include <QTcpServer>
 
+class QTcpSocket;
+
 // A version server for the tests: plain HTTP on 127.0.0.1 at a port of its own choice, one reply
 // per connection.
 class VTestServer
@@ -33,6 +35,7 @@ public:
 
 private:
   void Accept();
+  void Answer( QTcpSocket& io_rSocket, const QByteArray& i_rHeader );
 
   QTcpServer m_Server;
   EMode m_Mode = EMode::Answer;
