@@ -6,7 +6,6 @@
 #include <QApplication>
 #include <QImage>
 #include <QSignalSpy>
-#include <QStyleFactory>
 #include <QTest>
 #include <QWheelEvent>
 #include <QtTest/qtestspontaneevent.h>
@@ -85,7 +84,9 @@ namespace
       // Nothing between two marks that are far enough apart to have a gap.
       const float Next = PositionOf( Frame + Steps.Minor );
       if( Frame + Steps.Minor <= GetParam().Maximum && Next - X >= 5.0f )
+      {
         EXPECT_FALSE( InkAt( Image, ( X + Next ) / 2.0f, MiddleRow, Background ) ) << "after frame " << Frame;
+      }
       ++Checked;
     }
     EXPECT_GT( Checked, 0 );
@@ -96,34 +97,6 @@ namespace
                                              VPaintCase{ "LongFile", 20000, 800 }, VPaintCase{ "FewFrames", 7, 300 },
                                              VPaintCase{ "TwoFrames", 1, 200 }, VPaintCase{ "OddWidth", 1234, 613 } ),
                             []( const auto& i_rInfo ) { return std::string( i_rInfo.param.Label ); } );
-
-  TEST( LabelSlider, LastNumberLeftOutRatherThanCut )
-  {
-    VLabelSlider Slider( Qt::Horizontal );
-    Slider.setRange( 0, 100 );
-    Slider.resize( 520, 40 );
-    Slider.setValue( 50 );
-    const QImage Image = Slider.grab().toImage();
-    const QRect Groove = Slider.GrooveRect();
-    const QRect Handle = Slider.HandleRect();
-    const QRgb Background = Image.pixel( 0, 0 );
-    const int TextWidth = Slider.fontMetrics().tightBoundingRect( "100" ).width();
-    const float LastMark = float( Groove.width() - Handle.width() ) + float( Handle.width() / 2 );
-    ASSERT_GE( LastMark + TextWidth / 2.0f, float( Slider.width() ) ) << "the last number must not fit for this test";
-
-    const int BaseLine = Groove.y() - 2 + Groove.height();
-    auto TextInColumns = [&]( int i_From, int i_To )
-    {
-      for( int y = BaseLine + 2; y < Image.height(); ++y )
-        for( int x = std::max( i_From, 0 ); x < std::min( i_To, Image.width() ); ++x )
-          if( Image.pixel( x, y ) != Background )
-            return true;
-      return false;
-    };
-    EXPECT_FALSE( TextInColumns( int( LastMark - TextWidth / 2.0f ) - 1, Image.width() ) );
-    // The "0" at the start is there, so the band does hold numbers.
-    EXPECT_TRUE( TextInColumns( 0, Handle.width() + 8 ) );
-  }
 
   TEST( LabelSlider, SingleFrameFilePaintsWithoutComplaint )
   {
@@ -197,12 +170,6 @@ namespace
     EXPECT_EQ( Window.Wheels, 1 );
   }
 
-  TEST( LabelSlider, FocusByTabAndClick )
-  {
-    EXPECT_EQ( VLabelSlider().focusPolicy(), Qt::StrongFocus );
-    EXPECT_EQ( VLabelSlider( Qt::Horizontal ).focusPolicy(), Qt::StrongFocus );
-  }
-
   struct VClickCase
   {
     const char* Label;
@@ -226,7 +193,9 @@ namespace
   TEST_P( ClickOnGroove, JumpsThereWithTheProxyStyle )
   {
     if( GetParam().bStyleSheet )
+    {
       ASSERT_TRUE( LumekVideoViewer::ApplyStyleSheet() );
+    }
     VLabelSlider Slider( Qt::Horizontal );
     if( GetParam().bProxy )
     {
@@ -270,16 +239,5 @@ namespace
     // Still alive and still answering for everyone else.
     EXPECT_EQ( QApplication::style(), pApplicationStyle );
     EXPECT_NE( pApplicationStyle->styleHint( QStyle::SH_Slider_AbsoluteSetButtons ), int( Qt::LeftButton ) );
-  }
-
-  TEST( ProxyStyle, TakesOverAStyleOfItsOwn )
-  {
-    QStyle* pOwn = QStyleFactory::create( "fusion" );
-    ASSERT_TRUE( pOwn );
-    VProxyStyle Proxy( pOwn );
-    EXPECT_EQ( Proxy.baseStyle(), pOwn );
-    EXPECT_EQ( pOwn->parent(), &Proxy );
-    // Other hints come from the base.
-    EXPECT_EQ( Proxy.styleHint( QStyle::SH_Slider_SnapToValue ), pOwn->styleHint( QStyle::SH_Slider_SnapToValue ) );
   }
 } // namespace

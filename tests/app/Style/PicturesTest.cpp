@@ -63,8 +63,6 @@ namespace
   struct VCoverage
   {
     int Opaque = 0;
-    // Sum of the alpha of all pixels: the area covered, edges counted by their share.
-    double Area = 0.0;
     double Luminance = 0.0;
     QRect Bounds;
   };
@@ -83,7 +81,6 @@ namespace
         Coverage.Bounds |= QRect( x, y, 1, 1 );
         Coverage.Luminance += Pixel.alphaF() * Pixel.lightnessF();
         Weight += Pixel.alphaF();
-        Coverage.Area += Pixel.alphaF();
       }
     if( Weight > 0.0 )
       Coverage.Luminance /= Weight;
@@ -110,16 +107,6 @@ namespace
       EXPECT_TRUE( Used.count( rName ) ) << rName.toStdString() << " is in the resources but nothing shows it";
   }
 
-  TEST( Pictures, TransportButtonsHaveDisabledForms )
-  {
-    const auto InSheet = PicturesInSheet();
-    for( const char* pName : { "ButtonPlay", "ButtonPause", "ButtonStop", "ButtonFullScreen" } )
-    {
-      EXPECT_TRUE( InSheet.count( pName ) ) << pName;
-      EXPECT_TRUE( InSheet.count( QString( pName ) + "Disabled" ) ) << pName;
-    }
-  }
-
   class Picture : public testing::TestWithParam< QString >
   {
   };
@@ -138,17 +125,6 @@ namespace
     EXPECT_GT( Coverage.Opaque, 0 );
     // Something is drawn but not a full rectangle: these are glyphs on a transparent ground.
     EXPECT_LT( Coverage.Opaque, Size.width() * Size.height() * 16 );
-  }
-
-  TEST_P( Picture, ScalesWithoutSteps )
-  {
-    // A vector drawing covers four times the area at twice the size; a bitmap in disguise would
-    // not keep the proportion so closely.
-    QSvgRenderer Renderer( PathOf( GetParam() ) );
-    const QSize Size = Renderer.defaultSize();
-    const double Small = Measure( Render( GetParam(), Size * 4 ) ).Area;
-    const double Large = Measure( Render( GetParam(), Size * 8 ) ).Area;
-    EXPECT_NEAR( Large / Small, 4.0, 0.1 );
   }
 
   INSTANTIATE_TEST_SUITE_P( Style, Picture, testing::ValuesIn( PicturesInResources() ),

@@ -9,7 +9,6 @@
 #include <QCheckBox>
 #include <QGroupBox>
 #include <QHBoxLayout>
-#include <QHeaderView>
 #include <QLabel>
 #include <QLineEdit>
 #include <QMainWindow>
@@ -17,45 +16,14 @@
 #include <QMenuBar>
 #include <QPushButton>
 #include <QRegularExpression>
-#include <QScrollBar>
 #include <QStandardItemModel>
 #include <QTableView>
-#include <QTextBrowser>
 #include <QToolTip>
 
 #include <gtest/gtest.h>
 
-#include <set>
-
 namespace
 {
-  QString PreparedSheet()
-  {
-    return LumekVideoViewer::PrepareStyleSheet( *ZOL::ApplicationStyling() );
-  }
-
-  // Collects what Qt says while it reads and applies a sheet.
-  class VMessageCapture
-  {
-  public:
-    VMessageCapture()
-    {
-      s_Messages.clear();
-      s_Previous = qInstallMessageHandler( &Handler );
-    }
-    ~VMessageCapture() { qInstallMessageHandler( s_Previous ); }
-    const QStringList& Messages() const { return s_Messages; }
-
-  private:
-    static void Handler( QtMsgType i_Type, const QMessageLogContext&, const QString& i_rMessage )
-    {
-      if( i_Type != QtDebugMsg && i_Type != QtInfoMsg )
-        s_Messages << i_rMessage;
-    }
-    static inline QStringList s_Messages;
-    static inline QtMessageHandler s_Previous = nullptr;
-  };
-
   class StyleSheet : public testing::Test
   {
   protected:
@@ -66,148 +34,127 @@ namespace
     }
   };
 
-  TEST_F( StyleSheet, OnlyTheUnmatchedCapitalTokenIsLeft )
+  TEST_F( StyleSheet, NoTokenOrExpressionIsLeft )
   {
-    const QString Sheet = PreparedSheet();
+    const QString Sheet = LumekVideoViewer::PrepareStyleSheet( *ZOL::ApplicationStyling() );
     ASSERT_FALSE( Sheet.isEmpty() );
-    static const QRegularExpression s_Token( QStringLiteral( R"(\[[A-Za-z][A-Za-z0-9]*\])" ) );
-    std::set< QString > Left;
-    for( auto Matches = s_Token.globalMatch( Sheet ); Matches.hasNext(); )
-      Left.insert( Matches.next().captured( 0 ) );
     // "[Mid]" is matched by no value: the lower-case "[mid]" is the theme's.
-    for( const QString& rToken : Left )
-      EXPECT_EQ( rToken, "[Mid]" ) << "token left in the sheet";
-  }
-
-  TEST_F( StyleSheet, EveryExpressionIsWorkedOut )
-  {
-    const QString Sheet = PreparedSheet();
+    static const QRegularExpression s_Token( QStringLiteral( R"(\[[A-Za-z][A-Za-z0-9]*\])" ) );
+    for( auto Matches = s_Token.globalMatch( Sheet ); Matches.hasNext(); )
+      EXPECT_EQ( Matches.next().captured( 0 ), "[Mid]" );
+    // What still looks like arithmetic is a picture's address or a plain number; anything else is
+    // an expression the evaluation could not read, and Qt would not either.
     static const QRegularExpression s_Arithmetic( QStringLiteral( R"(:(.+[+\-\/*]+.+);\s*$)" ),
                                                   QRegularExpression::MultilineOption );
     static const QRegularExpression s_Number( QStringLiteral( R"(^\s*-?[0-9.]+$)" ) );
     for( auto Matches = s_Arithmetic.globalMatch( Sheet ); Matches.hasNext(); )
     {
       const QString Value = Matches.next().captured( 1 );
-      // What still looks like arithmetic is a picture's address or a plain negative number; anything
-      // else is an expression the evaluation could not read, and Qt would not either.
       EXPECT_TRUE( Value.contains( "url(:/com.Lumek.LumekVideoViewer." ) || s_Number.match( Value ).hasMatch() )
           << Value.toStdString();
     }
   }
 
-  // One of each widget the sheet styles, in the states it has rules for.
-  struct VGallery
+  // Collects what Qt says while it reads and applies the sheet.
+  QStringList s_Messages;
+  void Collect( QtMsgType i_Type, const QMessageLogContext&, const QString& i_rMessage )
   {
-    QMainWindow Window;
-    QWidget* pCentral = new QWidget;
+    if( i_Type != QtDebugMsg && i_Type != QtInfoMsg )
+      s_Messages << i_rMessage;
+  }
 
-    VGallery()
-    {
-      auto* pLayout = new QVBoxLayout( pCentral );
-      auto* pTop = new QHBoxLayout;
-      auto* pMenuBar = new QMenuBar;
-      QMenu* pMenu = pMenuBar->addMenu( "&Playback " );
-      QAction* pLoop = pMenu->addAction( "&Looping" );
-      pLoop->setCheckable( true );
-      pLoop->setChecked( true );
-      QMenu* pDecoder = pMenu->addMenu( "Decoder" );
-      auto* pGroup = new QActionGroup( pDecoder );
-      for( const char* pText : { "Hardware (GPU)", "Software (CPU)" } )
-      {
-        QAction* pAction = pDecoder->addAction( pText );
-        pAction->setCheckable( true );
-        pGroup->addAction( pAction );
-      }
-      pGroup->actions().first()->setChecked( true );
-      pMenu->addSeparator();
-      pMenu->addAction( "Stop" )->setEnabled( false );
-      pTop->addWidget( pMenuBar );
-      auto* pLogo = new QLabel;
-      pLogo->setObjectName( "Logo" );
-      pLogo->setPixmap( QPixmap( ":/com.Lumek.LumekVideoViewer.LumekLogo.svg" ) );
-      pTop->addWidget( pLogo );
-      pLayout->addLayout( pTop );
+  QPushButton* NamedButton( const char* i_pName, bool i_bEnabled = true )
+  {
+    auto* pButton = new QPushButton;
+    pButton->setObjectName( i_pName );
+    pButton->setEnabled( i_bEnabled );
+    return pButton;
+  }
 
-      auto* pTable = new QTableView;
-      auto* pModel = new QStandardItemModel( 40, 2, pTable );
-      pModel->setHorizontalHeaderLabels( { "Name", "Value" } );
-      pTable->setModel( pModel );
-      pTable->setSortingEnabled( true );
-      pTable->setAlternatingRowColors( true );
-      pLayout->addWidget( pTable, 1 );
-
-      auto* pInfo = new QWidget;
-      pInfo->setObjectName( "InfoPanel" );
-      auto* pInfoLayout = new QHBoxLayout( pInfo );
-      pInfoLayout->addWidget( new QLabel( "No file open" ) );
-      auto* pCheck = new QCheckBox( "Checked" );
-      pCheck->setChecked( true );
-      pInfoLayout->addWidget( pCheck );
-      auto* pPartial = new QCheckBox( "Partial" );
-      pPartial->setTristate( true );
-      pPartial->setCheckState( Qt::PartiallyChecked );
-      pPartial->setEnabled( false );
-      pInfoLayout->addWidget( pPartial );
-      pInfoLayout->addWidget( new QLineEdit( "1.23" ) );
-      pLayout->addWidget( pInfo );
-
-      auto* pControls = new QGroupBox;
-      pControls->setObjectName( "Controls" );
-      auto* pControlsLayout = new QHBoxLayout( pControls );
-      auto* pSlider = new LumekVideoViewer::VLabelSlider( Qt::Horizontal );
-      pSlider->setObjectName( "Timebar" );
-      auto* pProxy = new LumekVideoViewer::VProxyStyle( pSlider->style() );
-      pProxy->setParent( pSlider );
-      pSlider->setStyle( pProxy );
-      pSlider->setTickPosition( QSlider::TicksBothSides );
-      pControlsLayout->addWidget( pSlider, 1 );
-      auto* pSpin = new LumekVideoViewer::VClickSpinBox;
-      pSpin->setMinimumWidth( 70 );
-      pControlsLayout->addWidget( pSpin );
-      for( const char* pName : { "Play", "Stop", "FullScreen" } )
-      {
-        auto* pButton = new QPushButton;
-        pButton->setObjectName( pName );
-        pControlsLayout->addWidget( pButton );
-      }
-      auto* pDisabled = new QPushButton;
-      pDisabled->setObjectName( "Pause" );
-      pDisabled->setEnabled( false );
-      pControlsLayout->addWidget( pDisabled );
-      pControlsLayout->addWidget( new QPushButton( "Close" ) );
-      pLayout->addWidget( pControls );
-      pLayout->addWidget( new QTextBrowser );
-
-      Window.setCentralWidget( pCentral );
-      Window.resize( 800, 600 );
-    }
-
-    // Shows and paints everything, popups included, so every rule is parsed and every picture read.
-    void Exercise()
-    {
-      Window.show();
-      QApplication::processEvents();
-      (void)Window.grab();
-      for( QMenu* pMenu : Window.findChildren< QMenu* >() )
-      {
-        pMenu->popup( QPoint( 0, 0 ) );
-        QApplication::processEvents();
-        (void)pMenu->grab();
-        pMenu->hide();
-      }
-      QToolTip::showText( QPoint( 10, 10 ), "Play video", &Window );
-      QApplication::processEvents();
-      QToolTip::hideText();
-    }
-  };
-
+  // One of each widget the sheet styles, in the states it has rules for, shown and painted with
+  // its menus and a tool tip, so every rule is parsed and every picture read.
   TEST_F( StyleSheet, QtAppliesItWithoutComplaint )
   {
-    VMessageCapture Capture;
+    s_Messages.clear();
+    const QtMessageHandler Previous = qInstallMessageHandler( &Collect );
     ASSERT_TRUE( LumekVideoViewer::ApplyStyleSheet() );
-    VGallery Gallery;
-    Gallery.Exercise();
-    EXPECT_TRUE( Capture.Messages().isEmpty() ) << Capture.Messages().join( "\n" ).toStdString();
+
+    QMainWindow Window;
+    auto* pCentral = new QWidget;
+    auto* pLayout = new QVBoxLayout( pCentral );
+    auto* pMenuBar = new QMenuBar;
+    QMenu* pMenu = pMenuBar->addMenu( "&Playback " );
+    QAction* pLoop = pMenu->addAction( "&Looping" );
+    pLoop->setCheckable( true );
+    pLoop->setChecked( true );
+    auto* pGroup = new QActionGroup( pMenu );
+    QMenu* pDecoder = pMenu->addMenu( "Decoder" );
+    for( const char* pText : { "Hardware (GPU)", "Software (CPU)" } )
+      pGroup->addAction( pDecoder->addAction( pText ) )->setCheckable( true );
+    pGroup->actions().first()->setChecked( true );
+    pMenu->addSeparator();
+    pMenu->addAction( "Stop" )->setEnabled( false );
+    pLayout->addWidget( pMenuBar );
+    auto* pLogo = new QLabel;
+    pLogo->setObjectName( "Logo" );
+    pLogo->setPixmap( QPixmap( ":/com.Lumek.LumekVideoViewer.LumekLogo.svg" ) );
+    pLayout->addWidget( pLogo );
+
+    auto* pTable = new QTableView;
+    auto* pModel = new QStandardItemModel( 40, 2, pTable );
+    pModel->setHorizontalHeaderLabels( { "Name", "Value" } );
+    pTable->setModel( pModel );
+    pTable->setSortingEnabled( true );
+    pTable->setAlternatingRowColors( true );
+    pLayout->addWidget( pTable, 1 );
+
+    auto* pInfo = new QWidget;
+    pInfo->setObjectName( "InfoPanel" );
+    auto* pInfoLayout = new QHBoxLayout( pInfo );
+    pInfoLayout->addWidget( new QLabel( "No file open" ) );
+    auto* pCheck = new QCheckBox( "Checked" );
+    pCheck->setChecked( true );
+    pInfoLayout->addWidget( pCheck );
+    auto* pPartial = new QCheckBox( "Partial" );
+    pPartial->setTristate( true );
+    pPartial->setCheckState( Qt::PartiallyChecked );
+    pPartial->setEnabled( false );
+    pInfoLayout->addWidget( pPartial );
+    pInfoLayout->addWidget( new QLineEdit( "1.23" ) );
+    pLayout->addWidget( pInfo );
+
+    auto* pControls = new QGroupBox;
+    pControls->setObjectName( "Controls" );
+    auto* pControlsLayout = new QHBoxLayout( pControls );
+    auto* pSlider = new LumekVideoViewer::VLabelSlider( Qt::Horizontal );
+    auto* pProxy = new LumekVideoViewer::VProxyStyle( pSlider->style() );
+    pProxy->setParent( pSlider );
+    pSlider->setStyle( pProxy );
+    pControlsLayout->addWidget( pSlider, 1 );
+    pControlsLayout->addWidget( new LumekVideoViewer::VClickSpinBox );
+    for( auto* pButton : { NamedButton( "Play" ), NamedButton( "Stop" ), NamedButton( "FullScreen" ),
+                           NamedButton( "Pause", false ), NamedButton( "Close" ) } )
+      pControlsLayout->addWidget( pButton );
+    pLayout->addWidget( pControls );
+    Window.setCentralWidget( pCentral );
+    Window.resize( 800, 600 );
+
+    Window.show();
+    QApplication::processEvents();
+    (void)Window.grab();
+    for( QMenu* pPopup : { pMenu, pDecoder } )
+    {
+      pPopup->popup( QPoint( 0, 0 ) );
+      QApplication::processEvents();
+      (void)pPopup->grab();
+      pPopup->hide();
+    }
+    QToolTip::showText( QPoint( 10, 10 ), "Play video", &Window );
+    QApplication::processEvents();
+    QToolTip::hideText();
+
+    qInstallMessageHandler( Previous );
+    EXPECT_TRUE( s_Messages.isEmpty() ) << s_Messages.join( "\n" ).toStdString();
   }
 
   struct VDensityCase
@@ -216,11 +163,6 @@ namespace
     int ButtonSide;
     int SliderHeight;
   };
-
-  std::ostream& operator<<( std::ostream& io_rStream, const VDensityCase& i_rCase )
-  {
-    return io_rStream << i_rCase.DPI << "dpi";
-  }
 
   class Density : public StyleSheet, public testing::WithParamInterface< VDensityCase >
   {
@@ -232,8 +174,7 @@ namespace
     ASSERT_TRUE( LumekVideoViewer::ApplyStyleSheet() );
     QWidget Host;
     auto* pLayout = new QHBoxLayout( &Host );
-    auto* pPlay = new QPushButton;
-    pPlay->setObjectName( "Play" );
+    auto* pPlay = NamedButton( "Play" );
     pLayout->addWidget( pPlay );
     auto* pSlider = new LumekVideoViewer::VLabelSlider( Qt::Horizontal );
     pLayout->addWidget( pSlider );
@@ -254,20 +195,16 @@ namespace
   TEST_F( StyleSheet, RenamingThePlayButtonSwapsItsPicture )
   {
     ASSERT_TRUE( LumekVideoViewer::ApplyStyleSheet() );
-    QPushButton Button;
-    Button.setObjectName( "Play" );
-    QPushButton Pause;
-    Pause.setObjectName( "Pause" );
-    Button.show();
-    Pause.show();
+    std::unique_ptr< QPushButton > pButton( NamedButton( "Play" ) ), pPause( NamedButton( "Pause" ) );
+    pButton->show();
+    pPause->show();
     QApplication::processEvents();
-    const QImage Playing = Button.grab().toImage();
-    const QImage Paused = Pause.grab().toImage();
-    ASSERT_NE( Playing, Paused );
+    const QImage Paused = pPause->grab().toImage();
+    ASSERT_NE( pButton->grab().toImage(), Paused );
 
-    Button.setObjectName( "Pause" );
-    Button.setStyleSheet( "/**/" );
+    pButton->setObjectName( "Pause" );
+    pButton->setStyleSheet( "/**/" );
     QApplication::processEvents();
-    EXPECT_EQ( Button.grab().toImage(), Paused );
+    EXPECT_EQ( pButton->grab().toImage(), Paused );
   }
 } // namespace
