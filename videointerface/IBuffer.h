@@ -5,6 +5,7 @@
 // rather than the heap and keep their capacity between uses.
 
 #include "services/Log.h"
+#include "utils/UtilsMemory/VBlockPool.h"
 
 #include <cstdint>
 #include <memory>
@@ -91,9 +92,10 @@ namespace ZOL
       }
       // Throws std::bad_weak_ptr for an allocator that is not owned by a shared pointer.
       auto pSelf = this->shared_from_this();
-      std::shared_ptr< IStandardBuffer > pShared( pBuffer, [ pSelf ]( IStandardBuffer* i_pBuffer ) {
-        pSelf->Recycler.Release( i_pBuffer );
-      } );
+      // The control block comes from a pool too: with it, a recycled frame costs no allocation.
+      std::shared_ptr< IStandardBuffer > pShared(
+          pBuffer, [ pSelf ]( IStandardBuffer* i_pBuffer ) { pSelf->Recycler.Release( i_pBuffer ); },
+          UtilsMemory::VPooledAllocator< IStandardBuffer >() );
       try
       {
         pShared->Resize( i_Size );

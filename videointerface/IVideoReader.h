@@ -68,6 +68,20 @@ namespace ZOL
     virtual void Close() = 0;
   };
 
+  // A companion of readers whose index can have gaps (.lvid, image sequences). Callers would
+  // otherwise ask HasFrame of every number, and a damaged index that names a frame in the
+  // billions turns such a walk into a hang. Found by dynamic_cast on the reader.
+  class IFrameIndexQueries
+  {
+  public:
+    virtual ~IFrameIndexQueries() = default;
+    // Frames the index really holds.
+    virtual std::uint64_t GetStoredFrameCount() const = 0;
+    // The nearest stored frame number at or below, or at or above, the index.
+    virtual std::optional< std::uint64_t > FindStoredFrameAtOrBefore( std::uint64_t i_FrameIndex ) const = 0;
+    virtual std::optional< std::uint64_t > FindStoredFrameAtOrAfter( std::uint64_t i_FrameIndex ) const = 0;
+  };
+
   // The container a file name names: "%FRAME%" or "%FRAME_NUMBER%" anywhere, or no extension,
   // means an image sequence; otherwise the extension compared exactly, case and all.
   std::optional< EVideoContainer > FindVideoContainer( const std::string& i_rFileName );

@@ -1,7 +1,10 @@
 #include "app/VideoSource/VVideoSource.h"
 
-#include "fileio/VideoEncoding/VideoEncoding.h"
+#include "fileio/VideoEncoding/VideoFrameDecoder.h"
 #include "fileio/VideoReaders/CreateVideoReader.h"
+
+#include <algorithm>
+#include <climits>
 
 namespace LumekVideoViewer
 {
@@ -24,12 +27,18 @@ namespace LumekVideoViewer
     }
     m_FilePath = i_rPath;
 
-    // The whole index is walked once here: the count shows in the information panel and nowhere else.
-    m_MissingFrames = 0;
+    // Counted once here: the number shows in the information panel and nowhere else. A reader
+    // with gaps answers from its index; the others are walked, which for them is quick.
+    m_pIndexQueries = dynamic_cast< const ZOL::IFrameIndexQueries* >( m_pReader.get() );
     const std::uint64_t FrameCount = m_pReader->GetFrameCount();
-    for( std::uint64_t i = 0; i < FrameCount; ++i )
-      if( !m_pReader->HasFrame( i ) )
-        ++m_MissingFrames;
+    std::uint64_t Missing = 0;
+    if( m_pIndexQueries )
+      Missing = FrameCount - std::min( FrameCount, m_pIndexQueries->GetStoredFrameCount() );
+    else
+      for( std::uint64_t i = 0; i < FrameCount; ++i )
+        if( !m_pReader->HasFrame( i ) )
+          ++Missing;
+    m_MissingFrames = static_cast< std::int32_t >( std::min< std::uint64_t >( Missing, INT32_MAX ) );
 
     m_Camera = CoreLumekTypes::VCameraHardware();
     ZOL::ReadCameraHardware( m_pReader->GetAttributes(), m_Camera );
@@ -43,6 +52,7 @@ namespace LumekVideoViewer
 
   bool VVideoSource::Close()
   {
+    m_pIndexQueries = nullptr;
     m_pReader.reset();
     return true;
   }
@@ -52,11 +62,14 @@ namespace LumekVideoViewer
     if( !m_pReader )
       return false;
     std::shared_ptr< ZOL::IBuffer > pBuffer;
-    ZOL::IAudioBuffers Audio;
-    if( !m_pReader->ReadFrameData( i_Index, pBuffer, Audio, true, true ) )
+    // The list is kept between frames, and copied into the caller's, so that a caller that keeps
+    // its frame record plays without going back to the heap.
+    m_AudioScratch.clear();
+    if( !m_pReader->ReadFrameData( i_Index, pBuffer, m_AudioScratch, true, true ) )
       return false;
     o_rFrame.AudioFrameInfo = m_pReader->GetAudioFrameInfo();
-    o_rFrame.Audio = std::move( Audio );
+    o_rFrame.Audio.assign( m_AudioScratch.begin(), m_AudioScratch.end() );
+    m_AudioScratch.clear();
 
     const ZOL::EVideoPayload Payload = m_pReader->GetVideoPayload();
     ZOL::IVideoFrameInfo Info = m_pReader->GetVideoFrameInfo();
@@ -67,6 +80,38 @@ namespace LumekVideoViewer
     o_rFrame.VideoFrameInfo = Info;
     o_rFrame.Video = std::move( pBuffer );
     return bDecoded;
+  }
+
+  std::optional< std::uint64_t > VVideoSource::FindFrameAtOrBefore( std::uint64_t i_Index ) const
+  {
+    if( !m_pReader )
+      return std::nullopt;
+    const std::uint64_t FrameCount = m_pReader->GetFrameCount();
+    if( FrameCount == 0 )
+      return std::nullopt;
+    const std::uint64_t Start = std::min( i_Index, FrameCount - 1 );
+    if( m_pIndexQueries )
+      return m_pIndexQueries->FindStoredFrameAtOrBefore( Start );
+    for( std::uint64_t i = Start + 1; i-- > 0; )
+      if( m_pReader->HasFrame( i ) )
+        return i;
+    return std::nullopt;
+  }
+
+  std::optional< std::uint64_t > VVideoSource::FindFrameAtOrAfter( std::uint64_t i_Index ) const
+  {
+    if( !m_pReader )
+      return std::nullopt;
+    const std::uint64_t FrameCount = m_pReader->GetFrameCount();
+    if( m_pIndexQueries )
+    {
+      const auto Found = m_pIndexQueries->FindStoredFrameAtOrAfter( i_Index );
+      return Found && *Found < FrameCount ? Found : std::nullopt;
+    }
+    for( std::uint64_t i = i_Index; i < FrameCount; ++i )
+      if( m_pReader->HasFrame( i ) )
+        return i;
+    return std::nullopt;
   }
 
   std::uint64_t VVideoSource::GetFrameCount() const { return m_pReader->GetFrameCount(); }

@@ -6,6 +6,7 @@
 
 #include <cstdint>
 #include <memory>
+#include <optional>
 #include <string>
 
 namespace ZOL
@@ -42,6 +43,10 @@ namespace LumekVideoViewer
     std::string GetFrameTimecodeText( std::uint64_t i_Index ) const;
 
     std::int32_t GetMissingFrameCount() const { return m_MissingFrames; }
+    // The nearest frame that exists at or below, or at or above, the index; nothing when there is
+    // none or no file is open. Missing frames fall back to the frame before them.
+    std::optional< std::uint64_t > FindFrameAtOrBefore( std::uint64_t i_Index ) const;
+    std::optional< std::uint64_t > FindFrameAtOrAfter( std::uint64_t i_Index ) const;
     const std::string& GetFilePath() const { return m_FilePath; }
 
     // With no reader these answer from default records.
@@ -64,6 +69,7 @@ namespace LumekVideoViewer
 
   private:
     std::shared_ptr< ZOL::IVideoReader > m_pReader;
+    const ZOL::IFrameIndexQueries* m_pIndexQueries = nullptr;
     std::string m_FilePath;
     std::int32_t m_MissingFrames = 0;
     std::shared_ptr< ZOL::VFrameBufferAllocator > m_pFirstAllocator;
@@ -71,5 +77,6 @@ namespace LumekVideoViewer
     std::shared_ptr< ZOL::IH264Decoder > m_pH264Decoder;
     CoreLumekTypes::VLensDistortionCalibration m_Lens;
     CoreLumekTypes::VCameraHardware m_Camera;
+    ZOL::IAudioBuffers m_AudioScratch;
   };
 }

@@ -5,6 +5,7 @@
 #include "videointerface/BufferAllocators.h"
 
 #include <algorithm>
+#include <iterator>
 #include <limits>
 #include <vector>
 
@@ -161,6 +162,22 @@ namespace LumekVideo
   std::uint64_t VReader::GetFrameCount() const
   {
     return m_Index.empty() ? 0 : m_Index.rbegin()->first + 1;
+  }
+
+  std::optional< std::uint64_t > VReader::FindStoredFrameAtOrBefore( std::uint64_t i_FrameIndex ) const
+  {
+    auto Found = m_Index.upper_bound( i_FrameIndex );
+    if( Found == m_Index.begin() )
+      return std::nullopt;
+    return std::prev( Found )->first;
+  }
+
+  std::optional< std::uint64_t > VReader::FindStoredFrameAtOrAfter( std::uint64_t i_FrameIndex ) const
+  {
+    const auto Found = m_Index.lower_bound( i_FrameIndex );
+    if( Found == m_Index.end() )
+      return std::nullopt;
+    return Found->first;
   }
 
   bool VReader::HasFrame( std::uint64_t i_FrameIndex ) const

@@ -15,7 +15,7 @@
 
 namespace LumekVideo
 {
-  class VReader : public ZOL::IVideoReader
+  class VReader : public ZOL::IVideoReader, public ZOL::IFrameIndexQueries
   {
   public:
     VReader();
@@ -41,6 +41,10 @@ namespace LumekVideo
     const ZOL::IVideoSettings& GetVideoSettings() const override { return m_Settings; }
     std::uint64_t GetFrameCount() const override;
     bool HasFrame( std::uint64_t i_FrameIndex ) const override;
+
+    std::uint64_t GetStoredFrameCount() const override { return m_Index.size(); }
+    std::optional< std::uint64_t > FindStoredFrameAtOrBefore( std::uint64_t i_FrameIndex ) const override;
+    std::optional< std::uint64_t > FindStoredFrameAtOrAfter( std::uint64_t i_FrameIndex ) const override;
     bool ReadFrameData( std::uint64_t i_FrameIndex, std::shared_ptr< ZOL::IBuffer >& o_rVideo,
                         ZOL::IAudioBuffers& o_rAudio, bool i_bReadVideo, bool i_bReadAudio ) override;
     void Close() override;
