@@ -1,0 +1,151 @@
+#include "ToolRunner.h"
+
+#include "fileio/LumekVideo/VWriter.h"
+#include "videointerface/AttributeRecords.h"
+
+#include <boost/property_tree/json_parser.hpp>
+
+#include <gtest/gtest.h>
+
+#include <sys/wait.h>
+
+#include <fstream>
+#include <sstream>
+
+namespace fs = boost::filesystem;
+
+namespace LumekVideoToolTest
+{
+  namespace
+  {
+    std::string ShellQuote( const std::string& i_rText )
+    {
+      std::string Quoted = "'";
+      for( char c : i_rText )
+        Quoted += c == '\'' ? std::string( "'\\''" ) : std::string( 1, c );
+      return Quoted + "'";
+    }
+
+    std::string ReadText( const fs::path& i_rPath )
+    {
+      std::ifstream File( i_rPath.string(), std::ios::binary );
+      std::stringstream Text;
+      Text << File.rdbuf();
+      return Text.str();
+    }
+  }
+
+  VRun RunTool( const std::vector< std::string >& i_rArguments )
+  {
+    const fs::path Out = fs::temp_directory_path() / fs::unique_path( "lvtool-out-%%%%%%%%" );
+    const fs::path Err = fs::temp_directory_path() / fs::unique_path( "lvtool-err-%%%%%%%%" );
+    std::string Command = ShellQuote( LUMEK_TOOL_PATH );
+    for( const std::string& rArgument : i_rArguments )
+      Command += " " + ShellQuote( rArgument );
+    Command += " >" + ShellQuote( Out.string() ) + " 2>" + ShellQuote( Err.string() ) + " </dev/null";
+    // The shell reports a child killed by a signal as 128 + the signal.
+    const int Status = std::system( Command.c_str() );
+    VRun Run;
+    if( WIFEXITED( Status ) )
+    {
+      Run.ExitCode = WEXITSTATUS( Status );
+      Run.bSignalled = Run.ExitCode > 128;
+    }
+    else
+      Run.bSignalled = true;
+    Run.Out = ReadText( Out );
+    Run.Err = ReadText( Err );
+    fs::remove( Out );
+    fs::remove( Err );
+    return Run;
+  }
+
+  boost::property_tree::ptree ParseJson( const std::string& i_rText )
+  {
+    boost::property_tree::ptree Tree;
+    std::istringstream Stream( i_rText );
+    try
+    {
+      boost::property_tree::read_json( Stream, Tree );
+    }
+    catch( const std::exception& rException )
+    {
+      ADD_FAILURE() << "not JSON: " << rException.what() << "\n" << i_rText;
+    }
+    return Tree;
+  }
+
+  VScratch::VScratch() : m_Folder( fs::temp_directory_path() / fs::unique_path( "lvtool-test-%%%%%%%%" ) )
+  {
+    fs::create_directories( m_Folder );
+  }
+
+  VScratch::~VScratch()
+  {
+    boost::system::error_code Error;
+    fs::remove_all( m_Folder, Error );
+  }
+
+  LumekVideoTool::VRGBImage PictureFor( std::uint64_t i_Frame, int i_Width, int i_Height )
+  {
+    LumekVideoTool::VRGBImage Image( i_Width, i_Height );
+    for( int y = 0; y < i_Height; ++y )
+      for( int x = 0; x < i_Width; ++x )
+      {
+        std::uint8_t* p = Image.At( x, y );
+        p[ 0 ] = static_cast< std::uint8_t >( 20 + 30 * x + 7 * i_Frame );
+        p[ 1 ] = static_cast< std::uint8_t >( 40 + 25 * y + 3 * i_Frame );
+        p[ 2 ] = static_cast< std::uint8_t >( 200 - 10 * x - 10 * y );
+      }
+    return Image;
+  }
+
+  std::string WriteRecording( const VScratch& i_rScratch, const std::string& i_rName, const VRecordingSpec& i_rSpec )
+  {
+    ZOL::IVideoFrameInfo Video;
+    Video.ImageWidth = i_rSpec.Width;
+    Video.ImageHeight = i_rSpec.Height;
+    Video.PixelFormat = i_rSpec.Format;
+    Video.PixelAspectRatio = 1.0;
+    ZOL::IAudioFrameInfo Audio;
+    if( i_rSpec.bAudio )
+      Audio = { ZOL::AudioSampleFormat_Int16, 48000, 2 };
+    ZOL::IVideoAttributes Attributes;
+    ZOL::IVideoTiming Timing;
+    Timing.FramePeriodInTicks = Timing.TicksPerSecond / 25;
+    ZOL::WriteVideoTiming( Attributes, Timing );
+    ZOL::WriteVideoSettings( Attributes, "", i_rSpec.Settings );
+    ZOL::ITimecode Timecode;
+    Timecode.Standards = ZOL::TimecodeStandard_25;
+    Timecode.Hours = 1;
+    ZOL::WriteTimecode( Attributes, Timecode );
+    Attributes.Set( "Test.Note", "written by the tool's tests" );
+
+    const std::string Path = i_rScratch.Path( i_rName );
+    LumekVideo::VWriter Writer;
+    EXPECT_TRUE( Writer.Create( Path, Video, Audio, Attributes ) );
+    for( std::uint64_t Frame : i_rSpec.Frames )
+    {
+      const auto Bytes = LumekVideoTool::EncodeFrame( PictureFor( Frame, i_rSpec.Width, i_rSpec.Height ), i_rSpec.Format );
+      std::vector< std::uint8_t > Tone;
+      if( i_rSpec.bAudio )
+        Tone.assign( 1920 * 4, static_cast< std::uint8_t >( Frame ) );
+      EXPECT_TRUE( Writer.AppendFrame( Frame, Bytes.data(), Bytes.size(), Tone.empty() ? nullptr : Tone.data(),
+                                       Tone.size() ) );
+    }
+    EXPECT_TRUE( Writer.Close() );
+    return Path;
+  }
+
+  std::vector< std::uint8_t > ReadFileBytes( const std::string& i_rPath )
+  {
+    std::ifstream File( i_rPath, std::ios::binary );
+    return std::vector< std::uint8_t >( std::istreambuf_iterator< char >( File ), std::istreambuf_iterator< char >() );
+  }
+
+  void WriteFileBytes( const std::string& i_rPath, const std::vector< std::uint8_t >& i_rBytes )
+  {
+    std::ofstream File( i_rPath, std::ios::binary );
+    File.write( reinterpret_cast< const char* >( i_rBytes.data() ), static_cast< std::streamsize >( i_rBytes.size() ) );
+  }
+}

@@ -1,0 +1,34 @@
+#pragma once
+
+#include "tools/LumekVideoTool/FrameEncoding.h"
+
+#include <cstdint>
+#include <string>
+#include <vector>
+
+namespace LumekVideoTool
+{
+  // Renders frame i_FrameIndex of the demonstration scene: a slowly drifting colour field, a grid,
+  // discs of saturated colour on orbits, a sweeping bar and a strip of reference colours and grey
+  // steps. Smooth content, so that it still looks right after demosaicing.
+  void RenderSampleScene( int i_FrameIndex, double i_FramesPerSecond, VRGBImage& io_rImage );
+
+  // Interleaved stereo 16-bit samples of a test tone (440 Hz left, 660 Hz right) for one frame;
+  // the phase runs on across frames.
+  std::vector< std::uint8_t > RenderSampleTone( int i_FrameIndex, double i_FramesPerSecond, int i_SampleRate );
+
+  struct VSampleOptions
+  {
+    int Width = 1280;
+    int Height = 720;
+    int Frames = 300;
+    double FramesPerSecond = 100.0;
+    ZOL::EPixelFormat Format = ZOL::PixelFormat_BayerGB8;
+    bool bAudio = true;
+  };
+
+  // Writes a whole demonstration recording: timing, a start timecode, camera hardware, a lens
+  // calibration, the tone, and two frames in the middle left out of the index so that missing
+  // frames can be seen. False with a reason in o_rError.
+  bool WriteSampleRecording( const std::string& i_rPath, const VSampleOptions& i_rOptions, std::string& o_rError );
+}
