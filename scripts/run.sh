@@ -9,8 +9,8 @@ cd "$(dirname "$0")/.."
 
 build_dir=${BUILD_DIR:-build}
 file=${1:-$build_dir/samples/demo.lvid}
-if [ -x "$build_dir/bin/lumekvideoviewer" ] && [ -n "$(find app -name VVideoWindow.cpp 2>/dev/null)" ]; then
-  exec "$build_dir/bin/lumekvideoviewer" "$file"
+if [ -z "${DISPLAY:-}" ] && [ -z "${WAYLAND_DISPLAY:-}" ]; then
+  echo "No display: showing what the viewer would show of $file." >&2
+  exec "$build_dir/bin/lumekvideotool" info "$file"
 fi
-# Until the window lands, show what the viewer would show.
-exec "$build_dir/bin/lumekvideotool" info "$file"
+exec "$build_dir/bin/lumekvideoviewer" "$file"
