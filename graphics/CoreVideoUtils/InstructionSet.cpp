@@ -13,6 +13,9 @@ namespace CoreVideoUtils
       return true; // the baseline of the 64-bit instruction set
     case EInstructionSet::AVX2:
       return __builtin_cpu_supports( "avx2" );
+    case EInstructionSet::AVX512:
+      return __builtin_cpu_supports( "avx2" ) && __builtin_cpu_supports( "avx512f" ) &&
+             __builtin_cpu_supports( "avx512bw" ) && __builtin_cpu_supports( "avx512vbmi" );
 #endif
     default:
       return false;
@@ -21,7 +24,8 @@ namespace CoreVideoUtils
 
   EInstructionSet BestInstructionSet()
   {
-    static const EInstructionSet s_Best = IsSupported( EInstructionSet::AVX2 )   ? EInstructionSet::AVX2
+    static const EInstructionSet s_Best = IsSupported( EInstructionSet::AVX512 ) ? EInstructionSet::AVX512
+                                          : IsSupported( EInstructionSet::AVX2 ) ? EInstructionSet::AVX2
                                           : IsSupported( EInstructionSet::SSE2 ) ? EInstructionSet::SSE2
                                                                                  : EInstructionSet::Scalar;
     return s_Best;
@@ -37,6 +41,8 @@ namespace CoreVideoUtils
       return "SSE2";
     case EInstructionSet::AVX2:
       return "AVX2";
+    case EInstructionSet::AVX512:
+      return "AVX512";
     }
     return "Unknown";
   }

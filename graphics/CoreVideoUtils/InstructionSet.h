@@ -10,6 +10,8 @@ namespace CoreVideoUtils
     Scalar,
     SSE2,
     AVX2,
+    // AVX-512 with byte permutes (F, BW, VBMI). Kernels without a form of their own run AVX2.
+    AVX512,
   };
 
   // The widest form this processor runs.

@@ -214,7 +214,7 @@ namespace CoreVideoUtils
         return;
       std::uint32_t x = 1;
 #if defined( __x86_64__ )
-      if( i_Set == EInstructionSet::AVX2 )
+      if( i_Set >= EInstructionSet::AVX2 )
         x = DemosaicRowInteriorAVX2( i_pNorth, i_pRow, i_pSouth, i_Width, K0, i_bSwapRB, o_pRGB );
       else if( i_Set == EInstructionSet::SSE2 )
         x = DemosaicRowInteriorSSE2( i_pNorth, i_pRow, i_pSouth, i_Width, K0, i_bSwapRB, o_pRGB );
@@ -230,7 +230,7 @@ namespace CoreVideoUtils
     {
       std::uint64_t Done = 0;
 #if defined( __x86_64__ )
-      if( i_Set == EInstructionSet::AVX2 )
+      if( i_Set >= EInstructionSet::AVX2 )
         Done = YUV422ToRGBAVX2( i_pSource, i_bLumaFirst, i_PixelCount, o_pRGB );
       else if( i_Set == EInstructionSet::SSE2 )
         Done = YUV422ToRGBSSE2( i_pSource, i_bLumaFirst, i_PixelCount, o_pRGB );
@@ -267,7 +267,7 @@ namespace CoreVideoUtils
         Groups = std::min< std::uint64_t >( Groups, ( Available - 8 ) / i_Bits + 1 );
       std::uint64_t Done = 0;
 #if defined( __x86_64__ )
-      if( BestInstructionSet() == EInstructionSet::AVX2 )
+      if( BestInstructionSet() >= EInstructionSet::AVX2 )
         Done = UnpackSamplesAVX2( i_pSource + StartByte, Available, i_Bits, Groups * 8, o_pBytes + i ) / 8;
 #endif
       if( i_Bits == 7 )
@@ -331,7 +331,9 @@ namespace CoreVideoUtils
         return;
       std::uint64_t i = 0;
 #if defined( __x86_64__ )
-      if( i_Set == EInstructionSet::AVX2 )
+      if( i_Set == EInstructionSet::AVX512 )
+        i = CorrectColoursAVX512( io_pData, i_PixelCount, i_Step, i_pTable, i_SaturationDelta );
+      else if( i_Set == EInstructionSet::AVX2 )
         i = CorrectColoursAVX2( io_pData, i_PixelCount, i_Step, i_pTable, i_SaturationDelta );
 #endif
       std::uint8_t* p = io_pData + i * i_Step;

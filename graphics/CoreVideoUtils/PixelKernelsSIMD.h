@@ -35,5 +35,7 @@ namespace CoreVideoUtils
 
     std::uint64_t CorrectColoursAVX2( std::uint8_t* io_pData, std::uint64_t i_PixelCount, unsigned i_Step,
                                       const std::uint8_t* i_pTable, float i_SaturationDelta );
+    std::uint64_t CorrectColoursAVX512( std::uint8_t* io_pData, std::uint64_t i_PixelCount, unsigned i_Step,
+                                        const std::uint8_t* i_pTable, float i_SaturationDelta );
   } // namespace Kernels
 } // namespace CoreVideoUtils

@@ -239,7 +239,7 @@ namespace
   {
     const VHandCase& rCase = GetParam();
     for( auto Set : { CoreVideoUtils::EInstructionSet::Scalar, CoreVideoUtils::EInstructionSet::SSE2,
-                      CoreVideoUtils::EInstructionSet::AVX2 } )
+                      CoreVideoUtils::EInstructionSet::AVX2, CoreVideoUtils::EInstructionSet::AVX512 } )
     {
       if( !CoreVideoUtils::IsSupported( Set ) )
         continue;
@@ -303,7 +303,7 @@ namespace
     const Bytes Mosaic = RandomBytes( Size.first * Size.second, 77 );
     const Bytes Expected = ReferenceDemosaic( Mosaic, Size.first, Size.second, Pattern.Pattern );
     for( auto Set : { CoreVideoUtils::EInstructionSet::Scalar, CoreVideoUtils::EInstructionSet::SSE2,
-                      CoreVideoUtils::EInstructionSet::AVX2 } )
+                      CoreVideoUtils::EInstructionSet::AVX2, CoreVideoUtils::EInstructionSet::AVX512 } )
     {
       if( !CoreVideoUtils::IsSupported( Set ) )
         continue;

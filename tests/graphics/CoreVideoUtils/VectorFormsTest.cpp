@@ -55,7 +55,7 @@ namespace
 
   INSTANTIATE_TEST_SUITE_P(
       Kernels, VectorForms,
-      ::testing::Combine( ::testing::Values( EInstructionSet::SSE2, EInstructionSet::AVX2 ),
+      ::testing::Combine( ::testing::Values( EInstructionSet::SSE2, EInstructionSet::AVX2, EInstructionSet::AVX512 ),
                           ::testing::Values( std::make_tuple( PixelFormat_BayerRG8, PixelFormat_R8G8B8 ),
                                              std::make_tuple( PixelFormat_BayerGB8, PixelFormat_R8G8B8 ),
                                              std::make_tuple( PixelFormat_BayerGR8, PixelFormat_B8G8R8 ),
@@ -100,10 +100,17 @@ namespace
           CoreVideoUtils::VColourCorrector Corrector;
           Corrector.Set( { Saturation, Gamma } );
           const std::uint64_t Count = Pixels.size() / Step;
-          Bytes Scalar = Pixels, Vector = Pixels;
+          Bytes Scalar = Pixels;
           Corrector.ApplyToRun( Scalar.data(), Count, Step, EInstructionSet::Scalar );
-          Corrector.ApplyToRun( Vector.data(), Count, Step, CoreVideoUtils::BestInstructionSet() );
-          ASSERT_EQ( Vector, Scalar ) << "gamma " << Gamma << " saturation " << Saturation << " step " << Step;
+          for( EInstructionSet Set : { EInstructionSet::SSE2, EInstructionSet::AVX2, EInstructionSet::AVX512 } )
+          {
+            if( !CoreVideoUtils::IsSupported( Set ) )
+              continue;
+            Bytes Vector = Pixels;
+            Corrector.ApplyToRun( Vector.data(), Count, Step, Set );
+            ASSERT_EQ( Vector, Scalar ) << CoreVideoUtils::ToString( Set ) << " gamma " << Gamma << " saturation "
+                                        << Saturation << " step " << Step;
+          }
         }
   }
 } // namespace
