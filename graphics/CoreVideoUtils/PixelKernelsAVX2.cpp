@@ -138,6 +138,71 @@ namespace CoreVideoUtils
       }
     } // namespace
 
+    namespace
+    {
+      // A 256-entry byte table with 16-entry shuffles: for bytes below 128, shuffle k looks up
+      // x - 16k, which is a valid index for the 16 entries of row k and has its top bit set
+      // (giving 0) for every row above x's own; the rows are stored as differences of
+      // consecutive rows, so the XOR of the rows up to x's own is x's entry. Bytes from 128 up
+      // take the same path on x - 128 with the upper rows, and a blend on the top bit picks.
+      struct VShuffleTable
+      {
+        __m256i Rows[2][8];
+        explicit VShuffleTable( const std::uint8_t* i_pTable )
+        {
+          for( int Half = 0; Half < 2; ++Half )
+            for( int k = 0; k < 8; ++k )
+            {
+              alignas( 16 ) std::uint8_t Row[16];
+              for( int l = 0; l < 16; ++l )
+              {
+                const int Index = 128 * Half + 16 * k + l;
+                Row[l] = static_cast< std::uint8_t >( i_pTable[Index] ^ ( k > 0 ? i_pTable[Index - 16] : 0 ) );
+              }
+              Rows[Half][k] =
+                  _mm256_broadcastsi128_si256( _mm_load_si128( reinterpret_cast< const __m128i* >( Row ) ) );
+            }
+        }
+
+        __m256i LookUp( __m256i x ) const
+        {
+          __m256i Result[2];
+          for( int Half = 0; Half < 2; ++Half )
+          {
+            __m256i Index = Half == 0 ? x : _mm256_xor_si256( x, _mm256_set1_epi8( -128 ) );
+            __m256i Value = _mm256_shuffle_epi8( Rows[Half][0], Index );
+            for( int k = 1; k < 8; ++k )
+            {
+              Index = _mm256_sub_epi8( Index, _mm256_set1_epi8( 16 ) );
+              Value = _mm256_xor_si256( Value, _mm256_shuffle_epi8( Rows[Half][k], Index ) );
+            }
+            Result[Half] = Value;
+          }
+          return _mm256_blendv_epi8( Result[0], Result[1], x );
+        }
+      };
+
+      // The table on the first three bytes of i_Count pixels of i_Step bytes.
+      void LookUpBytes( std::uint8_t* io_pData, std::uint64_t i_Count, unsigned i_Step, const std::uint8_t* i_pTable )
+      {
+        const VShuffleTable Table( i_pTable );
+        const std::uint64_t Bytes = i_Count * i_Step;
+        const __m256i FourthBytes = _mm256_set1_epi32( static_cast< int >( 0xFF000000u ) );
+        std::uint64_t b = 0;
+        for( ; b + 32 <= Bytes; b += 32 )
+        {
+          const __m256i Input = _mm256_loadu_si256( reinterpret_cast< const __m256i* >( io_pData + b ) );
+          __m256i Output = Table.LookUp( Input );
+          if( i_Step == 4 )
+            Output = _mm256_blendv_epi8( Output, Input, FourthBytes );
+          _mm256_storeu_si256( reinterpret_cast< __m256i* >( io_pData + b ), Output );
+        }
+        for( ; b < Bytes; ++b )
+          if( i_Step == 3 || b % 4 != 3 )
+            io_pData[b] = i_pTable[io_pData[b]];
+      }
+    } // namespace
+
     std::uint32_t DemosaicRowInteriorAVX2( const std::uint8_t* i_pNorth, const std::uint8_t* i_pRow,
                                            const std::uint8_t* i_pSouth, std::uint32_t i_Width, unsigned i_StartKind,
                                            bool i_bSwapRB, std::uint8_t* o_pRGB )
@@ -211,18 +276,9 @@ namespace CoreVideoUtils
       if( i_Step == 3 && Blocks > 0 && Blocks * 8 * 3 + 4 > i_PixelCount * 3 )
         --Blocks;
       const std::uint64_t Count = i_SaturationDelta == 0.0f ? i_PixelCount : Blocks * 8;
-      // The gamma table first, over all the pixels this form takes on: a lookup a byte is
-      // cheaper than any vector substitute for a 256-entry table.
+      // The gamma table first, over all the pixels this form takes on.
       if( i_pTable != nullptr )
-      {
-        std::uint8_t* p = io_pData;
-        if( i_Step == 3 )
-          for( std::uint64_t b = 0; b < 3 * Count; ++b )
-            p[b] = i_pTable[p[b]];
-        else
-          for( std::uint64_t i = 0; i < Count; ++i, p += 4 )
-            p[0] = i_pTable[p[0]], p[1] = i_pTable[p[1]], p[2] = i_pTable[p[2]];
-      }
+        LookUpBytes( io_pData, Count, i_Step, i_pTable );
       if( i_SaturationDelta == 0.0f )
         return Count;
 
