@@ -90,8 +90,18 @@ namespace ZOL
         o_rBuffer.reset();
         return;
       }
-      // Throws std::bad_weak_ptr for an allocator that is not owned by a shared pointer.
-      auto pSelf = this->shared_from_this();
+      // Throws std::bad_weak_ptr for an allocator that is not owned by a shared pointer; the
+      // buffer goes back first, or it would be lost to the recycler for good.
+      std::shared_ptr< IStandardBufferAllocator > pSelf;
+      try
+      {
+        pSelf = this->shared_from_this();
+      }
+      catch( const std::bad_weak_ptr& )
+      {
+        Recycler.Release( pBuffer );
+        throw;
+      }
       // The control block comes from a pool too: with it, a recycled frame costs no allocation.
       std::shared_ptr< IStandardBuffer > pShared(
           pBuffer, [ pSelf ]( IStandardBuffer* i_pBuffer ) { pSelf->Recycler.Release( i_pBuffer ); },

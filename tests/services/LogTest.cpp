@@ -119,11 +119,3 @@ INSTANTIATE_TEST_SUITE_P( Formats, LogBadFormatTest,
                           []( const testing::TestParamInfo< VBadFormatCase >& i_rInfo )
                           { return std::string( i_rInfo.param.Name ); } );
 
-TEST( Log, CategoriesAreSharedByName )
-{
-  const ZOL::ILogCategory& rFirst = ZOL::GlobalLog().GetCategory( "H264IO" );
-  const ZOL::ILogCategory& rSecond = ZOL::GlobalLog().GetCategory( "H264IO" );
-  EXPECT_EQ( &rFirst, &rSecond );
-  EXPECT_EQ( "H264IO", rFirst.GetName() );
-  EXPECT_NE( &rFirst, &ZOL::GlobalLog().GetCategory( "H264Utils" ) );
-}

@@ -549,16 +549,3 @@ TEST( AttributeStore, SetReplacesTypeAndRemoveReportsPresence )
   EXPECT_FALSE( Store.GetType( "K", Type ) );
 }
 
-TEST( AttributeStore, MergeReplacesEqualKeysAndKeepsTheRest )
-{
-  IVideoAttributes Base, Extra;
-  Base.Set( "A", 1 );
-  Base.Set( "B", 2 );
-  Extra.Set( "B", "two" );
-  Extra.Set( "C", 3.0 );
-  Base.Merge( Extra );
-  EXPECT_EQ( 3u, Base.Size() );
-  EXPECT_TRUE( Base.ContainsAllOf( Extra ) );
-  std::int32_t A = 0;
-  EXPECT_TRUE( Base.Get( "A", A ) );
-}

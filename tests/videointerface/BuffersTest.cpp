@@ -242,16 +242,3 @@ TEST( BufferAllocator, ImpossibleSizeGivesAnEmptyPointerAndALogLine )
   ASSERT_TRUE( pBuffer );
   EXPECT_EQ( 16u, pBuffer->GetSize() );
 }
-
-namespace
-{
-  const std::uint8_t s_StartCode[4] = { 0, 0, 0, 1 };
-}
-
-TEST( TrivialBuffer, WrapsStaticBytesWithoutACopy )
-{
-  VTrivialBuffer< s_StartCode, 4 > StartCode;
-  const IBufferConst& rBuffer = StartCode;
-  EXPECT_EQ( s_StartCode, rBuffer.GetData() );
-  EXPECT_EQ( 4u, rBuffer.GetSize() );
-}

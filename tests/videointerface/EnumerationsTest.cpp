@@ -177,14 +177,6 @@ INSTANTIATE_TEST_SUITE_P(
                      VResultCase{ "TopBitAlone", 0x7FFFFFFFu, "Unknown result code" } ),
     []( const testing::TestParamInfo< VResultCase >& i_rInfo ) { return std::string( i_rInfo.param.Name ); } );
 
-TEST( ResultText, SuccessIsTheTopBitClear )
-{
-  EXPECT_TRUE( Succeeded( Result_Ok ) );
-  EXPECT_TRUE( Succeeded( 0x40003u ) );
-  EXPECT_FALSE( Succeeded( Result_Failed ) );
-  EXPECT_FALSE( Succeeded( Result_FileNotFound ) );
-}
-
 // ---------------------------------------------------------------------------------------------
 // What the enumerations drive: frame sizes and the container chosen by a file name.
 
