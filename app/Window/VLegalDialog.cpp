@@ -73,7 +73,7 @@ namespace LumekVideoViewer
   {
     setWindowFlags( windowFlags() & ~Qt::WindowContextHelpButtonHint );
     setWindowTitle( "Third-Party Licenses" );
-    resize( 820, 600 );
+    resize( 900, 620 );
 
     QVariantList Components;
     for( const VLegalComponent& rComponent : LegalComponents() )

@@ -71,7 +71,7 @@ namespace LumekVideoViewer
 
     m_pPropertiesDialog = new VPropertiesDialog( this );
     m_pVideoSettingsDialog = new VVideoSettingsDialog( this );
-    m_pVideoSettingsDialog->setEnabled( false );
+    m_pVideoSettingsDialog->SetControlsEnabled( false );
 
     BuildLayout();
     m_pPlayBackManager = std::make_unique< VPlayBackManager >( &m_VideoSource );
@@ -227,7 +227,7 @@ namespace LumekVideoViewer
     if( !m_VideoSource.Open( i_Path.toStdString() ) )
     {
       QMessageBox::critical( this, "Invalid file", "The video file could not be opened.", QMessageBox::Ok );
-      m_pVideoSettingsDialog->setEnabled( false );
+      m_pVideoSettingsDialog->SetControlsEnabled( false );
       UpdateControls();
       return false;
     }
@@ -251,7 +251,7 @@ namespace LumekVideoViewer
     m_pVideoSettingsDialog->SetFileVideoSettings( rSettings );
     m_pVideoSettingsDialog->SetVideoSettings( rSettings );
     m_pGLWidget->SetVideoSettings( rSettings );
-    m_pVideoSettingsDialog->setEnabled(
+    m_pVideoSettingsDialog->SetControlsEnabled(
         HasDisplaySettings( m_VideoSource.GetVideoPayload(), m_VideoSource.GetVideoFrameInfo().PixelFormat ) );
 
     m_pGLWidget->SetLensDistortionCalibration( m_VideoSource.GetCameraHardware(),
@@ -300,7 +300,7 @@ namespace LumekVideoViewer
     setWindowTitle( WindowTitle( QString() ) );
     m_pPropertiesDialog->Clear();
     UpdateControls();
-    m_pVideoSettingsDialog->setEnabled( false );
+    m_pVideoSettingsDialog->SetControlsEnabled( false );
   }
 
   void VVideoWindow::PlayPause()

@@ -16,8 +16,8 @@ Rectangle {
     property int current: 0
 
     color: Theme["Window"]
-    implicitWidth: 820
-    implicitHeight: 600
+    implicitWidth: 900
+    implicitHeight: 620
 
     ColumnLayout {
         anchors.fill: parent

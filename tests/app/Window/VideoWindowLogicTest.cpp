@@ -166,16 +166,6 @@ TEST( WindowTexts, TitleNamesTheFileOnly )
   EXPECT_EQ( WindowTitle( QString() ), "Lumek Video Viewer" );
 }
 
-TEST( WindowTexts, AboutAndHelpOfThisRelease )
-{
-  const ZOL::IApplicationVersion& rVersion = ApplicationVersion();
-  EXPECT_EQ( AboutVersionLine( rVersion ), "Lumek Video Viewer 1.10.0.137509h  x64" );
-  EXPECT_TRUE( AboutRevisionLine( rVersion ).startsWith( "137509:" ) );
-  EXPECT_TRUE( HelpUrl( rVersion ).toString().endsWith( "/display/LVV110/" ) )
-      << HelpUrl( rVersion ).toString().toStdString();
-  EXPECT_TRUE( HelpUrl( rVersion ).isValid() );
-}
-
 TEST( Timebar, TickIntervalGuardsAnEmptyFile )
 {
   EXPECT_EQ( TimebarTickInterval( 700, 1 ), 700 );

@@ -51,7 +51,7 @@ namespace
       EXPECT_FALSE( SpinBox()->isEnabled() );
       EXPECT_FALSE( PlayButton()->isEnabled() );
       EXPECT_FALSE( Action( EAction::Play )->isEnabled() );
-      EXPECT_FALSE( m_pWindow->GetVideoSettingsDialog()->isEnabled() );
+      EXPECT_FALSE( m_pWindow->GetVideoSettingsDialog()->GetRevertButton()->isEnabled() );
       EXPECT_EQ( m_pWindow->GetPropertiesDialog()->GetTable()->rowCount(), 0 );
     }
 
@@ -103,7 +103,7 @@ TEST_F( VideoWindow, OpenShowsTheFirstFrameAndDescribesTheFile )
   EXPECT_EQ( Action( EAction::Play )->text(), "Pause" );
   EXPECT_FALSE( Action( EAction::NextFrame )->isEnabled() );
   EXPECT_TRUE( m_pWindow->GetVideoSettingsDialog()->isHidden() );
-  EXPECT_FALSE( m_pWindow->GetVideoSettingsDialog()->isEnabled() );
+  EXPECT_FALSE( m_pWindow->GetVideoSettingsDialog()->GetRevertButton()->isEnabled() );
 
   QTableWidget* pTable = m_pWindow->GetPropertiesDialog()->GetTable();
   EXPECT_GT( pTable->rowCount(), 0 );
@@ -306,14 +306,14 @@ TEST_F( VideoWindow, DroppingOpensTheFirstLocalFileOnly )
 TEST_F( VideoWindow, DisplaySettingsChangeABayerPictureLive )
 {
   ASSERT_TRUE( Open( Recording( "grey.lvid" ) ) );
-  EXPECT_FALSE( m_pWindow->GetVideoSettingsDialog()->isEnabled() );
+  EXPECT_FALSE( m_pWindow->GetVideoSettingsDialog()->GetRevertButton()->isEnabled() );
 
   VRecordingSpec Spec;
   Spec.Format = ZOL::PixelFormat_BayerGB8;
   ASSERT_TRUE( Open( Recording( "bayer.lvid", Spec ) ) );
   Pause();
   VVideoSettingsDialog* pDialog = m_pWindow->GetVideoSettingsDialog();
-  EXPECT_TRUE( pDialog->isEnabled() );
+  EXPECT_TRUE( pDialog->GetRevertButton()->isEnabled() );
   Action( EAction::DisplaySettings )->trigger();
   EXPECT_TRUE( pDialog->isVisible() );
 

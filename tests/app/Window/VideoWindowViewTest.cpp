@@ -9,6 +9,7 @@
 #include <QDesktopServices>
 #include <QGroupBox>
 #include <QMenuBar>
+#include <QMouseEvent>
 #include <QQuickItem>
 #include <QQuickWidget>
 
@@ -70,7 +71,15 @@ TEST_F( WindowView, FullScreenKeysAndTheStoredMismatch )
   EXPECT_TRUE( pFull->isChecked() );
   EXPECT_TRUE( IsFull() );
 
-  // The button toggles the same action.
+  // A double click on the picture toggles the same action.
+  QWidget* pSurface = m_pWindow->GetGLWidget();
+  QMouseEvent Double( QEvent::MouseButtonDblClick, QPointF( 20, 20 ), Qt::LeftButton, Qt::LeftButton, Qt::NoModifier );
+  QApplication::sendEvent( pSurface, &Double );
+  EXPECT_FALSE( IsFull() );
+  QApplication::sendEvent( pSurface, &Double );
+  EXPECT_TRUE( IsFull() );
+
+  // So does the button.
   Child< QWidget >( "FullScreen" )->setEnabled( true );
   QTest::mouseClick( Child< QWidget >( "FullScreen" ), Qt::LeftButton );
   EXPECT_FALSE( IsFull() );
@@ -127,6 +136,17 @@ TEST_F( WindowView, ScaleModesFollowTheMenuAndFullScreenLeavesTheFixedSize )
     EXPECT_TRUE( Action( rMode.first )->isChecked() );
     EXPECT_NE( m_pWindow->minimumSize(), m_pWindow->maximumSize() );
   }
+
+  // Dragging the picture frees the scale, and the menu follows.
+  QMouseEvent Press( QEvent::MouseButtonPress, QPointF( 100, 100 ), Qt::LeftButton, Qt::LeftButton, Qt::NoModifier );
+  QMouseEvent Move( QEvent::MouseMove, QPointF( 140, 110 ), Qt::NoButton, Qt::LeftButton, Qt::NoModifier );
+  QMouseEvent Release( QEvent::MouseButtonRelease, QPointF( 140, 110 ), Qt::LeftButton, Qt::NoButton, Qt::NoModifier );
+  QApplication::sendEvent( pSurface, &Press );
+  QApplication::sendEvent( pSurface, &Move );
+  QApplication::sendEvent( pSurface, &Release );
+  EXPECT_EQ( pSurface->GetScaleMode(), ScaleFreely );
+  EXPECT_TRUE( Action( EAction::ScaleFreely )->isChecked() );
+  EXPECT_FALSE( Action( EAction::ScaleToWindow )->isChecked() );
 
   Action( EAction::ScaleWindowToVideo )->trigger();
   EXPECT_EQ( pSurface->GetScaleMode(), ScaleWindowToVideo );
