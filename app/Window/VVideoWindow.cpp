@@ -210,10 +210,10 @@ namespace LumekVideoViewer
     connect( pManager, &VPlayBackManager::FrameUpdated, this, &VVideoWindow::PrepareFrame );
     connect( m_pFrameSpinBox, QOverload< int >::of( &QSpinBox::valueChanged ), pManager, &VPlayBackManager::PlayFrame );
     connect( m_pFrameSpinBox, QOverload< int >::of( &QSpinBox::valueChanged ), m_pTimebar, &VLabelSlider::setValue );
-    connect( m_pTimebar, &QSlider::sliderMoved, m_pTimebar, [this]( int ) { m_pTimebar->repaint(); } );
+    connect( m_pTimebar, &QSlider::sliderMoved, m_pTimebar, [pTimebar = m_pTimebar]( int ) { pTimebar->repaint(); } );
     connect( m_pTimebar, &QSlider::valueChanged, m_pFrameSpinBox, &VClickSpinBox::setValue );
     connect( m_pVideoSettingsDialog, &VVideoSettingsDialog::VideoSettingsChanged, m_pGLWidget,
-             [this]( const ZOL::IVideoSettings& i_rSettings ) { m_pGLWidget->SetVideoSettings( i_rSettings ); } );
+             &VGLWidget::SetVideoSettings );
   }
 
   int VVideoWindow::CurrentFrame() const
@@ -406,10 +406,18 @@ namespace LumekVideoViewer
     const ZOL::IBuffer* pBlock = AudioBlockToWrite( i_rFrame );
     if( pBlock == nullptr )
       return;
+    const char* pData = reinterpret_cast< const char* >( pBlock->GetData() );
+    const qint64 Size = static_cast< qint64 >( pBlock->GetSize() );
+    // Push-mode devices of most back ends are sequential: there the block simply joins the queue,
+    // and asking them to seek would only fill the log with warnings.
+    if( m_pAudioDevice->isSequential() )
+    {
+      m_pAudioDevice->write( pData, Size );
+      return;
+    }
     const qint64 Position = m_pAudioDevice->pos();
     m_pAudioDevice->seek( m_pAudioDevice->size() );
-    m_pAudioDevice->write( reinterpret_cast< const char* >( pBlock->GetData() ),
-                           static_cast< qint64 >( pBlock->GetSize() ) );
+    m_pAudioDevice->write( pData, Size );
     m_pAudioDevice->seek( Position );
   }
 

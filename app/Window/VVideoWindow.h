@@ -59,7 +59,8 @@ namespace LumekVideoViewer
     VPropertiesDialog* GetPropertiesDialog() const { return m_pPropertiesDialog; }
     VVideoSettingsDialog* GetVideoSettingsDialog() const { return m_pVideoSettingsDialog; }
     bool GetLensCorrectionWanted() const { return m_bLensCorrectionWanted; }
-    // Index of the frame the surface was last given, and whether it is the one asked for.
+    // The frame whose picture the surface was last given: the one asked for, or the nearest
+    // earlier one that exists; -1 when there was none.
     int GetShownFrameIndex() const { return m_ShownFrameIndex; }
 
   public slots:
