@@ -85,7 +85,13 @@ namespace ZOL
         if( pSeekable->GetSize( Size ) && pSeekable->GetPosition( Position ) )
         {
           if( Position > Size || i_Length > Size - Position )
+          {
+            // Leave the stream as a short read would: at its end and, for a file, failed.
+            std::uint8_t Byte = 0;
+            pSeekable->Seek( static_cast< std::int64_t >( Size ) );
+            i_rStream.Read( &Byte, 1 );
             return false;
+          }
           o_rText.resize( i_Length );
           return i_rStream.Read( &o_rText[0], i_Length );
         }

@@ -1,4 +1,5 @@
 #include "utils/UtilsIO/VLargeFile.h"
+#include "videointerface/IVideoAttributes.h"
 
 #include <gtest/gtest.h>
 
@@ -154,6 +155,29 @@ TEST_F( LargeFileTest, CachedSizeIsTheSizeAtOpen )
   std::uint64_t Position = 0;
   EXPECT_TRUE( File.GetPosition( Position ) );
   EXPECT_EQ( 1u, Position ) << "GetSize leaves the position";
+}
+
+TEST_F( LargeFileTest, AttributeStoreThroughAFile )
+{
+  const std::string Path = m_Scratch.File( "store.bin" );
+  ZOL::IVideoAttributes Store;
+  Store.Set( "VideoFrameInfo.PixelFormat", "BayerGB8" );
+  Store.Set( "TicksPerSecond", 135000000u );
+  {
+    VLargeFile File;
+    ASSERT_TRUE( File.Open( Path, UtilsIO::OpenMode_Create ) );
+    ASSERT_TRUE( Store.WriteTo( File ) );
+    // A second store whose only key claims 4 GB of a file that holds 3 bytes more.
+    ASSERT_TRUE( ZOL::WriteLE( File, 1u ) && ZOL::WriteLE( File, 0xFFFFFFF0u ) && File.Write( "abc", 3 ) );
+  }
+  VLargeFile File;
+  ASSERT_TRUE( File.Open( Path, UtilsIO::OpenMode_Read ) );
+  ZOL::IVideoAttributes Read;
+  ASSERT_TRUE( Read.ReadFrom( File ) );
+  EXPECT_TRUE( Read == Store );
+  EXPECT_FALSE( Read.ReadFrom( File ) );
+  EXPECT_FALSE( File.IsGood() ) << "the lie fails the stream as a short read would";
+  EXPECT_TRUE( File.IsAtEnd() );
 }
 
 TEST_F( LargeFileTest, OpenTwiceKeepsTheFirstFile )
