@@ -88,7 +88,8 @@ namespace ZOL
     int m_ButtonHeight;
     // The height of toolbar buttons.
     int m_ToolHeight;
-    // The height of toolbar buttons.
+    // The width of scroll bars (the shared layer's description still calls it "The height of toolbar
+    // buttons.", and is left so).
     int m_ScrollBarWidth;
     QString m_DefaultFont;
     // The point size of the application font used for most text.
