@@ -21,5 +21,7 @@ ctest_args=(--test-dir "${BUILD_DIR:-build}" --output-on-failure -j "$(nproc)")
 if [ -n "${DISPLAY:-}" ]; then
   ctest "${ctest_args[@]}"
 else
-  xvfb-run -a -s "-screen 0 1920x1080x24 -nolisten tcp" ctest "${ctest_args[@]}"
+  # -noreset: the server must outlive each test's last window, or the next test that starts
+  # while it resets cannot connect.
+  xvfb-run -a -s "-screen 0 1920x1080x24 -nolisten tcp -noreset" ctest "${ctest_args[@]}"
 fi
