@@ -15,6 +15,7 @@
 #include <QOpenGLExtraFunctions>
 #include <QOpenGLFramebufferObject>
 #include <QOpenGLShaderProgram>
+#include <QOpenGLTexture>
 #include <QTemporaryDir>
 
 #include <memory>
@@ -255,6 +256,38 @@ namespace
     EXPECT_TRUE( Vertices.Write( 48, Bytes, 16 ) );
     EXPECT_FALSE( Vertices.Write( 49, Bytes, 16 ) );
     EXPECT_FALSE( Vertices.Write( 80, Bytes, 1 ) );
+  }
+
+  // Rows of any length arrive tightly packed, and whatever alignment was set before stays set.
+  TEST_F( ShaderResourcesTest, UploadReadsTightRowsAndRestoresTheUnpackAlignment )
+  {
+    CoreGraphics::VRenderContext Context;
+    Context.Initialise();
+    QOpenGLExtraFunctions& rGL = *Context.Functions();
+    QOpenGLTexture Texture( QOpenGLTexture::Target2D );
+    Texture.setSize( 3, 2 );
+    Texture.setFormat( QOpenGLTexture::R8_UNorm );
+    Texture.setMipLevels( 1 );
+    Texture.allocateStorage();
+    Context.BindTexture( 0, &Texture );
+
+    const std::uint8_t Pixels[] = { 1, 2, 3, 4, 5, 6 };
+    rGL.glPixelStorei( GL_UNPACK_ALIGNMENT, 8 );
+    EXPECT_TRUE( Context.UploadTexture( QSize( 3, 2 ), Pixels, GL_R8 ) );
+    GLint Alignment = 0;
+    rGL.glGetIntegerv( GL_UNPACK_ALIGNMENT, &Alignment );
+    EXPECT_EQ( Alignment, 8 );
+    EXPECT_FALSE( Context.UploadTexture( QSize( 3, 2 ), Pixels, GL_DEPTH_COMPONENT16 ) ) << "no client format";
+
+    QOpenGLFramebufferObject Framebuffer( 3, 2 );
+    rGL.glBindFramebuffer( GL_FRAMEBUFFER, Framebuffer.handle() );
+    rGL.glFramebufferTexture2D( GL_FRAMEBUFFER, GL_COLOR_ATTACHMENT0, GL_TEXTURE_2D, Texture.textureId(), 0 );
+    std::uint8_t Read[2 * 3 * 4] = {};
+    rGL.glPixelStorei( GL_PACK_ALIGNMENT, 1 );
+    Context.ReadPixels( QRect( 0, 0, 3, 2 ), GL_RGBA, GL_UNSIGNED_BYTE, Read );
+    for( int i = 0; i < 6; ++i )
+      EXPECT_EQ( Read[i * 4], Pixels[i] ) << "pixel " << i;
+    Context.UnbindFramebuffer();
   }
 
   // Draws a quad of the position-only layout through (Simple3D, UniformColour) into a framebuffer
