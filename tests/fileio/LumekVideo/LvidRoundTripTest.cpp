@@ -271,20 +271,6 @@ namespace
     ExpectSameBytes( *pVideo, SmallPlan().Records[2].Video, "frame 5" );
   }
 
-  TEST( LvidWriter, FrameWrittenTwiceReadsAsTheLaterOne )
-  {
-    const VBytes First = PatternBytes( 15, 1 );
-    const VBytes Second = PatternBytes( 15, 2 );
-    const VBytes Written = WriteToMemory( s_SmallVideo, ZOL::IAudioFrameInfo(),
-                                          { { 4, First, {} }, { 1, First, {} }, { 4, Second, {} } }, 16 );
-    VMemoryRecording Recording( Written );
-    ASSERT_TRUE( Recording.bOpened );
-    std::shared_ptr< ZOL::IBuffer > pVideo;
-    ZOL::IAudioBuffers Audio;
-    ASSERT_TRUE( Recording.Reader.ReadFrameData( 4, pVideo, Audio, true, true ) );
-    ExpectSameBytes( *pVideo, Second, "frame 4" );
-  }
-
   TEST( LvidReader, AudioIsCutToWholeSampleGroups )
   {
     // Ten bytes of 16-bit stereo are two whole groups and half of one: eight bytes are read, and
@@ -307,31 +293,53 @@ namespace
     ExpectSameBytes( *Audio.at( 0 ), *Plan.Records[2].Audio, "frame 2" );
   }
 
-  TEST( LvidReader, NeitherHalfRequestedTouchesNothing )
+  struct VHalvesCase
   {
-    VMemoryRecording Recording( Assemble( SmallPlan() ).Bytes );
+    const char* Name;
+    bool bReadVideo;
+    bool bReadAudio;
+  };
+
+  void PrintTo( const VHalvesCase& i_rCase, std::ostream* o_pStream )
+  {
+    *o_pStream << i_rCase.Name;
+  }
+
+  class LvidRequestedHalves : public testing::TestWithParam< VHalvesCase >
+  {
+  };
+
+  // Only the halves asked for change; the others keep what the caller had in them.
+  TEST_P( LvidRequestedHalves, OnlyTheRequestedHalvesChange )
+  {
+    const VHalvesCase& rCase = GetParam();
+    const VRecordingPlan Plan = SmallPlan();
+    VMemoryRecording Recording( Assemble( Plan ).Bytes );
     ASSERT_TRUE( Recording.bOpened );
     auto pKept = std::make_shared< ZOL::IStandardBuffer >();
     std::shared_ptr< ZOL::IBuffer > pVideo = pKept;
-    ZOL::IAudioBuffers Audio{ pKept };
-    EXPECT_TRUE( Recording.Reader.ReadFrameData( 1, pVideo, Audio, false, false ) );
-    EXPECT_EQ( pVideo, pKept );
-    EXPECT_EQ( Audio, ZOL::IAudioBuffers{ pKept } );
-    EXPECT_FALSE( Recording.Reader.ReadFrameData( 7, pVideo, Audio, false, false ) );
-    EXPECT_FALSE( Recording.Reader.ReadFrameData( 7, pVideo, Audio, true, true ) );
-    EXPECT_EQ( pVideo, pKept );
+    ZOL::IAudioBuffers Audio{ pKept, pKept };
+    ASSERT_TRUE( Recording.Reader.ReadFrameData( 2, pVideo, Audio, rCase.bReadVideo, rCase.bReadAudio ) );
+    if( rCase.bReadVideo )
+      ExpectSameBytes( *pVideo, Plan.Records[2].Video, "video" );
+    else
+      EXPECT_EQ( pVideo, pKept );
+    if( rCase.bReadAudio )
+    {
+      ASSERT_EQ( Audio.size(), 1u );
+      ExpectSameBytes( *Audio[0], *Plan.Records[2].Audio, "audio" );
+    }
+    else
+      EXPECT_EQ( Audio, ( ZOL::IAudioBuffers{ pKept, pKept } ) );
+    // A frame that is not there changes nothing, whatever is asked for.
+    EXPECT_FALSE( Recording.Reader.ReadFrameData( 7, pVideo, Audio, rCase.bReadVideo, rCase.bReadAudio ) );
   }
 
-  TEST( LvidReader, AudioAloneSkipsTheVideo )
-  {
-    VMemoryRecording Recording( Assemble( SmallPlan() ).Bytes );
-    ASSERT_TRUE( Recording.bOpened );
-    std::shared_ptr< ZOL::IBuffer > pVideo;
-    ZOL::IAudioBuffers Audio;
-    ASSERT_TRUE( Recording.Reader.ReadFrameData( 2, pVideo, Audio, false, true ) );
-    EXPECT_FALSE( pVideo );
-    ExpectSameBytes( *Audio.at( 0 ), *SmallPlan().Records[2].Audio, "frame 2" );
-  }
+  INSTANTIATE_TEST_SUITE_P( Requests, LvidRequestedHalves,
+                            testing::Values( VHalvesCase{ "Both", true, true }, VHalvesCase{ "VideoOnly", true, false },
+                                             VHalvesCase{ "AudioOnly", false, true },
+                                             VHalvesCase{ "Neither", false, false } ),
+                            []( const testing::TestParamInfo< VHalvesCase >& i_rInfo ) { return i_rInfo.param.Name; } );
 
   TEST( LvidReader, ReadFrameWithoutVideoKeepsTheRecordsVideo )
   {
@@ -488,32 +496,5 @@ namespace
     ASSERT_TRUE( Reader.ReadFrameData( 3, pVideo, Audio, true, true ) );
     ExpectSameBytes( *pVideo, Frame, "frame 3" );
     EXPECT_TRUE( Audio.empty() );
-  }
-
-  TEST( LvidReader, EmptyIndexOpensWithoutFrames )
-  {
-    VRecordingPlan Plan = SmallPlan();
-    Plan.Records.clear();
-    VMemoryRecording Recording( Assemble( Plan ).Bytes );
-    ASSERT_TRUE( Recording.bOpened );
-    EXPECT_EQ( Recording.Reader.GetFrameCount(), 0u );
-    EXPECT_FALSE( Recording.Reader.HasFrame( 0 ) );
-  }
-
-  TEST( LvidReaderCapabilities, AnswersForRawFramesOnly )
-  {
-    LumekVideo::VReader Reader;
-    const ZOL::IVideoReaderCapabilities& rCapabilities = Reader.GetCapabilities();
-    for( std::uint32_t Format = 0; Format < ZOL::PixelFormatCount; ++Format )
-      EXPECT_TRUE( rCapabilities.SupportsPixelFormat( static_cast< ZOL::EPixelFormat >( Format ) ) );
-    for( std::uint32_t Format = 0; Format <= ZOL::AudioSampleFormat_UInt32; ++Format )
-      EXPECT_TRUE( rCapabilities.SupportsAudioSampleFormat( static_cast< ZOL::EAudioSampleFormat >( Format ) ) );
-    EXPECT_TRUE( rCapabilities.SupportsVideoPayload( ZOL::VideoPayload_Uncompressed ) );
-    for( auto Payload : { ZOL::VideoPayload_None, ZOL::VideoPayload_ImageJPEG, ZOL::VideoPayload_ImagePNG,
-                          ZOL::VideoPayload_ImageTIFF, ZOL::VideoPayload_VideoH264 } )
-      EXPECT_FALSE( rCapabilities.SupportsVideoPayload( Payload ) );
-    EXPECT_TRUE( rCapabilities.SupportsAudioPayload( ZOL::AudioPayload_None ) );
-    EXPECT_TRUE( rCapabilities.SupportsAudioPayload( ZOL::AudioPayload_Uncompressed ) );
-    EXPECT_FALSE( rCapabilities.SupportsAudioPayload( ZOL::AudioPayload_LosslessFLAC ) );
   }
 } // namespace
