@@ -265,6 +265,11 @@ namespace
     EXPECT_TRUE( Recording.Reader.HasFrame( 0 ) );
     EXPECT_FALSE( Recording.Reader.HasFrame( 3 ) );
     EXPECT_EQ( Recording.Reader.GetFrameIndex().at( 5 ), File.RecordOffsets[2] );
+    // The gaps answered from the index alone, as the viewer's fallback to an earlier frame asks.
+    EXPECT_EQ( Recording.Reader.GetStoredFrameCount(), 2u );
+    EXPECT_EQ( Recording.Reader.FindStoredFrameAtOrBefore( 4 ), std::optional< std::uint64_t >( 0 ) );
+    EXPECT_EQ( Recording.Reader.FindStoredFrameAtOrAfter( 1 ), std::optional< std::uint64_t >( 5 ) );
+    EXPECT_EQ( Recording.Reader.FindStoredFrameAtOrAfter( 6 ), std::nullopt );
     std::shared_ptr< ZOL::IBuffer > pVideo;
     ZOL::IAudioBuffers Audio;
     ASSERT_TRUE( Recording.Reader.ReadFrameData( 5, pVideo, Audio, true, true ) );
