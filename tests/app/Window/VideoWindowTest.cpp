@@ -156,6 +156,21 @@ TEST_F( VideoWindow, PlaybackLoopsAndWithoutLoopingStopsOnTheLastPicture )
   EXPECT_TRUE( Action( EAction::NextFrame )->isEnabled() );
 }
 
+TEST_F( VideoWindow, ASingleFrameRecordingPlaysToItsEnd )
+{
+  VRecordingSpec Spec;
+  Spec.Frames = 1;
+  ASSERT_TRUE( Open( Recording( "still.lvid", Spec ) ) );
+  EXPECT_EQ( Timebar()->maximum(), 0 );
+  EXPECT_NEAR( Timebar()->tickInterval(), Timebar()->width(), 3 );
+  EXPECT_EQ( SpinBox()->maximum(), 0 );
+
+  // The clock runs past the only frame; the picture stays on it.
+  Action( EAction::Looping )->setChecked( false );
+  ASSERT_TRUE( WaitFor( [this] { return !Manager().IsPlaying(); } ) );
+  EXPECT_EQ( FrameForLevel( ShownLevel() ), 0 );
+}
+
 TEST_F( VideoWindow, StopShowsFrameZeroAndPlayGoesOnFromThere )
 {
   ASSERT_TRUE( Open( Recording( "stop.lvid" ) ) );
