@@ -5,65 +5,44 @@
 #include <algorithm>
 #include <limits>
 #include <sstream>
+#include <tuple>
 #include <type_traits>
+#include <utility>
 
 namespace ZOL
 {
   namespace
   {
-    template < typename T > struct VTypeTag;
-    template <> struct VTypeTag< bool >
+    // The value types in the order of their tags: the tag of a type is its place here.
+    using VValueTypes = std::tuple< bool, std::int8_t, std::int16_t, std::int32_t, std::int64_t, std::uint8_t,
+                                    std::uint16_t, std::uint32_t, std::uint64_t, float, double, std::string >;
+    static_assert( std::tuple_size_v< VValueTypes > == ValueTypeLast + 1, "one type a tag" );
+
+    template < typename T, std::size_t Index = 0 > constexpr std::uint32_t TypeTag()
     {
-      static constexpr std::uint32_t Value = ValueType_Bool;
-    };
-    template <> struct VTypeTag< std::int8_t >
+      if constexpr( std::is_same_v< T, std::tuple_element_t< Index, VValueTypes > > )
+        return static_cast< std::uint32_t >( Index );
+      else
+        return TypeTag< T, Index + 1 >();
+    }
+
+    // Calls the visitor with a default value of the type a tag names; false for an unknown tag.
+    template < typename Visitor, std::size_t... Index >
+    bool VisitTypes( std::uint32_t i_Type, Visitor&& i_rVisitor, std::index_sequence< Index... > )
     {
-      static constexpr std::uint32_t Value = ValueType_Int8;
-    };
-    template <> struct VTypeTag< std::int16_t >
+      bool bResult = false;
+      ( ( i_Type == Index && ( bResult = i_rVisitor( std::tuple_element_t< Index, VValueTypes >{} ), true ) ) || ... );
+      return bResult;
+    }
+
+    template < typename Visitor > bool VisitType( std::uint32_t i_Type, Visitor&& i_rVisitor )
     {
-      static constexpr std::uint32_t Value = ValueType_Int16;
-    };
-    template <> struct VTypeTag< std::int32_t >
-    {
-      static constexpr std::uint32_t Value = ValueType_Int32;
-    };
-    template <> struct VTypeTag< std::int64_t >
-    {
-      static constexpr std::uint32_t Value = ValueType_Int64;
-    };
-    template <> struct VTypeTag< std::uint8_t >
-    {
-      static constexpr std::uint32_t Value = ValueType_UInt8;
-    };
-    template <> struct VTypeTag< std::uint16_t >
-    {
-      static constexpr std::uint32_t Value = ValueType_UInt16;
-    };
-    template <> struct VTypeTag< std::uint32_t >
-    {
-      static constexpr std::uint32_t Value = ValueType_UInt32;
-    };
-    template <> struct VTypeTag< std::uint64_t >
-    {
-      static constexpr std::uint32_t Value = ValueType_UInt64;
-    };
-    template <> struct VTypeTag< float >
-    {
-      static constexpr std::uint32_t Value = ValueType_Float32;
-    };
-    template <> struct VTypeTag< double >
-    {
-      static constexpr std::uint32_t Value = ValueType_Float64;
-    };
-    template <> struct VTypeTag< std::string >
-    {
-      static constexpr std::uint32_t Value = ValueType_String;
-    };
+      return VisitTypes( i_Type, i_rVisitor, std::make_index_sequence< std::tuple_size_v< VValueTypes > >() );
+    }
 
     template < typename T > std::shared_ptr< IVideoAttributes::IValue > MakeValue( T i_Value )
     {
-      return std::make_shared< VValueTyped< T > >( std::move( i_Value ), VTypeTag< T >::Value );
+      return std::make_shared< VValueTyped< T > >( std::move( i_Value ), TypeTag< T >() );
     }
 
     // Longer keys and strings are read in pieces of this size when the stream cannot say how
@@ -142,35 +121,8 @@ namespace ZOL
     bool ReadTaggedValue( IInputStream& i_rStream, std::uint32_t i_Type,
                           std::shared_ptr< IVideoAttributes::IValue >& o_rpValue )
     {
-      switch( i_Type )
-      {
-      case ValueType_Bool:
-        return ReadValue< bool >( i_rStream, o_rpValue );
-      case ValueType_Int8:
-        return ReadValue< std::int8_t >( i_rStream, o_rpValue );
-      case ValueType_Int16:
-        return ReadValue< std::int16_t >( i_rStream, o_rpValue );
-      case ValueType_Int32:
-        return ReadValue< std::int32_t >( i_rStream, o_rpValue );
-      case ValueType_Int64:
-        return ReadValue< std::int64_t >( i_rStream, o_rpValue );
-      case ValueType_UInt8:
-        return ReadValue< std::uint8_t >( i_rStream, o_rpValue );
-      case ValueType_UInt16:
-        return ReadValue< std::uint16_t >( i_rStream, o_rpValue );
-      case ValueType_UInt32:
-        return ReadValue< std::uint32_t >( i_rStream, o_rpValue );
-      case ValueType_UInt64:
-        return ReadValue< std::uint64_t >( i_rStream, o_rpValue );
-      case ValueType_Float32:
-        return ReadValue< float >( i_rStream, o_rpValue );
-      case ValueType_Float64:
-        return ReadValue< double >( i_rStream, o_rpValue );
-      case ValueType_String:
-        return ReadValue< std::string >( i_rStream, o_rpValue );
-      default:
-        return false;
-      }
+      return VisitType( i_Type,
+                        [&]( auto i_Default ) { return ReadValue< decltype( i_Default ) >( i_rStream, o_rpValue ); } );
     }
 
     template < typename T >
@@ -232,38 +184,6 @@ namespace ZOL
       }
     }
 
-    template < typename Visitor > bool VisitType( std::uint32_t i_Type, Visitor&& i_rVisitor )
-    {
-      switch( i_Type )
-      {
-      case ValueType_Bool:
-        return i_rVisitor( bool{} );
-      case ValueType_Int8:
-        return i_rVisitor( std::int8_t{} );
-      case ValueType_Int16:
-        return i_rVisitor( std::int16_t{} );
-      case ValueType_Int32:
-        return i_rVisitor( std::int32_t{} );
-      case ValueType_Int64:
-        return i_rVisitor( std::int64_t{} );
-      case ValueType_UInt8:
-        return i_rVisitor( std::uint8_t{} );
-      case ValueType_UInt16:
-        return i_rVisitor( std::uint16_t{} );
-      case ValueType_UInt32:
-        return i_rVisitor( std::uint32_t{} );
-      case ValueType_UInt64:
-        return i_rVisitor( std::uint64_t{} );
-      case ValueType_Float32:
-        return i_rVisitor( float{} );
-      case ValueType_Float64:
-        return i_rVisitor( double{} );
-      case ValueType_String:
-        return i_rVisitor( std::string{} );
-      default:
-        return false;
-      }
-    }
   } // namespace
 
   template < typename T > bool VValueTyped< T >::Equals( const IVideoAttributes::IValue& i_rOther ) const
@@ -418,8 +338,8 @@ namespace ZOL
       return false;
     const IValue& rValue = *It->second;
     std::ostringstream Text;
-    const bool bDone =
-        VisitType( rValue.GetType(), [&]( auto i_Type ) { return AppendText< decltype( i_Type ) >( rValue, Text ); } );
+    const bool bDone = VisitType( rValue.GetType(), [&]( auto i_Default )
+                                  { return AppendText< decltype( i_Default ) >( rValue, Text ); } );
     if( !bDone )
       return false;
     o_rText = Text.str();
@@ -432,8 +352,8 @@ namespace ZOL
     if( It == m_Values.end() || !It->second )
       return false;
     std::shared_ptr< IValue > pNew;
-    const bool bParsed = VisitType( It->second->GetType(),
-                                    [&]( auto i_Type ) { return ParseText< decltype( i_Type ) >( i_rText, pNew ); } );
+    const bool bParsed = VisitType( It->second->GetType(), [&]( auto i_Default )
+                                    { return ParseText< decltype( i_Default ) >( i_rText, pNew ); } );
     if( !bParsed )
       return false;
     It->second = std::move( pNew );
