@@ -148,6 +148,11 @@ TEST_F( WindowView, ScaleModesFollowTheMenuAndFullScreenLeavesTheFixedSize )
   EXPECT_TRUE( Action( EAction::ScaleFreely )->isChecked() );
   EXPECT_FALSE( Action( EAction::ScaleToWindow )->isChecked() );
 
+  // Leaving the fixed size adds the maximise button; the close and minimise buttons must stay.
+  EXPECT_TRUE( m_pWindow->windowFlags().testFlag( Qt::WindowMaximizeButtonHint ) );
+  EXPECT_TRUE( m_pWindow->windowFlags().testFlag( Qt::WindowCloseButtonHint ) );
+  EXPECT_TRUE( m_pWindow->windowFlags().testFlag( Qt::WindowMinimizeButtonHint ) );
+
   Action( EAction::ScaleWindowToVideo )->trigger();
   EXPECT_EQ( pSurface->GetScaleMode(), ScaleWindowToVideo );
   EXPECT_EQ( m_pWindow->minimumSize(), m_pWindow->maximumSize() );
