@@ -24,8 +24,10 @@ namespace VideoEncoding
       std::uint8_t Bytes[8] = {};
       VHead( const std::uint8_t* i_pData, std::uint64_t i_Size )
       {
-        std::memcpy( Bytes, i_pData,
-                     static_cast< std::size_t >( std::min< std::uint64_t >( i_Size, sizeof( Bytes ) ) ) );
+        // An empty buffer may have no data pointer at all.
+        if( i_pData != nullptr && i_Size > 0 )
+          std::memcpy( Bytes, i_pData,
+                       static_cast< std::size_t >( std::min< std::uint64_t >( i_Size, sizeof( Bytes ) ) ) );
       }
     };
 

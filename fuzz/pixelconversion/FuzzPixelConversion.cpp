@@ -19,7 +19,7 @@ extern "C" int LLVMFuzzerTestOneInput( const std::uint8_t* i_pData, std::size_t 
   const std::uint8_t Setting = i_pData[5];
 
   CoreVideoUtils::VPixelFormatConverter Converter;
-  const CoreVideoUtils::EInstructionSet Set = static_cast< CoreVideoUtils::EInstructionSet >( Flags % 3 );
+  const CoreVideoUtils::EInstructionSet Set = static_cast< CoreVideoUtils::EInstructionSet >( Flags % 4 );
   if( CoreVideoUtils::IsSupported( Set ) )
     Converter.SetInstructionSet( Set );
   ZOL::IVideoSettings Settings;

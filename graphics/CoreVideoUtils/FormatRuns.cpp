@@ -302,7 +302,10 @@ namespace CoreVideoUtils
         std::uint8_t* pV = t.pData + PlanarVOffset( t.Pixels );
         for( std::uint64_t i = f; i < f + n; ++i, r += 2 )
         {
-          ( ( i & 1 ) == 0 ? pU : pV )[i / 2] = r[0];
+          if( ( i & 1 ) == 0 )
+            pU[i / 2] = r[0];
+          else
+            pV[i / 2] = r[0];
           pY[i] = r[1];
         }
       }
