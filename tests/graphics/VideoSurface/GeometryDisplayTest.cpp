@@ -166,6 +166,21 @@ namespace
     EXPECT_EQ( qGray( Bent.pixel( 48, 29 ) ), 0 ) << "above the middle of the top edge";
   }
 
+  // A distortion centre of exactly (0, 0) switches the shader's distortion off, whatever the
+  // parameters say.
+  TEST_F( GeometryDisplayTest, DistortionCentreAtTheOriginMovesNothing )
+  {
+    const ZOL::IVideoFrame Frame = RandomFrame( ZOL::PixelFormat_Luminance8, 40, 24 );
+    std::unique_ptr< VGLWidget > pWidget = MakeWidget( 40 + 2 * Margin, 24 + 2 * Margin );
+    CoreLumekTypes::VLensDistortionCalibration Calibration = Lens( 1e-3, 0, 0 );
+    pWidget->SetLensDistortionCalibration( Camera( 40, 24 ), Calibration );
+    pWidget->SetLensDistortionCorrectionEnabled( true );
+    pWidget->SetScaleMode( LumekVideoViewer::ScaleOneToOne );
+    pWidget->PrepareFrame( 0, Frame.VideoFrameInfo, Frame, false );
+    pWidget->SetScaleMode( LumekVideoViewer::ScaleOneToOne );
+    EXPECT_TRUE( SamePicture( Grab( *pWidget ), ProcessorPicture( Frame ), QPoint( Margin, Margin ), 0 ) );
+  }
+
   TEST_F( GeometryDisplayTest, MissingFrameDarkensThePictureUnderAPlate )
   {
     ZOL::IVideoFrame Frame = RandomFrame( ZOL::PixelFormat_Luminance8, 160, 60 );

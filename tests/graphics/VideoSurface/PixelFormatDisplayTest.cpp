@@ -248,6 +248,25 @@ namespace
                          VSettingsCase{ "Saturated", 1.0f, 1.6f }, VSettingsCase{ "Both", 0.7f, 1.3f } ),
       []( const ::testing::TestParamInfo< VSettingsCase >& i_rInfo ) { return i_rInfo.param.Name; } );
 
+  // Gamma and saturation belong to the Bayer program alone.
+  TEST_F( SurfaceDisplayTest, SettingsLeaveOtherFormatsAlone )
+  {
+    ZOL::IVideoSettings Settings;
+    Settings.GammaCorrection = 2.2f;
+    Settings.Saturation = 0.3f;
+    for( ZOL::EPixelFormat Format :
+         { ZOL::PixelFormat_Luminance8, ZOL::PixelFormat_R8G8B8, ZOL::PixelFormat_Y8U8Y8V8 } )
+    {
+      SCOPED_TRACE( ZOL::ToString( Format ) );
+      const ZOL::IVideoFrame Frame = RandomFrame( Format, 40, 24 );
+      std::unique_ptr< VGLWidget > pWidget = MakeWidget( 40 + 2 * Margin, 24 + 2 * Margin );
+      pWidget->SetScaleMode( LumekVideoViewer::ScaleOneToOne );
+      pWidget->SetVideoSettings( Settings );
+      pWidget->PrepareFrame( 0, Frame.VideoFrameInfo, Frame, false );
+      EXPECT_TRUE( SamePicture( Grab( *pWidget ), ProcessorPicture( Frame ), QPoint( Margin, Margin ), 3 ) );
+    }
+  }
+
   TEST_F( SurfaceDisplayTest, SoftwarePassesRGBFramesAsTheyAre )
   {
     const ZOL::IVideoFrame Frame = RandomFrame( ZOL::PixelFormat_R8G8B8, 37, 21 );
