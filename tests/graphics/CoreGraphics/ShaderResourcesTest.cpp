@@ -331,3 +331,67 @@ namespace
     }
   }
 } // namespace
+
+namespace
+{
+  struct VBlendCase
+  {
+    const char* Name;
+    int ColourMode;
+    float BlendConstant;
+    // Expected colour over the destination (0.2, 0.4, 0.6) for the source (1.0, 0.5, 0.0, 0.5).
+    float R, G, B;
+  };
+
+  class BlendTest : public ShaderResourcesTest, public ::testing::WithParamInterface< VBlendCase >
+  {
+  };
+
+  TEST_P( BlendTest, MixesSourceAndDestinationByTheMode )
+  {
+    const VBlendCase& rCase = GetParam();
+    CoreGraphics::VResources Resources( false, QDir::currentPath() );
+    Resources.Load();
+    CoreGraphics::VRenderContext Context;
+    Context.Initialise();
+    QOpenGLFramebufferObject Framebuffer( 4, 4 );
+    Context.BindFramebuffer( &Framebuffer );
+    Context.SetViewport( QRect( 0, 0, 4, 4 ) );
+    Context.SetClearColour( QColor::fromRgbF( 0.2, 0.4, 0.6, 1.0 ) );
+    Context.Clear( true, false );
+
+    std::shared_ptr< CoreGraphics::VShaderProgram > pProgram = Resources.GetProgram( "Simple3D", "UniformColour" );
+    ASSERT_TRUE( Context.UseProgram( pProgram ) );
+    pProgram->SetUniform( pProgram->UniformLocation( "u_colour" ), QVector4D( 1.0f, 0.5f, 0.0f, 0.5f ) );
+    CoreGraphics::VMesh Mesh;
+    const float Corners[] = { -1, -1, 0, 1, -1, 0, 1, 1, 0, -1, 1, 0 };
+    ASSERT_TRUE( Mesh.Vertices.Create( CoreGraphics::VVertexLayout::Position3D(), Corners, sizeof( Corners ) ) );
+    ASSERT_TRUE( Mesh.Indices.Create( std::vector< std::uint16_t >{ 0, 1, 2, 0, 2, 3 } ) );
+
+    CoreGraphics::VRenderState State;
+    State.ColourBlendMode = rCase.ColourMode;
+    // Alpha mode 1 turns blending on for colour mode 0 as well.
+    State.AlphaBlendMode = 1;
+    State.BlendConstant = rCase.BlendConstant;
+    Context.ApplyState( State );
+    Context.BindVertexBuffer( Mesh.Vertices );
+    Context.DrawIndexed( GL_TRIANGLES, Mesh.Indices );
+    const QImage Picture = Framebuffer.toImage();
+    Context.ResetState();
+    Context.UnbindFramebuffer();
+
+    const QRgb Pixel = Picture.pixel( 2, 2 );
+    EXPECT_NEAR( qRed( Pixel ), std::min( rCase.R, 1.0f ) * 255, 2 );
+    EXPECT_NEAR( qGreen( Pixel ), std::min( rCase.G, 1.0f ) * 255, 2 );
+    EXPECT_NEAR( qBlue( Pixel ), std::min( rCase.B, 1.0f ) * 255, 2 );
+  }
+
+  INSTANTIATE_TEST_SUITE_P( Modes, BlendTest,
+                            ::testing::Values( VBlendCase{ "Replace", 0, 1.0f, 1.0f, 0.5f, 0.0f },
+                                               VBlendCase{ "Alpha", 1, 1.0f, 0.6f, 0.45f, 0.3f },
+                                               VBlendCase{ "AdditiveAlpha", 2, 1.0f, 0.7f, 0.65f, 0.6f },
+                                               VBlendCase{ "ConstantAlphaAdditive", 3, 0.25f, 0.45f, 0.525f, 0.6f },
+                                               VBlendCase{ "Premultiplied", 4, 1.0f, 1.1f, 0.7f, 0.3f } ),
+                            []( const ::testing::TestParamInfo< VBlendCase >& i_rInfo )
+                            { return i_rInfo.param.Name; } );
+} // namespace
