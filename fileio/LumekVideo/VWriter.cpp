@@ -156,7 +156,9 @@ namespace LumekVideo
               m_pStream->Seek( static_cast< std::int64_t >( HeaderAlignmentOffset ) ) &&
               ZOL::WriteLE( *m_pStream, m_Alignment ) && ZOL::WriteLE( *m_pStream, IndexOffset );
     }
-    if( m_pFile && !m_pFile->Close() )
+    // Closing the file does not report a failed last flush (a full disc shows there), so flush
+    // first and ask.
+    if( m_pFile && ( !m_pFile->Flush() || !m_pFile->Close() ) )
       bGood = false;
     m_pFile.reset();
     m_pStream.reset();

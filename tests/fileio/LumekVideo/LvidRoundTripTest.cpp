@@ -8,6 +8,7 @@
 
 #include "videointerface/BufferAllocators.h"
 
+#include <boost/filesystem/operations.hpp>
 #include <gtest/gtest.h>
 
 #include <algorithm>
@@ -481,6 +482,30 @@ namespace
     LumekVideo::VReader Reader;
     ASSERT_TRUE( Reader.Open( Path ) );
     EXPECT_EQ( Reader.GetFrameCount(), 1u );
+  }
+
+  TEST( LvidReader, OpensOnlyFilesThatAreThere )
+  {
+    VTempDir Dir;
+    LumekVideo::VReader Reader;
+    EXPECT_FALSE( Reader.Open( Dir.File( "missing.lvid" ) ) );
+    EXPECT_FALSE( Reader.Open( Dir.Path() ) );
+    ASSERT_TRUE( WriteFile( Dir.File( "empty.lvid" ), {} ) );
+    EXPECT_FALSE( Reader.Open( Dir.File( "empty.lvid" ) ) );
+    EXPECT_EQ( Reader.GetFrameCount(), 0u );
+  }
+
+  TEST( LvidWriter, FullDiscMakesCloseFail )
+  {
+    // Small writes sit in the stream's buffer and only fail when it is flushed: a writer that
+    // did not ask at the end would report a recording that is not there.
+    if( !boost::filesystem::exists( "/dev/full" ) )
+      GTEST_SKIP() << "no /dev/full here";
+    LumekVideo::VWriter Writer;
+    ASSERT_TRUE( Writer.Create( "/dev/full", s_SmallVideo, ZOL::IAudioFrameInfo(), {}, 16 ) );
+    const VBytes Frame = PatternBytes( 15, 0 );
+    Writer.AppendFrame( 0, Frame.data(), Frame.size() );
+    EXPECT_FALSE( Writer.Close() );
   }
 
   TEST( LvidWriter, DestructionFinishesTheRecording )
