@@ -151,7 +151,11 @@ namespace LumekVideoViewer
     if( m_PreferredDecoder == Software )
     {
       if( m_PixelRecord.PixelFormat != ZOL::PixelFormat_R8G8B8 && !ConvertForSoftwareDecoder( pBuffer ) )
+      {
+        // Nothing to show: the held picture of an earlier frame must not be drawn as this one.
+        m_PixelRecord.PixelFormat = ZOL::PixelFormat_Unspecified;
         return;
+      }
       m_ActiveProgram = VideoGraphics::Program_VideoRaw;
       m_DecoderName = SoftwareDecoderName;
     }

@@ -53,8 +53,7 @@ namespace VideoGraphics
       if( m_UploadedFormat != Format )
         LUMEK_LOG( "CoreGraphics", ZOL::LogWarning, "Frame buffer of %d bytes is too small for %d x %d",
                    m_pBuffer->GetSize(), m_Info.ImageWidth, m_Info.ImageHeight );
-      m_UploadedFormat = Format;
-      return;
+      pRoute = nullptr;
     }
 
     bool bReallocated = false;
@@ -63,21 +62,19 @@ namespace VideoGraphics
     {
       Size = TextureSize( *pRoute, m_Info.ImageWidth, m_Info.ImageHeight );
       bReallocated = EnsureStorage( Size, pRoute->InternalFormat );
+      // Storage that could not be made for this frame still has the size of an earlier one.
+      if( GetStorageSize() != Size || m_StorageFormat != pRoute->InternalFormat )
+        pRoute = nullptr;
     }
-    // A format that never goes to the card shows nothing, not the texture of an earlier frame.
-    if( pRoute == nullptr )
-      i_rContext.BindTexture( i_Unit, nullptr );
-    else if( m_pTexture && m_pTexture->isCreated() )
-      i_rContext.BindTexture( i_Unit, m_pTexture.get() );
+    // A frame that doesn't go to the card shows nothing, not the texture of an earlier frame.
+    i_rContext.BindTexture( i_Unit, pRoute != nullptr ? m_pTexture.get() : nullptr );
 
     if( Format == m_UploadedFormat && !bReallocated )
       return;
     m_UploadedFormat = Format;
-    // Storage that could not be made for this frame keeps the size of an earlier one.
-    if( pRoute == nullptr || GetStorageSize() != Size || m_StorageFormat != pRoute->InternalFormat )
-      return;
-    Upload( i_rContext, i_Format, Size, pRoute->InternalFormat, pRoute->UploadFormat != pRoute->Format,
-            pRoute->UploadFormat );
+    if( pRoute != nullptr )
+      Upload( i_rContext, i_Format, Size, pRoute->InternalFormat, pRoute->UploadFormat != pRoute->Format,
+              pRoute->UploadFormat );
   }
 
   bool VVideoTexture::EnsureStorage( const QSize& i_rSize, GLenum i_InternalFormat )

@@ -311,28 +311,33 @@ namespace
   TEST_F( GeometryDisplayTest, ShortBuffersAndHugeSizesAreNotUploaded )
   {
     std::unique_ptr< VGLWidget > pWidget = MakeWidget( 48, 32 );
+    // An earlier frame's picture must not show for them either.
+    ZOL::IVideoFrame Earlier = RandomFrame( ZOL::PixelFormat_Luminance8, 40, 24 );
+    std::fill( Earlier.Video->GetData(), Earlier.Video->GetData() + 40 * 24, 255 );
+    pWidget->PrepareFrame( 0, Earlier.VideoFrameInfo, Earlier, false );
+    EXPECT_EQ( qGray( Grab( *pWidget ).pixel( 24, 16 ) ), 255 );
     ZOL::IVideoFrame Short = RandomFrame( ZOL::PixelFormat_R8G8B8, 40, 24 );
     std::static_pointer_cast< ZOL::IStandardBuffer >( Short.Video )->Resize( 40 * 24 * 3 - 1 );
     pWidget->PrepareFrame( 0, Short.VideoFrameInfo, Short, false );
-    Grab( *pWidget );
-    EXPECT_EQ( pWidget->GetVideoTexture().GetUploadCount(), 0u );
+    EXPECT_EQ( qGray( Grab( *pWidget ).pixel( 24, 16 ) ), 0 );
+    EXPECT_EQ( pWidget->GetVideoTexture().GetUploadCount(), 1u );
 
     ZOL::IVideoFrame Huge = RandomFrame( ZOL::PixelFormat_Luminance8, 4, 4 );
     Huge.VideoFrameInfo.ImageWidth = 1 << 20;
     Huge.VideoFrameInfo.ImageHeight = 1 << 20;
     pWidget->PrepareFrame( 1, Huge.VideoFrameInfo, Huge, false );
     Grab( *pWidget );
-    EXPECT_EQ( pWidget->GetVideoTexture().GetUploadCount(), 0u );
-    EXPECT_EQ( pWidget->GetVideoTexture().GetStorageAllocationCount(), 0u );
+    EXPECT_EQ( pWidget->GetVideoTexture().GetUploadCount(), 1u );
+    EXPECT_EQ( pWidget->GetVideoTexture().GetStorageAllocationCount(), 1u );
 
     // Software mode allocates nothing for a frame its bytes can't fill.
     pWidget->SetDecoder( LumekVideoViewer::Software );
     for( const ZOL::IVideoFrame* pFrame : { &Short, &Huge } )
     {
       pWidget->PrepareFrame( 2, pFrame->VideoFrameInfo, *pFrame, false );
-      Grab( *pWidget );
+      EXPECT_EQ( qGray( Grab( *pWidget ).pixel( 24, 16 ) ), 0 );
     }
-    EXPECT_EQ( pWidget->GetVideoTexture().GetUploadCount(), 0u );
+    EXPECT_EQ( pWidget->GetVideoTexture().GetUploadCount(), 1u );
     EXPECT_NE( pWidget->GetDecoderName().toStdString(), "Software Decoder" );
   }
 } // namespace
