@@ -223,6 +223,33 @@ namespace
     EXPECT_GE( pProgram->UniformLocation( "u_Reloaded" ), 0 );
   }
 
+  // With a debug context the driver's complaints reach the category log.
+  TEST_F( ShaderResourcesTest, DebugContextPassesDriverMessagesToTheLog )
+  {
+    const QSurfaceFormat Previous = QSurfaceFormat::defaultFormat();
+    QSurfaceFormat Debug = Previous;
+    Debug.setOption( QSurfaceFormat::DebugContext );
+    QSurfaceFormat::setDefaultFormat( Debug );
+    QOpenGLContext DebugContext;
+    DebugContext.setFormat( Debug );
+    ASSERT_TRUE( DebugContext.create() );
+    ASSERT_TRUE( DebugContext.makeCurrent( &m_Surface ) );
+
+    {
+      VLogCapture Log;
+      CoreGraphics::VRenderContext Context;
+      Context.Initialise();
+      EXPECT_TRUE( Log.Contains( "Debug OpenGL context requested" ) );
+      ASSERT_TRUE( Log.Contains( "Initialising debug logger" ) ) << "llvmpipe has GL_KHR_debug";
+      const std::size_t Before = Log.Messages.size();
+      Context.Enable( 0xFFFF, true );
+      EXPECT_GT( Log.Messages.size(), Before ) << "an invalid capability is reported";
+    }
+    DebugContext.doneCurrent();
+    QSurfaceFormat::setDefaultFormat( Previous );
+    ASSERT_TRUE( m_Context.makeCurrent( &m_Surface ) );
+  }
+
   TEST_F( ShaderResourcesTest, UseProgramRefusesAnAbsentProgramAndKeepsTheCurrentOne )
   {
     VResources Resources( false, QDir::currentPath() );
