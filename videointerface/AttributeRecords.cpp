@@ -94,8 +94,8 @@ namespace ZOL
       return true;
     }
 
-    // Step 8 of reading a frame description: the history carries a lens model that the
-    // recording itself lacks, so the picture was re-encoded from a distorted source.
+    // Set when the history carries a lens model that the recording itself lacks: the picture
+    // was re-encoded from a distorted source and its lens data did not come along.
     bool HasConversionDistortion( const IVideoAttributes& i_rOuter )
     {
       std::uint32_t Type = 0;
