@@ -5,6 +5,10 @@ if(LUMEK_SANITIZE OR LUMEK_FUZZ)
   add_compile_options(-fsanitize=address,undefined -fno-omit-frame-pointer -fno-sanitize-recover=undefined)
   add_link_options(-fsanitize=address,undefined)
 endif()
+if(LUMEK_FUZZ)
+  # Every library the fuzz targets reach feeds coverage back to the fuzzer.
+  add_compile_options(-fsanitize=fuzzer-no-link)
+endif()
 
 # Adds a library of one folder: lumek_library(NAME SOURCES ... DEPENDS ...)
 function(lumek_library name)
