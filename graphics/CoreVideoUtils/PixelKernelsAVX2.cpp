@@ -7,6 +7,7 @@
 
 #include <array>
 #include <cstring>
+#include <type_traits>
 
 namespace CoreVideoUtils
 {
@@ -288,44 +289,55 @@ namespace CoreVideoUtils
       const __m256i Byte = _mm256_set1_epi32( 0xFF );
       const __m256i Spread3 = _mm256_setr_epi8( 0, 1, 2, -128, 3, 4, 5, -128, 6, 7, 8, -128, 9, 10, 11, -128, 0, 1, 2,
                                                 -128, 3, 4, 5, -128, 6, 7, 8, -128, 9, 10, 11, -128 );
-      const __m128i Pack3 = _mm_setr_epi8( 0, 1, 2, 4, 5, 6, 8, 9, 10, 12, 13, 14, -128, -128, -128, -128 );
       auto Correct = [&]( __m256i i_Value, __m256 i_Grey )
       {
         const __m256 Value = _mm256_add_ps( _mm256_mul_ps( Keep, _mm256_cvtepi32_ps( i_Value ) ), i_Grey );
         return _mm256_cvttps_epi32( _mm256_min_ps( _mm256_max_ps( Value, Zero ), Max ) );
       };
-      for( std::uint64_t Block = 0; Block < Blocks; ++Block )
+      // One loop a pixel size, so that the step is a constant inside it.
+      auto Run = [&]( auto i_Step )
       {
-        std::uint8_t* p = io_pData + Block * 8 * i_Step;
-        const __m256i Pixels =
-            i_Step == 4 ? _mm256_loadu_si256( reinterpret_cast< const __m256i* >( p ) )
-                        : _mm256_shuffle_epi8( _mm256_loadu2_m128i( reinterpret_cast< const __m128i* >( p + 12 ),
-                                                                    reinterpret_cast< const __m128i* >( p ) ),
-                                               Spread3 );
-        const __m256i R = _mm256_and_si256( Pixels, Byte );
-        const __m256i G = _mm256_and_si256( _mm256_srli_epi32( Pixels, 8 ), Byte );
-        const __m256i B = _mm256_and_si256( _mm256_srli_epi32( Pixels, 16 ), Byte );
-        const __m256 Mean =
-            _mm256_mul_ps( _mm256_cvtepi32_ps( _mm256_add_epi32( _mm256_add_epi32( R, G ), B ) ), Third );
-        const __m256 Grey = _mm256_mul_ps( Amount, Mean );
-        const __m256i Out =
-            _mm256_or_si256( _mm256_or_si256( Correct( R, Grey ), _mm256_slli_epi32( Correct( G, Grey ), 8 ) ),
-                             _mm256_or_si256( _mm256_slli_epi32( Correct( B, Grey ), 16 ),
-                                              _mm256_andnot_si256( _mm256_set1_epi32( 0xFFFFFF ), Pixels ) ) );
-        if( i_Step == 4 )
+        constexpr unsigned STEP = decltype( i_Step )::value;
+        // Three bytes of each 32-bit lane to the bottom of its half, then the halves together:
+        // 24 bytes written by two stores.
+        const __m256i Pack3 = _mm256_setr_epi8( 0, 1, 2, 4, 5, 6, 8, 9, 10, 12, 13, 14, -128, -128, -128, -128, 0, 1, 2,
+                                                4, 5, 6, 8, 9, 10, 12, 13, 14, -128, -128, -128, -128 );
+        const __m256i Join3 = _mm256_setr_epi32( 0, 1, 2, 4, 5, 6, 7, 7 );
+        const __m256i Fourth = _mm256_set1_epi32( static_cast< int >( 0xFF000000u ) );
+        for( std::uint64_t Block = 0; Block < Blocks; ++Block )
         {
-          _mm256_storeu_si256( reinterpret_cast< __m256i* >( p ), Out );
-          continue;
+          std::uint8_t* p = io_pData + Block * 8 * STEP;
+          __m256i Pixels;
+          if constexpr( STEP == 4 )
+            Pixels = _mm256_loadu_si256( reinterpret_cast< const __m256i* >( p ) );
+          else
+            Pixels = _mm256_shuffle_epi8( _mm256_loadu2_m128i( reinterpret_cast< const __m128i* >( p + 12 ),
+                                                               reinterpret_cast< const __m128i* >( p ) ),
+                                          Spread3 );
+          const __m256i R = _mm256_and_si256( Pixels, Byte );
+          const __m256i G = _mm256_and_si256( _mm256_srli_epi32( Pixels, 8 ), Byte );
+          const __m256i B = _mm256_and_si256( _mm256_srli_epi32( Pixels, 16 ), Byte );
+          const __m256 Mean =
+              _mm256_mul_ps( _mm256_cvtepi32_ps( _mm256_add_epi32( _mm256_add_epi32( R, G ), B ) ), Third );
+          const __m256 Grey = _mm256_mul_ps( Amount, Mean );
+          const __m256i Out =
+              _mm256_or_si256( _mm256_or_si256( Correct( R, Grey ), _mm256_slli_epi32( Correct( G, Grey ), 8 ) ),
+                               _mm256_slli_epi32( Correct( B, Grey ), 16 ) );
+          if constexpr( STEP == 4 )
+            _mm256_storeu_si256( reinterpret_cast< __m256i* >( p ),
+                                 _mm256_or_si256( Out, _mm256_and_si256( Pixels, Fourth ) ) );
+          else
+          {
+            const __m256i Packed = _mm256_permutevar8x32_epi32( _mm256_shuffle_epi8( Out, Pack3 ), Join3 );
+            _mm_storeu_si128( reinterpret_cast< __m128i* >( p ), _mm256_castsi256_si128( Packed ) );
+            _mm_storel_epi64( reinterpret_cast< __m128i* >( p + 16 ), _mm256_extracti128_si256( Packed, 1 ) );
+          }
         }
-        for( int Half = 0; Half < 2; ++Half )
-        {
-          const __m128i Packed =
-              _mm_shuffle_epi8( Half == 0 ? _mm256_castsi256_si128( Out ) : _mm256_extracti128_si256( Out, 1 ), Pack3 );
-          _mm_storel_epi64( reinterpret_cast< __m128i* >( p + 12 * Half ), Packed );
-          const std::int32_t Tail = _mm_cvtsi128_si32( _mm_srli_si128( Packed, 8 ) );
-          std::memcpy( p + 12 * Half + 8, &Tail, 4 );
-        }
-      }
+      };
+      if( i_Step == 3 )
+        Run( std::integral_constant< unsigned, 3 >() );
+      else
+        Run( std::integral_constant< unsigned, 4 >() );
       return Count;
     }
   } // namespace Kernels
