@@ -150,6 +150,8 @@ namespace
     pWidget->SetLensDistortionCorrectionEnabled( true );
     pWidget->SetScaleMode( LumekVideoViewer::ScaleOneToOne );
     const QImage Bent = Grab( *pWidget );
+    if( qEnvironmentVariableIsSet( "LUMEK_SAVE_PICTURES" ) )
+      Bent.save( "GeometryDisplayTest_LensCalibration_actual.png" );
     const QRectF Bounds = LumekVideoViewer::DistortedBounds( QRectF( 24, 32, W, H ), QVector2D( 48, 48 ),
                                                              QVector3D( float( K1 ), 0, 0 ) );
     const QRect Box = OutlineBox( Bent );
