@@ -31,7 +31,12 @@ namespace ZOL
     bool VisitTypes( std::uint32_t i_Type, Visitor&& i_rVisitor, std::index_sequence< Index... > )
     {
       bool bResult = false;
-      ( ( i_Type == Index && ( bResult = i_rVisitor( std::tuple_element_t< Index, VValueTypes >{} ), true ) ) || ... );
+      auto Visit = [&]( auto i_Default )
+      {
+        bResult = i_rVisitor( i_Default );
+        return true;
+      };
+      static_cast< void >( ( ( i_Type == Index && Visit( std::tuple_element_t< Index, VValueTypes >{} ) ) || ... ) );
       return bResult;
     }
 
