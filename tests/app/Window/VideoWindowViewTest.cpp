@@ -12,6 +12,7 @@
 #include <QMouseEvent>
 #include <QQuickItem>
 #include <QQuickWidget>
+#include <QTextBrowser>
 
 using namespace LumekVideoViewer;
 using namespace WindowTest;
@@ -222,6 +223,21 @@ TEST_F( WindowView, AboutShowsThisRelease )
   Action( EAction::About )->trigger();
   EXPECT_EQ( Closer.GetCount(), 1 );
   EXPECT_EQ( VersionLine, "Lumek Video Viewer 1.10.0.137509h  x64" );
+}
+
+// The user's check always answers; with no server to ask, the answer is the error dialog.
+TEST_F( WindowView, CheckForUpdatesAnswersEvenWithoutAServer )
+{
+  QString Text;
+  VDialogCloser< QDialog > Closer(
+      [&]( QDialog* i_pDialog )
+      {
+        if( QTextBrowser* pBrowser = i_pDialog->findChild< QTextBrowser* >() )
+          Text = pBrowser->toPlainText();
+      } );
+  Action( EAction::CheckForUpdates )->trigger();
+  EXPECT_TRUE( WaitFor( [&] { return Closer.GetCount() == 1; } ) );
+  EXPECT_TRUE( Text.contains( "Unable to contact version check server." ) ) << Text.toStdString();
 }
 
 TEST( LegalComponents, EveryLicenceTextIsThereWithItsCopyright )
