@@ -272,9 +272,10 @@ namespace LumekVideoViewer
   void VVideoWindow::PrepareFrame( int i_FrameIndex )
   {
     const std::uint64_t FrameCount = m_VideoSource.IsOpen() ? m_VideoSource.GetFrameCount() : 0;
-    const VFrameChoice Choice = ChooseFrame( i_FrameIndex, FrameCount, m_pPlayBackManager->IsPlaying(),
-                                             [this]( std::uint64_t i_Index, ZOL::IVideoFrame& o_rFrame )
-                                             { m_VideoSource.GetFrame( i_Index, o_rFrame ); } );
+    const VFrameChoice Choice = ChooseFrame(
+        i_FrameIndex, FrameCount, m_pPlayBackManager->IsPlaying(),
+        [ this ]( std::uint64_t i_Index, ZOL::IVideoFrame& o_rFrame ) { m_VideoSource.GetFrame( i_Index, o_rFrame ); },
+        [ this ]( std::uint64_t i_Index ) { return m_VideoSource.FindFrameAtOrBefore( i_Index ); } );
     m_ShownFrameIndex = Choice.ShownIndex;
     const ZOL::IVideoFrameInfo Geometry =
         SurfaceGeometry( m_VideoSource.GetVideoFrameInfo(), m_VideoSource.GetCameraHardware() );

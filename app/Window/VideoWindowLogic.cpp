@@ -47,7 +47,8 @@ namespace LumekVideoViewer
     return rInfo.ImageWidth == 0 || rInfo.ImageHeight == 0 || rInfo.PixelFormat == ZOL::PixelFormat_Unspecified;
   }
 
-  VFrameChoice ChooseFrame( int i_FrameIndex, std::uint64_t i_FrameCount, bool i_bPlaying, const VFrameReader& i_rRead )
+  VFrameChoice ChooseFrame( int i_FrameIndex, std::uint64_t i_FrameCount, bool i_bPlaying, const VFrameReader& i_rRead,
+                            const VEarlierFrameFinder& i_rFindEarlier )
   {
     VFrameChoice Choice;
     if( i_FrameIndex < 0 )
@@ -61,7 +62,11 @@ namespace LumekVideoViewer
       Index = i_FrameCount;
     while( IsEmptyFrame( Choice.Frame ) && Index > 0 )
     {
-      --Index;
+      const std::optional< std::uint64_t > Earlier =
+          i_rFindEarlier ? i_rFindEarlier( Index - 1 ) : std::optional< std::uint64_t >( Index - 1 );
+      if( !Earlier || *Earlier >= Index )
+        break;
+      Index = *Earlier;
       Choice.Frame = ZOL::IVideoFrame();
       i_rRead( Index, Choice.Frame );
     }

@@ -14,6 +14,7 @@
 #include <array>
 #include <cstdint>
 #include <functional>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -58,6 +59,8 @@ namespace LumekVideoViewer
   bool IsEmptyFrame( const ZOL::IVideoFrame& i_rFrame );
 
   using VFrameReader = std::function< void( std::uint64_t i_Index, ZOL::IVideoFrame& o_rFrame ) >;
+  // The nearest stored frame at or below an index, from the file's index.
+  using VEarlierFrameFinder = std::function< std::optional< std::uint64_t >( std::uint64_t i_Index ) >;
 
   struct VFrameChoice
   {
@@ -70,9 +73,10 @@ namespace LumekVideoViewer
   // The frame for i_FrameIndex, or else the nearest earlier one that exists: a gap in a recording
   // keeps the last picture on screen, and an index past the end shows the last frame. The warning
   // is raised for a missing frame only while paused; during playback a gap just holds the picture.
-  // Indices at or past i_FrameCount are known to be empty and are not read.
+  // Indices at or past i_FrameCount are known to be empty and are not read. With a finder, the
+  // walk down jumps over a gap in one step instead of reading every missing number in it.
   VFrameChoice ChooseFrame( int i_FrameIndex, std::uint64_t i_FrameCount, bool i_bPlaying,
-                            const VFrameReader& i_rRead );
+                            const VFrameReader& i_rRead, const VEarlierFrameFinder& i_rFindEarlier = nullptr );
 
   // Where the surface places the image on the sensor. Offsets without a sensor size to measure
   // them against would push the picture off the outline, so they are dropped.

@@ -144,6 +144,19 @@ TEST( FrameChoiceEdges, IndicesPastTheEndAreNotRead )
   EXPECT_EQ( Reads, std::vector< std::uint64_t >{ 2 } );
 }
 
+// A damaged index may leave a gap of billions of numbers below the asked frame.
+TEST( FrameChoiceEdges, AGapIsCrossedInOneStep )
+{
+  std::vector< std::uint64_t > Reads;
+  const auto FindEarlier = []( std::uint64_t i_Index ) -> std::optional< std::uint64_t > {
+    return i_Index >= 2000000000u ? 2000000000u : 0u;
+  };
+  const VFrameChoice Choice = ChooseFrame( 2000000001, 2000000002, false, GappyFile( { 0 }, &Reads ), FindEarlier );
+  EXPECT_EQ( Choice.ShownIndex, 0 );
+  EXPECT_TRUE( Choice.bMissingWarning );
+  EXPECT_EQ( Reads, ( std::vector< std::uint64_t >{ 2000000001, 2000000000, 0 } ) );
+}
+
 TEST( SurfaceGeometry, OffsetsNeedASensorToBeMeasuredOn )
 {
   ZOL::IVideoFrameInfo Info;
