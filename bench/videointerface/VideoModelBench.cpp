@@ -3,6 +3,7 @@
 // out of the recycling allocators at frame rate. Heap calls are counted per iteration, so the
 // figures show both time and what each operation takes from the heap.
 
+#include "tests/support/AllocationWatch.h"
 #include "utils/MemoryStream.h"
 #include "videointerface/AttributeRecords.h"
 #include "videointerface/BufferAllocators.h"
@@ -16,28 +17,16 @@
 
 namespace
 {
-  std::atomic< std::uint64_t > s_Allocations{ 0 };
-  std::atomic< std::uint64_t > s_AllocatedBytes{ 0 };
-
-  void* CountedAllocate( std::size_t i_Size )
-  {
-    s_Allocations.fetch_add( 1, std::memory_order_relaxed );
-    s_AllocatedBytes.fetch_add( i_Size, std::memory_order_relaxed );
-    if( void* p = std::malloc( i_Size == 0 ? 1 : i_Size ) )
-      return p;
-    throw std::bad_alloc();
-  }
-
   // Reports heap calls and bytes per iteration of the benchmark that owns it.
   class VHeapCounter
   {
   public:
-    VHeapCounter() : m_Calls( s_Allocations.load() ), m_Bytes( s_AllocatedBytes.load() ) {}
+    VHeapCounter() : m_Calls( LumekTest::HeapCalls() ), m_Bytes( LumekTest::HeapBytes() ) {}
     void Report( benchmark::State& io_rState ) const
     {
       const double Iterations = static_cast< double >( io_rState.iterations() );
-      io_rState.counters["heap/iter"] = static_cast< double >( s_Allocations.load() - m_Calls ) / Iterations;
-      io_rState.counters["heapB/iter"] = static_cast< double >( s_AllocatedBytes.load() - m_Bytes ) / Iterations;
+      io_rState.counters["heap/iter"] = static_cast< double >( LumekTest::HeapCalls() - m_Calls ) / Iterations;
+      io_rState.counters["heapB/iter"] = static_cast< double >( LumekTest::HeapBytes() - m_Bytes ) / Iterations;
     }
 
   private:
@@ -211,30 +200,5 @@ namespace
   }
   BENCHMARK( BM_AllocateAcrossThreads )->Threads( 1 )->Threads( 2 )->UseRealTime();
 } // namespace
-
-void* operator new( std::size_t i_Size )
-{
-  return CountedAllocate( i_Size );
-}
-void* operator new[]( std::size_t i_Size )
-{
-  return CountedAllocate( i_Size );
-}
-void operator delete( void* i_p ) noexcept
-{
-  std::free( i_p );
-}
-void operator delete[]( void* i_p ) noexcept
-{
-  std::free( i_p );
-}
-void operator delete( void* i_p, std::size_t ) noexcept
-{
-  std::free( i_p );
-}
-void operator delete[]( void* i_p, std::size_t ) noexcept
-{
-  std::free( i_p );
-}
 
 BENCHMARK_MAIN();

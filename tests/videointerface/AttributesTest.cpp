@@ -1,6 +1,6 @@
 #include "videointerface/IVideoAttributes.h"
 
-#include "tests/videointerface/AllocationWatch.h"
+#include "tests/support/AllocationWatch.h"
 #include "utils/MemoryStream.h"
 
 #include <gtest/gtest.h>

@@ -5,6 +5,8 @@
 #include "fileio/LumekVideo/VReader.h"
 #include "fileio/LumekVideo/VWriter.h"
 
+#include "tests/support/AllocationWatch.h"
+
 #include <benchmark/benchmark.h>
 #include <boost/filesystem.hpp>
 
@@ -16,42 +18,6 @@
 #include <map>
 #include <new>
 #include <vector>
-
-// Heap calls are counted so that the read path's claim of taking nothing from the heap is
-// measured, not assumed.
-static std::atomic< std::uint64_t > s_HeapCalls{ 0 };
-
-static void* CountedAllocate( std::size_t i_Size )
-{
-  s_HeapCalls.fetch_add( 1, std::memory_order_relaxed );
-  if( void* p = std::malloc( i_Size ? i_Size : 1 ) )
-    return p;
-  throw std::bad_alloc();
-}
-void* operator new( std::size_t i_Size )
-{
-  return CountedAllocate( i_Size );
-}
-void* operator new[]( std::size_t i_Size )
-{
-  return CountedAllocate( i_Size );
-}
-void operator delete( void* i_p ) noexcept
-{
-  std::free( i_p );
-}
-void operator delete[]( void* i_p ) noexcept
-{
-  std::free( i_p );
-}
-void operator delete( void* i_p, std::size_t ) noexcept
-{
-  std::free( i_p );
-}
-void operator delete[]( void* i_p, std::size_t ) noexcept
-{
-  std::free( i_p );
-}
 
 namespace
 {
@@ -144,7 +110,7 @@ namespace
       ZOL::IAudioBuffers Audio;
       Reader.ReadFrameData( 0, pVideo, Audio, true, true );
     }
-    const std::uint64_t HeapCallsBefore = s_HeapCalls.load();
+    const std::uint64_t HeapCallsBefore = LumekTest::HeapCalls();
     for( auto _ : io_rState )
     {
       std::shared_ptr< ZOL::IBuffer > pVideo;
@@ -157,7 +123,7 @@ namespace
       benchmark::DoNotOptimize( pVideo->GetData() );
       Frame = ( Frame + 1 ) % FrameCount;
     }
-    io_rState.counters["heap/iter"] = benchmark::Counter( static_cast< double >( s_HeapCalls.load() - HeapCallsBefore ),
+    io_rState.counters["heap/iter"] = benchmark::Counter( static_cast< double >( LumekTest::HeapCalls() - HeapCallsBefore ),
                                                           benchmark::Counter::kAvgIterations );
     ReportFrames( io_rState, rRecording.FrameSize );
   }

@@ -1,4 +1,4 @@
-#include "tests/videointerface/AllocationWatch.h"
+#include "tests/support/AllocationWatch.h"
 
 #include <atomic>
 #include <cstdlib>
@@ -6,12 +6,16 @@
 
 namespace
 {
-  std::atomic< bool > s_bWatching{ false };
+  std::atomic< int > s_Watches{ 0 };
   std::atomic< std::size_t > s_Largest{ 0 };
+  std::atomic< std::uint64_t > s_Calls{ 0 };
+  std::atomic< std::uint64_t > s_Bytes{ 0 };
 
   void* Allocate( std::size_t i_Size )
   {
-    if( s_bWatching.load( std::memory_order_relaxed ) )
+    s_Calls.fetch_add( 1, std::memory_order_relaxed );
+    s_Bytes.fetch_add( i_Size, std::memory_order_relaxed );
+    if( s_Watches.load( std::memory_order_relaxed ) > 0 )
     {
       std::size_t Seen = s_Largest.load( std::memory_order_relaxed );
       while( i_Size > Seen && !s_Largest.compare_exchange_weak( Seen, i_Size ) )
@@ -51,19 +55,39 @@ void operator delete[]( void* i_p, std::size_t ) noexcept
 
 namespace LumekTest
 {
-  VAllocationWatch::VAllocationWatch()
+  VAllocationWatch::VAllocationWatch() : m_CallsAtStart( s_Calls.load() ), m_BytesAtStart( s_Bytes.load() )
   {
     s_Largest.store( 0 );
-    s_bWatching.store( true );
+    s_Watches.fetch_add( 1 );
   }
 
   VAllocationWatch::~VAllocationWatch()
   {
-    s_bWatching.store( false );
+    s_Watches.fetch_sub( 1 );
   }
 
   std::size_t VAllocationWatch::Largest() const
   {
     return s_Largest.load();
+  }
+
+  std::uint64_t VAllocationWatch::Calls() const
+  {
+    return s_Calls.load() - m_CallsAtStart;
+  }
+
+  std::uint64_t VAllocationWatch::Bytes() const
+  {
+    return s_Bytes.load() - m_BytesAtStart;
+  }
+
+  std::uint64_t HeapCalls()
+  {
+    return s_Calls.load();
+  }
+
+  std::uint64_t HeapBytes()
+  {
+    return s_Bytes.load();
   }
 } // namespace LumekTest
