@@ -4,9 +4,13 @@
 set -euo pipefail
 cd "$(dirname "$0")/.."
 
-build_dir=${BUILD_DIR:-build}
+# A sanitizer build has a folder of its own, so that switching does not rebuild the other.
 sanitize=OFF
-[ "${LUMEK_SANITIZE:-0}" = "1" ] && sanitize=ON
+build_dir=${BUILD_DIR:-build}
+if [ "${LUMEK_SANITIZE:-0}" = "1" ]; then
+  sanitize=ON
+  build_dir=${BUILD_DIR:-build-sanitize}
+fi
 generator=()
 command -v ninja >/dev/null && generator=(-G Ninja)
 

@@ -17,7 +17,14 @@ export XDG_RUNTIME_DIR="$scratch/runtime" XDG_CONFIG_HOME="$scratch/config" XDG_
 
 ./scripts/fuzz.sh "${LUMEK_FUZZ_SECONDS:-10}"
 
-ctest_args=(--test-dir "${BUILD_DIR:-build}" --output-on-failure -j "$(nproc)")
+build_dir=${BUILD_DIR:-build}
+if [ "${LUMEK_SANITIZE:-0}" = "1" ]; then
+  build_dir=${BUILD_DIR:-build-sanitize}
+  # Mesa and the X libraries keep a little memory to the end of the process; the display tests
+  # would report it as leaks of ours.
+  export ASAN_OPTIONS=${ASAN_OPTIONS:-detect_leaks=0}
+fi
+ctest_args=(--test-dir "$build_dir" --output-on-failure -j "$(nproc)")
 if [ -n "${DISPLAY:-}" ]; then
   ctest "${ctest_args[@]}"
 else

@@ -6,6 +6,7 @@
 
 #include <unistd.h>
 
+#include <csignal>
 #include <cstdio>
 #include <random>
 
@@ -53,6 +54,34 @@ namespace LumekVideoTool
       ZOL::WriteConversionRecords( Attributes, History );
       return Attributes;
     }
+
+    // An interrupted conversion removes its temporary file: no half recording is left behind.
+    char s_TemporaryPath[ 4096 ] = {};
+
+    void RemoveTemporaryAndExit( int i_Signal )
+    {
+      if( s_TemporaryPath[ 0 ] != 0 )
+        ::unlink( s_TemporaryPath );
+      std::signal( i_Signal, SIG_DFL );
+      std::raise( i_Signal );
+    }
+
+    class VInterruptGuard
+    {
+    public:
+      explicit VInterruptGuard( const std::string& i_rTemporary )
+      {
+        std::snprintf( s_TemporaryPath, sizeof( s_TemporaryPath ), "%s", i_rTemporary.c_str() );
+        for( int Signal : { SIGINT, SIGTERM, SIGHUP } )
+          std::signal( Signal, &RemoveTemporaryAndExit );
+      }
+      ~VInterruptGuard()
+      {
+        for( int Signal : { SIGINT, SIGTERM, SIGHUP } )
+          std::signal( Signal, SIG_DFL );
+        s_TemporaryPath[ 0 ] = 0;
+      }
+    };
 
     class VProgress
     {
@@ -131,6 +160,7 @@ namespace LumekVideoTool
     const std::string Temporary = Output + ".partial-" + std::to_string( Random() );
     const ZOL::IAudioFrameInfo Audio =
         Source.GetAudioPayload() == ZOL::AudioPayload_Uncompressed ? Source.GetAudioFrameInfo() : ZOL::IAudioFrameInfo();
+    const VInterruptGuard Guard( Temporary );
     LumekVideo::VWriter Writer;
     if( !Writer.Create( Temporary, OutputInfo, Audio,
                         ConvertedAttributes( Source, Input ) ) )

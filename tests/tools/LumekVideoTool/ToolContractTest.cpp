@@ -6,6 +6,11 @@
 
 #include <boost/algorithm/string/predicate.hpp>
 
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <csignal>
+
 using namespace LumekVideoToolTest;
 
 namespace
@@ -93,9 +98,13 @@ TEST( ToolInfo, ReportsWhatTheViewerShows )
     ASSERT_EQ( Pair.size(), 2u );
     Keys.push_back( Pair[ 0 ] );
     if( Pair[ 0 ] == "Test.Note" )
+    {
       EXPECT_EQ( Pair[ 1 ], "written by the tool's tests" );
+    }
     if( Pair[ 0 ] == "VideoFrameInfo.PixelFormat" )
+    {
       EXPECT_EQ( Pair[ 1 ], "BayerGB8" );
+    }
   }
   EXPECT_TRUE( std::is_sorted( Keys.begin(), Keys.end() ) );
   for( const char* pKey : { "Test.Note", "VideoFrameInfo.ImageWidth", "AudioFrameInfo.SampleRate", "GammaCorrection",
@@ -276,4 +285,54 @@ TEST( ToolMakeSample, WritesAPlayableRecording )
   const auto Quiet = ParseJson( RunTool( { "info", Scratch.Path( "quiet.lvid" ) } ).Out );
   EXPECT_EQ( Quiet.get< std::string >( "audio.payload" ), "None" );
   EXPECT_EQ( Quiet.get< std::string >( "video.pixelFormat" ), "U8Y8V8Y8" );
+}
+
+TEST( ToolConvert, AnInterruptedConversionLeavesNoHalfFile )
+{
+  VScratch Scratch;
+  VRecordingSpec Spec;
+  Spec.Width = 1280;
+  Spec.Height = 720;
+  Spec.Frames.clear();
+  for( std::uint64_t Frame = 0; Frame < 80; ++Frame )
+    Spec.Frames.push_back( Frame );
+  const std::string Input = WriteRecording( Scratch, "long.lvid", Spec );
+  const std::string Output = Scratch.Path( "converted.lvid" );
+
+  // Interrupt the conversion once its temporary file exists, as a user's Ctrl+C would.
+  const pid_t Child = fork();
+  ASSERT_GE( Child, 0 );
+  if( Child == 0 )
+  {
+    std::freopen( "/dev/null", "w", stderr );
+    execl( LUMEK_TOOL_PATH, LUMEK_TOOL_PATH, "convert", Input.c_str(), Output.c_str(), static_cast< char* >( nullptr ) );
+    _exit( 127 );
+  }
+  const auto HasPartial = [ & ] {
+    for( const auto& rEntry : boost::filesystem::directory_iterator( Scratch.Path( "" ) ) )
+      if( rEntry.path().string().find( ".partial" ) != std::string::npos )
+        return true;
+    return false;
+  };
+  bool bSawPartial = false;
+  for( int Poll = 0; Poll < 20000 && !bSawPartial; ++Poll )
+  {
+    bSawPartial = HasPartial();
+    if( !bSawPartial )
+      usleep( 100 );
+  }
+  kill( Child, SIGINT );
+  int Status = 0;
+  waitpid( Child, &Status, 0 );
+
+  EXPECT_FALSE( HasPartial() );
+  if( bSawPartial && WIFSIGNALED( Status ) )
+  {
+    EXPECT_FALSE( boost::filesystem::exists( Output ) );
+  }
+  else if( boost::filesystem::exists( Output ) )
+  {
+    // The conversion won the race and finished whole.
+    EXPECT_EQ( RunTool( { "info", Output } ).ExitCode, 0 );
+  }
 }

@@ -72,7 +72,9 @@ TEST( ToolMalformedInput, FlippedBytesNeverCrash )
       EXPECT_TRUE( Run.ExitCode == 0 || Run.ExitCode == 1 || Run.ExitCode == 3 )
           << pCommand << " trial " << Trial << " exit " << Run.ExitCode;
       if( std::string( pCommand ) == "info" && Run.ExitCode == 0 )
+      {
         ParseJson( Run.Out );
+      }
     }
   }
 }
