@@ -11,4 +11,4 @@ namespace DPIUtils
   float DPIRatio();
   // A length in design pixels, scaled to the display.
   int Scale( int i_Pixels );
-}
+} // namespace DPIUtils

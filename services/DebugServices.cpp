@@ -17,7 +17,10 @@ namespace DebugServices
     return i_pVersion != nullptr;
   }
 
-  const ZOL::IApplicationVersion* ApplicationVersion() { return s_pApplicationVersion; }
+  const ZOL::IApplicationVersion* ApplicationVersion()
+  {
+    return s_pApplicationVersion;
+  }
 
   void CallAssertFailHandler( const char* i_pExpression, const char* i_pFile, int i_Line )
   {
@@ -27,4 +30,4 @@ namespace DebugServices
   VCrashHandler::VCrashHandler( CompanyID i_Company, unsigned int i_Flags ) : m_Company( i_Company ), m_Flags( i_Flags )
   {
   }
-}
+} // namespace DebugServices

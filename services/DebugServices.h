@@ -39,7 +39,7 @@ namespace DebugServices
   private:
     const VCrashHandler& m_rHandler;
   };
-}
+} // namespace DebugServices
 
-#define LUMEK_ASSERT( EXPRESSION )                                                                 \
+#define LUMEK_ASSERT( EXPRESSION )                                                                                     \
   ( ( EXPRESSION ) ? true : ( DebugServices::CallAssertFailHandler( #EXPRESSION, __FILE__, __LINE__ ), false ) )

@@ -46,7 +46,7 @@ namespace
     const ZOL::ILogCategory& GetCategory( const std::string& i_rName ) override
     {
       std::lock_guard< std::mutex > Lock( m_Mutex );
-      auto& rpCategory = m_Categories[ i_rName ];
+      auto& rpCategory = m_Categories[i_rName];
       if( !rpCategory )
         rpCategory = std::make_unique< VLogCategory >( i_rName, m_Level );
       return *rpCategory;
@@ -60,8 +60,7 @@ namespace
         std::fprintf( stderr, "[%s:%d] %s\n", i_rCategory.GetName().c_str(), i_Level, i_rMessage.c_str() );
       if( m_Sinks.empty() )
         return;
-      ZOL::ILogRecord Record{ i_rMessage, i_rCategory.GetName(), i_Level, i_pSourceFile ? i_pSourceFile : "",
-                              i_Line };
+      ZOL::ILogRecord Record{ i_rMessage, i_rCategory.GetName(), i_Level, i_pSourceFile ? i_pSourceFile : "", i_Line };
       for( const auto& rSink : m_Sinks )
         if( i_Level <= rSink.Level )
           rSink.Sink( Record );
@@ -92,7 +91,7 @@ namespace
     {
       std::lock_guard< std::mutex > Lock( m_Mutex );
       m_Sinks.erase( std::remove_if( m_Sinks.begin(), m_Sinks.end(),
-                                     [ i_Handle ]( const VSink& rSink ) { return rSink.Handle == i_Handle; } ),
+                                     [i_Handle]( const VSink& rSink ) { return rSink.Handle == i_Handle; } ),
                      m_Sinks.end() );
       UpdateLevel();
     }
@@ -121,7 +120,7 @@ namespace
     int m_LastSinkHandle = 0;
     std::atomic< int > m_Level{ ZOL::LogWarning };
   };
-}
+} // namespace
 
 namespace ZOL
 {
@@ -142,4 +141,4 @@ namespace ZOL
       return "Cannot Format Log Message";
     }
   }
-}
+} // namespace ZOL

@@ -29,10 +29,10 @@ namespace ZOL
     const char* Trademark;
     const char* ProductKey;
   };
-}
+} // namespace ZOL
 
 namespace LumekVideoViewer
 {
   // The release record of this build of LumekVideoViewer and lumekvideotool.
   const ZOL::IApplicationVersion& ApplicationVersion();
-}
+} // namespace LumekVideoViewer

@@ -59,4 +59,4 @@ namespace ZOL
   };
 
   ILogCategorised& GlobalLog();
-}
+} // namespace ZOL

@@ -20,17 +20,17 @@ namespace ZOL
   {
     inline void FeedFormat( boost::format& ) {}
 
-    template< typename T, typename... Rest >
+    template < typename T, typename... Rest >
     void FeedFormat( boost::format& io_rFormat, const T& i_rValue, const Rest&... i_rRest )
     {
       io_rFormat % i_rValue;
       FeedFormat( io_rFormat, i_rRest... );
     }
-  }
+  } // namespace Detail
 
   std::string CannotFormatMessage( const char* i_pFormat );
 
-  template< typename... Args >
+  template < typename... Args >
   void LogFormatted( const ILogCategory& i_rCategory, int i_Level, const char* i_pFile, int i_Line,
                      const char* i_pFormat, const Args&... i_rArgs )
   {
@@ -49,12 +49,12 @@ namespace ZOL
     }
     GlobalLog().Log( Message, i_rCategory, Level, i_pFile, i_Line );
   }
-}
+} // namespace ZOL
 
-#define LUMEK_LOG( CATEGORY, LEVEL, ... )                                                          \
-  do                                                                                               \
-  {                                                                                                \
-    static const ZOL::ILogCategory& s_rLogCategory = ZOL::GlobalLog().GetCategory( CATEGORY );     \
-    if( s_rLogCategory.Enabled( LEVEL ) )                                                          \
-      ZOL::LogFormatted( s_rLogCategory, LEVEL, __FILE__, __LINE__, __VA_ARGS__ );                 \
+#define LUMEK_LOG( CATEGORY, LEVEL, ... )                                                                              \
+  do                                                                                                                   \
+  {                                                                                                                    \
+    static const ZOL::ILogCategory& s_rLogCategory = ZOL::GlobalLog().GetCategory( CATEGORY );                         \
+    if( s_rLogCategory.Enabled( LEVEL ) )                                                                              \
+      ZOL::LogFormatted( s_rLogCategory, LEVEL, __FILE__, __LINE__, __VA_ARGS__ );                                     \
   } while( false )

@@ -15,9 +15,9 @@ namespace LumekVideoViewer
     po::options_description Options( 80, 40 );
     const std::string ServerDescription = "Version check server - default is \"" + i_rDefaultServer + "\"";
     Options.add_options()( "developer", "Enable developer mode" )(
-        "version-server", po::value< std::string >()->default_value( i_rDefaultServer ), ServerDescription.c_str() )(
-        "spoof-version", po::value< std::string >()->default_value( "" ),
-        "Spoof the version (testing only). e.g. \"0.3.0.55914h\"" )(
+        "version-server", po::value< std::string >()->default_value( i_rDefaultServer ),
+        ServerDescription.c_str() )( "spoof-version", po::value< std::string >()->default_value( "" ),
+                                     "Spoof the version (testing only). e.g. \"0.3.0.55914h\"" )(
         "input-file", po::value< std::string >()->default_value( "" ), "input file" );
     po::positional_options_description Positional;
     Positional.add( "input-file", -1 );
@@ -27,7 +27,7 @@ namespace LumekVideoViewer
     std::vector< std::string > Arguments;
     for( int i = 1; i < i_ArgumentCount; ++i )
     {
-      const std::string Argument = i_pArguments[ i ];
+      const std::string Argument = i_pArguments[i];
       const bool bEmptyValue = Argument.size() > 3 && Argument.compare( 0, 2, "--" ) == 0 && Argument.back() == '=' &&
                                Argument.find( '=' ) == Argument.size() - 1;
       const std::string Name = bEmptyValue ? Argument.substr( 2, Argument.size() - 3 ) : std::string();
@@ -56,9 +56,9 @@ namespace LumekVideoViewer
     // The map's keys have no dashes, so this is false in every run: developer mode is kept out of
     // reach of the command line although the option is accepted.
     o_rCommandLine.bDeveloper = Variables.count( "--developer" ) != 0;
-    o_rCommandLine.VersionServer = Variables[ "version-server" ].as< std::string >();
-    o_rCommandLine.SpoofVersion = Variables[ "spoof-version" ].as< std::string >();
-    o_rCommandLine.InputFile = Variables[ "input-file" ].as< std::string >();
+    o_rCommandLine.VersionServer = Variables["version-server"].as< std::string >();
+    o_rCommandLine.SpoofVersion = Variables["spoof-version"].as< std::string >();
+    o_rCommandLine.InputFile = Variables["input-file"].as< std::string >();
     return 0;
   }
-}
+} // namespace LumekVideoViewer

@@ -20,4 +20,4 @@ namespace LumekVideoViewer
   // lines of the error to io_rErrors; there is no --help, so asking for it takes the error path.
   int ParseCommandLine( int i_ArgumentCount, const char* const* i_pArguments, const std::string& i_rDefaultServer,
                         VCommandLine& o_rCommandLine, std::ostream& io_rErrors );
-}
+} // namespace LumekVideoViewer

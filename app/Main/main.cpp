@@ -10,8 +10,8 @@ int main( int argc, char** argv )
   DebugServices::SetApplicationVersion( &LumekVideoViewer::ApplicationVersion() );
 
   LumekVideoViewer::VCommandLine CommandLine;
-  const int Result = LumekVideoViewer::ParseCommandLine( argc, argv, VersionCheck::DefaultVersionServer, CommandLine,
-                                                         std::cerr );
+  const int Result =
+      LumekVideoViewer::ParseCommandLine( argc, argv, VersionCheck::DefaultVersionServer, CommandLine, std::cerr );
   if( Result != 0 )
     return Result;
   return LumekVideoViewer::RunApplication( argc, argv, CommandLine );

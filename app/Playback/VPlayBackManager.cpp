@@ -119,7 +119,13 @@ namespace LumekVideoViewer
     }
   }
 
-  void VPlayBackManager::SetDropFrame( bool i_State ) { m_bDropFrames = i_State; }
+  void VPlayBackManager::SetDropFrame( bool i_State )
+  {
+    m_bDropFrames = i_State;
+  }
 
-  bool VPlayBackManager::IsPlaying() { return m_pTimer->isActive(); }
-}
+  bool VPlayBackManager::IsPlaying()
+  {
+    return m_pTimer->isActive();
+  }
+} // namespace LumekVideoViewer

@@ -59,4 +59,4 @@ namespace LumekVideoViewer
     QTimer* m_pTimer;
     TimeSource m_TimeSource;
   };
-}
+} // namespace LumekVideoViewer

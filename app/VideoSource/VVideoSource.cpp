@@ -114,9 +114,15 @@ namespace LumekVideoViewer
     return std::nullopt;
   }
 
-  std::uint64_t VVideoSource::GetFrameCount() const { return m_pReader->GetFrameCount(); }
+  std::uint64_t VVideoSource::GetFrameCount() const
+  {
+    return m_pReader->GetFrameCount();
+  }
 
-  double VVideoSource::GetFrameRate() const { return m_pReader->GetVideoTiming().GetFrameRate(); }
+  double VVideoSource::GetFrameRate() const
+  {
+    return m_pReader->GetVideoTiming().GetFrameRate();
+  }
 
   double VVideoSource::GetDurationInSeconds() const
   {
@@ -181,4 +187,4 @@ namespace LumekVideoViewer
   {
     return m_Lens != CoreLumekTypes::VLensDistortionCalibration() && m_Camera != CoreLumekTypes::VCameraHardware();
   }
-}
+} // namespace LumekVideoViewer

@@ -79,4 +79,4 @@ namespace LumekVideoViewer
     CoreLumekTypes::VCameraHardware m_Camera;
     ZOL::IAudioBuffers m_AudioScratch;
   };
-}
+} // namespace LumekVideoViewer

@@ -67,4 +67,4 @@ namespace LumekVideoViewer
     }
     return Rows;
   }
-}
+} // namespace LumekVideoViewer

@@ -30,4 +30,4 @@ namespace LumekVideoViewer
   // Every attribute of the file, with the audio, video and display records added in their
   // attribute form, in key order: the rows of the properties dialog.
   VPropertyRows ComposePropertyRows( const VVideoSource& i_rSource );
-}
+} // namespace LumekVideoViewer

@@ -56,11 +56,11 @@ namespace LumekVideoTool
     }
 
     // An interrupted conversion removes its temporary file: no half recording is left behind.
-    char s_TemporaryPath[ 4096 ] = {};
+    char s_TemporaryPath[4096] = {};
 
     void RemoveTemporaryAndExit( int i_Signal )
     {
-      if( s_TemporaryPath[ 0 ] != 0 )
+      if( s_TemporaryPath[0] != 0 )
         ::unlink( s_TemporaryPath );
       std::signal( i_Signal, SIG_DFL );
       std::raise( i_Signal );
@@ -79,7 +79,7 @@ namespace LumekVideoTool
       {
         for( int Signal : { SIGINT, SIGTERM, SIGHUP } )
           std::signal( Signal, SIG_DFL );
-        s_TemporaryPath[ 0 ] = 0;
+        s_TemporaryPath[0] = 0;
       }
     };
 
@@ -111,20 +111,20 @@ namespace LumekVideoTool
       bool m_bShown;
       int m_LastPercent = -1;
     };
-  }
+  } // namespace
 
   int RunConvert( const VArguments& i_rArguments, std::ostream& o_rOut, std::ostream& o_rErr )
   {
     po::options_description Options;
-    Options.add_options()( "input", po::value< std::string >()->required() )(
-        "output", po::value< std::string >()->required() );
+    Options.add_options()( "input", po::value< std::string >()->required() )( "output",
+                                                                              po::value< std::string >()->required() );
     po::positional_options_description Positional;
     Positional.add( "input", 1 ).add( "output", 1 );
     const auto Variables = ParseArguments( i_rArguments, Options, Positional, "convert", o_rErr );
     if( !Variables )
       return Exit_Usage;
-    const std::string Input = ( *Variables )[ "input" ].as< std::string >();
-    const std::string Output = ( *Variables )[ "output" ].as< std::string >();
+    const std::string Input = ( *Variables )["input"].as< std::string >();
+    const std::string Output = ( *Variables )["output"].as< std::string >();
     if( fs::path( Output ).extension() != ".lvid" )
     {
       o_rErr << "lumekvideotool convert: the output must be a .lvid file\n\n" << UsageText();
@@ -158,12 +158,12 @@ namespace LumekVideoTool
     // Written beside the output and renamed when complete, so a failed conversion leaves no half file.
     std::random_device Random;
     const std::string Temporary = Output + ".partial-" + std::to_string( Random() );
-    const ZOL::IAudioFrameInfo Audio =
-        Source.GetAudioPayload() == ZOL::AudioPayload_Uncompressed ? Source.GetAudioFrameInfo() : ZOL::IAudioFrameInfo();
+    const ZOL::IAudioFrameInfo Audio = Source.GetAudioPayload() == ZOL::AudioPayload_Uncompressed
+                                           ? Source.GetAudioFrameInfo()
+                                           : ZOL::IAudioFrameInfo();
     const VInterruptGuard Guard( Temporary );
     LumekVideo::VWriter Writer;
-    if( !Writer.Create( Temporary, OutputInfo, Audio,
-                        ConvertedAttributes( Source, Input ) ) )
+    if( !Writer.Create( Temporary, OutputInfo, Audio, ConvertedAttributes( Source, Input ) ) )
     {
       o_rErr << "Cannot create " << Temporary << std::endl;
       return Exit_CannotOpen;
@@ -192,8 +192,8 @@ namespace LumekVideoTool
         for( const auto& rpBlock : Frame.Audio )
           if( rpBlock )
             AudioBytes.insert( AudioBytes.end(), rpBlock->GetData(), rpBlock->GetData() + rpBlock->GetSize() );
-      if( !Writer.AppendFrame( Index, Frame.Video->GetData(), FrameSize, AudioBytes.empty() ? nullptr : AudioBytes.data(),
-                               AudioBytes.size() ) )
+      if( !Writer.AppendFrame( Index, Frame.Video->GetData(), FrameSize,
+                               AudioBytes.empty() ? nullptr : AudioBytes.data(), AudioBytes.size() ) )
       {
         o_rErr << "Cannot write frame " << Index << " to " << Temporary << std::endl;
         Writer.Close();
@@ -210,4 +210,4 @@ namespace LumekVideoTool
     }
     return bAllCopied ? Exit_Success : Exit_FramesFailed;
   }
-}
+} // namespace LumekVideoTool

@@ -8,10 +8,19 @@ namespace LumekVideoTool
 {
   namespace
   {
-    std::uint8_t Clamp( int i_Value ) { return static_cast< std::uint8_t >( std::min( 255, std::max( 0, i_Value ) ) ); }
+    std::uint8_t Clamp( int i_Value )
+    {
+      return static_cast< std::uint8_t >( std::min( 255, std::max( 0, i_Value ) ) );
+    }
 
-    int ChromaU( int R, int G, int B ) { return ( 28573 * B - 9642 * R - 18930 * G + 0x800000 ) >> 16; }
-    int ChromaV( int R, int G, int B ) { return ( 40304 * R - 33750 * G - 6554 * B + 0x800000 ) >> 16; }
+    int ChromaU( int R, int G, int B )
+    {
+      return ( 28573 * B - 9642 * R - 18930 * G + 0x800000 ) >> 16;
+    }
+    int ChromaV( int R, int G, int B )
+    {
+      return ( 40304 * R - 33750 * G - 6554 * B + 0x800000 ) >> 16;
+    }
 
     // Samples of i_Bits bits, most significant bit first, with no gaps between samples or rows.
     std::vector< std::uint8_t > PackSamples( const std::vector< std::uint8_t >& i_rSamples, int i_Bits,
@@ -24,7 +33,7 @@ namespace LumekVideoTool
         const unsigned Value = Sample >> ( 8 - i_Bits );
         for( int Bit = i_Bits - 1; Bit >= 0; --Bit, ++BitPosition )
           if( ( Value >> Bit ) & 1u )
-            Packed[ BitPosition / 8 ] |= static_cast< std::uint8_t >( 0x80u >> ( BitPosition % 8 ) );
+            Packed[BitPosition / 8] |= static_cast< std::uint8_t >( 0x80u >> ( BitPosition % 8 ) );
       }
       return Packed;
     }
@@ -34,8 +43,8 @@ namespace LumekVideoTool
       std::vector< std::uint8_t > Sites( static_cast< std::size_t >( i_rImage.Width ) * i_rImage.Height );
       for( int y = 0; y < i_rImage.Height; ++y )
         for( int x = 0; x < i_rImage.Width; ++x )
-          Sites[ static_cast< std::size_t >( y ) * i_rImage.Width + x ] =
-              i_rImage.At( x, y )[ BayerChannelAt( i_Format, x, y ) ];
+          Sites[static_cast< std::size_t >( y ) * i_rImage.Width + x] =
+              i_rImage.At( x, y )[BayerChannelAt( i_Format, x, y )];
       return Sites;
     }
 
@@ -46,7 +55,7 @@ namespace LumekVideoTool
         for( int x = 0; x < i_rImage.Width; ++x )
         {
           const std::uint8_t* p = i_rImage.At( x, y );
-          Values[ static_cast< std::size_t >( y ) * i_rImage.Width + x ] = Luma( p[ 0 ], p[ 1 ], p[ 2 ] );
+          Values[static_cast< std::size_t >( y ) * i_rImage.Width + x] = Luma( p[0], p[1], p[2] );
         }
       return Values;
     }
@@ -70,11 +79,11 @@ namespace LumekVideoTool
           const std::uint8_t* p0 = i_rImage.At( x, y );
           const std::uint8_t* p1 = i_rImage.At( x + 1, y );
           const std::size_t i = static_cast< std::size_t >( y ) * i_rImage.Width + x;
-          Result.Y[ i ] = Luma( p0[ 0 ], p0[ 1 ], p0[ 2 ] );
-          Result.Y[ i + 1 ] = Luma( p1[ 0 ], p1[ 1 ], p1[ 2 ] );
-          const int R = ( p0[ 0 ] + p1[ 0 ] + 1 ) / 2, G = ( p0[ 1 ] + p1[ 1 ] + 1 ) / 2, B = ( p0[ 2 ] + p1[ 2 ] + 1 ) / 2;
-          Result.U[ i / 2 ] = Clamp( ChromaU( R, G, B ) );
-          Result.V[ i / 2 ] = Clamp( ChromaV( R, G, B ) );
+          Result.Y[i] = Luma( p0[0], p0[1], p0[2] );
+          Result.Y[i + 1] = Luma( p1[0], p1[1], p1[2] );
+          const int R = ( p0[0] + p1[0] + 1 ) / 2, G = ( p0[1] + p1[1] + 1 ) / 2, B = ( p0[2] + p1[2] + 1 ) / 2;
+          Result.U[i / 2] = Clamp( ChromaU( R, G, B ) );
+          Result.V[i / 2] = Clamp( ChromaV( R, G, B ) );
         }
       return Result;
     }
@@ -93,10 +102,10 @@ namespace LumekVideoTool
         for( int x = 0; x < i_rImage.Width; x += 2 )
         {
           const std::size_t i = static_cast< std::size_t >( y ) * i_rImage.Width + x;
-          Samples.push_back( static_cast< unsigned >( YUV.U[ i / 2 ] ) << 2 );
-          Samples.push_back( static_cast< unsigned >( YUV.Y[ i ] ) << 2 );
-          Samples.push_back( static_cast< unsigned >( YUV.V[ i / 2 ] ) << 2 );
-          Samples.push_back( static_cast< unsigned >( YUV.Y[ i + 1 ] ) << 2 );
+          Samples.push_back( static_cast< unsigned >( YUV.U[i / 2] ) << 2 );
+          Samples.push_back( static_cast< unsigned >( YUV.Y[i] ) << 2 );
+          Samples.push_back( static_cast< unsigned >( YUV.V[i / 2] ) << 2 );
+          Samples.push_back( static_cast< unsigned >( YUV.Y[i + 1] ) << 2 );
         }
         std::uint8_t* pRow = Frame.data() + RowBytes * y;
         for( std::size_t s = 0; s < Samples.size(); ++s )
@@ -105,15 +114,15 @@ namespace LumekVideoTool
           const unsigned Shift = static_cast< unsigned >( s % 3 ) * 10;
           std::uint32_t Value = 0;
           for( int b = 0; b < 4; ++b )
-            Value |= static_cast< std::uint32_t >( pRow[ Word * 4 + b ] ) << ( 8 * b );
-          Value |= ( Samples[ s ] & 0x3FFu ) << Shift;
+            Value |= static_cast< std::uint32_t >( pRow[Word * 4 + b] ) << ( 8 * b );
+          Value |= ( Samples[s] & 0x3FFu ) << Shift;
           for( int b = 0; b < 4; ++b )
-            pRow[ Word * 4 + b ] = static_cast< std::uint8_t >( Value >> ( 8 * b ) );
+            pRow[Word * 4 + b] = static_cast< std::uint8_t >( Value >> ( 8 * b ) );
         }
       }
       return Frame;
     }
-  }
+  } // namespace
 
   std::uint8_t Luma( int i_R, int i_G, int i_B )
   {
@@ -140,8 +149,8 @@ namespace LumekVideoTool
       break;
     }
     const int Kind = ( Start ^ ( ( i_Y & 1 ) ? 3 : 0 ) ) ^ ( i_X & 1 );
-    static const int s_Channel[ 4 ] = { 0, 1, 2, 1 };
-    return s_Channel[ Kind ];
+    static const int s_Channel[4] = { 0, 1, 2, 1 };
+    return s_Channel[Kind];
   }
 
   std::vector< std::uint8_t > EncodeFrame( const VRGBImage& i_rImage, ZOL::EPixelFormat i_Format )
@@ -178,9 +187,9 @@ namespace LumekVideoTool
       for( std::size_t i = 0; i < Pixels; ++i )
       {
         const std::uint8_t* p = i_rImage.Pixels.data() + i * 3;
-        const unsigned Value = ( ( p[ 0 ] >> 3 ) << 11 ) | ( ( p[ 1 ] >> 2 ) << 5 ) | ( p[ 2 ] >> 3 );
-        Frame[ i * 2 ] = static_cast< std::uint8_t >( Value & 0xFF );
-        Frame[ i * 2 + 1 ] = static_cast< std::uint8_t >( Value >> 8 );
+        const unsigned Value = ( ( p[0] >> 3 ) << 11 ) | ( ( p[1] >> 2 ) << 5 ) | ( p[2] >> 3 );
+        Frame[i * 2] = static_cast< std::uint8_t >( Value & 0xFF );
+        Frame[i * 2 + 1] = static_cast< std::uint8_t >( Value >> 8 );
       }
       return Frame;
     case ZOL::PixelFormat_R8G8B8:
@@ -196,9 +205,9 @@ namespace LumekVideoTool
       {
         const std::uint8_t* p = i_rImage.Pixels.data() + i * 3;
         std::uint8_t* q = Frame.data() + i * Step;
-        q[ 0 ] = bBGR ? p[ 2 ] : p[ 0 ];
-        q[ 1 ] = p[ 1 ];
-        q[ 2 ] = bBGR ? p[ 0 ] : p[ 2 ];
+        q[0] = bBGR ? p[2] : p[0];
+        q[1] = p[1];
+        q[2] = bBGR ? p[0] : p[2];
       }
       return Frame;
     }
@@ -212,22 +221,22 @@ namespace LumekVideoTool
       Frame.resize( Size );
       for( std::size_t i = 0; i < Pixels; i += 2 )
       {
-        const auto Y0 = static_cast< std::uint8_t >( YUV.Y[ i ] ), Y1 = static_cast< std::uint8_t >( YUV.Y[ i + 1 ] );
-        const auto U = static_cast< std::uint8_t >( YUV.U[ i / 2 ] ), V = static_cast< std::uint8_t >( YUV.V[ i / 2 ] );
+        const auto Y0 = static_cast< std::uint8_t >( YUV.Y[i] ), Y1 = static_cast< std::uint8_t >( YUV.Y[i + 1] );
+        const auto U = static_cast< std::uint8_t >( YUV.U[i / 2] ), V = static_cast< std::uint8_t >( YUV.V[i / 2] );
         if( i_Format == ZOL::PixelFormat_PlanarY8U8V8 )
         {
-          Frame[ i ] = Y0;
-          Frame[ i + 1 ] = Y1;
-          Frame[ Pixels + i / 2 ] = U;
-          Frame[ Pixels + Pixels / 2 + i / 2 ] = V;
+          Frame[i] = Y0;
+          Frame[i + 1] = Y1;
+          Frame[Pixels + i / 2] = U;
+          Frame[Pixels + Pixels / 2 + i / 2] = V;
           continue;
         }
         std::uint8_t* q = Frame.data() + i * 2;
         const bool bUFirst = i_Format == ZOL::PixelFormat_U8Y8V8Y8;
-        q[ 0 ] = bUFirst ? U : Y0;
-        q[ 1 ] = bUFirst ? Y0 : U;
-        q[ 2 ] = bUFirst ? V : Y1;
-        q[ 3 ] = bUFirst ? Y1 : V;
+        q[0] = bUFirst ? U : Y0;
+        q[1] = bUFirst ? Y0 : U;
+        q[2] = bUFirst ? V : Y1;
+        q[3] = bUFirst ? Y1 : V;
       }
       return Frame;
     }
@@ -239,10 +248,10 @@ namespace LumekVideoTool
       Frame.resize( Size );
       for( std::size_t i = 0; i < Pixels; ++i )
         for( std::size_t c = 0; c < 3; ++c )
-          Frame[ c * Pixels + i ] = i_rImage.Pixels[ i * 3 + c ];
+          Frame[c * Pixels + i] = i_rImage.Pixels[i * 3 + c];
       return Frame;
     default:
       return Frame;
     }
   }
-}
+} // namespace LumekVideoTool

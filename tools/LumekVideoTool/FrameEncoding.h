@@ -26,7 +26,10 @@ namespace LumekVideoTool
     {
       return Pixels.data() + ( static_cast< std::size_t >( i_Y ) * Width + i_X ) * 3;
     }
-    std::uint8_t* At( int i_X, int i_Y ) { return Pixels.data() + ( static_cast< std::size_t >( i_Y ) * Width + i_X ) * 3; }
+    std::uint8_t* At( int i_X, int i_Y )
+    {
+      return Pixels.data() + ( static_cast< std::size_t >( i_Y ) * Width + i_X ) * 3;
+    }
   };
 
   // The frame bytes of the image in the format; empty for format 0 or an odd width where the
@@ -38,4 +41,4 @@ namespace LumekVideoTool
 
   // Luma of the system's RGB to YUV rule.
   std::uint8_t Luma( int i_R, int i_G, int i_B );
-}
+} // namespace LumekVideoTool

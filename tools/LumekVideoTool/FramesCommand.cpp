@@ -67,7 +67,7 @@ namespace LumekVideoTool
       getrusage( RUSAGE_SELF, &Usage );
       return Usage.ru_maxrss / 1024.0; // kilobytes on Linux
     }
-  }
+  } // namespace
 
   int RunFrames( const VArguments& i_rArguments, std::ostream& o_rOut, std::ostream& o_rErr )
   {
@@ -80,16 +80,16 @@ namespace LumekVideoTool
     const auto Variables = ParseArguments( i_rArguments, Options, Positional, "frames", o_rErr );
     if( !Variables )
       return Exit_Usage;
-    const std::string Path = ( *Variables )[ "file" ].as< std::string >();
-    const std::string OutDir = ( *Variables )[ "outdir" ].as< std::string >();
-    const std::uint64_t First = ( *Variables )[ "first" ].as< std::uint64_t >();
-    const bool bPNG = ( *Variables )[ "png" ].as< bool >();
+    const std::string Path = ( *Variables )["file"].as< std::string >();
+    const std::string OutDir = ( *Variables )["outdir"].as< std::string >();
+    const std::uint64_t First = ( *Variables )["first"].as< std::uint64_t >();
+    const bool bPNG = ( *Variables )["png"].as< bool >();
 
     LumekVideoViewer::VVideoSource Source;
     if( !OpenSource( Source, Path, o_rErr ) )
       return Exit_CannotOpen;
     const std::uint64_t FrameCount = Source.GetFrameCount();
-    const std::uint64_t Count = Variables->count( "count" ) ? ( *Variables )[ "count" ].as< std::uint64_t >()
+    const std::uint64_t Count = Variables->count( "count" ) ? ( *Variables )["count"].as< std::uint64_t >()
                                                             : ( First < FrameCount ? FrameCount - First : 0 );
 
     boost::system::error_code Error;
@@ -151,14 +151,14 @@ namespace LumekVideoTool
     const auto Variables = ParseArguments( i_rArguments, Options, Positional, "bench", o_rErr );
     if( !Variables )
       return Exit_Usage;
-    const std::string Path = ( *Variables )[ "file" ].as< std::string >();
-    const bool bSoftware = ( *Variables )[ "software" ].as< bool >();
+    const std::string Path = ( *Variables )["file"].as< std::string >();
+    const bool bSoftware = ( *Variables )["software"].as< bool >();
 
     LumekVideoViewer::VVideoSource Source;
     if( !OpenSource( Source, Path, o_rErr ) )
       return Exit_CannotOpen;
     const std::uint64_t Frames =
-        Variables->count( "frames" ) ? ( *Variables )[ "frames" ].as< std::uint64_t >() : Source.GetFrameCount();
+        Variables->count( "frames" ) ? ( *Variables )["frames"].as< std::uint64_t >() : Source.GetFrameCount();
 
     CoreVideoUtils::VPixelFormatConverter Converter;
     Converter.SetVideoSettings( Source.GetVideoSettings() );
@@ -190,4 +190,4 @@ namespace LumekVideoTool
       o_rErr << Failed << " frames could not be read or decoded." << std::endl;
     return Failed == 0 ? Exit_Success : Exit_FramesFailed;
   }
-}
+} // namespace LumekVideoTool

@@ -52,7 +52,7 @@ namespace LumekVideoTool
       io_rJson.EndArray();
       io_rJson.EndObject();
     }
-  }
+  } // namespace
 
   int RunInfo( const VArguments& i_rArguments, std::ostream& o_rOut, std::ostream& o_rErr )
   {
@@ -64,8 +64,8 @@ namespace LumekVideoTool
     const auto Variables = ParseArguments( i_rArguments, Options, Positional, "info", o_rErr );
     if( !Variables )
       return Exit_Usage;
-    const std::string Path = ( *Variables )[ "file" ].as< std::string >();
-    const std::uint64_t Index = ( *Variables )[ "frame" ].as< std::uint64_t >();
+    const std::string Path = ( *Variables )["file"].as< std::string >();
+    const std::uint64_t Index = ( *Variables )["frame"].as< std::uint64_t >();
 
     LumekVideoViewer::VVideoSource Source;
     if( !OpenSource( Source, Path, o_rErr ) )
@@ -106,7 +106,7 @@ namespace LumekVideoTool
     const auto Variables = ParseArguments( i_rArguments, Options, Positional, "dump", o_rErr );
     if( !Variables )
       return Exit_Usage;
-    const std::string Path = ( *Variables )[ "file" ].as< std::string >();
+    const std::string Path = ( *Variables )["file"].as< std::string >();
 
     LumekVideoViewer::VVideoSource Source;
     if( !OpenSource( Source, Path, o_rErr ) )
@@ -118,4 +118,4 @@ namespace LumekVideoTool
     }
     return Exit_Success;
   }
-}
+} // namespace LumekVideoTool

@@ -95,7 +95,7 @@ namespace LumekVideoTool
       m_Text += "null";
       return *this;
     }
-    char Buffer[ 32 ];
+    char Buffer[32];
     std::snprintf( Buffer, sizeof( Buffer ), "%.15g", i_Value );
     m_Text += Buffer;
     return *this;
@@ -107,7 +107,7 @@ namespace LumekVideoTool
     // bytes, and the report must stay valid JSON.
     std::size_t Utf8SequenceLength( const std::string& i_rText, std::size_t i )
     {
-      const auto Lead = static_cast< unsigned char >( i_rText[ i ] );
+      const auto Lead = static_cast< unsigned char >( i_rText[i] );
       std::size_t Length = 0;
       std::uint32_t CodePoint = 0;
       if( Lead >= 0xC2 && Lead <= 0xDF )
@@ -122,24 +122,24 @@ namespace LumekVideoTool
         return 0;
       for( std::size_t k = 1; k < Length; ++k )
       {
-        const auto Next = static_cast< unsigned char >( i_rText[ i + k ] );
+        const auto Next = static_cast< unsigned char >( i_rText[i + k] );
         if( ( Next & 0xC0u ) != 0x80u )
           return 0;
         CodePoint = ( CodePoint << 6 ) | ( Next & 0x3Fu );
       }
-      static const std::uint32_t s_Smallest[ 5 ] = { 0, 0, 0x80, 0x800, 0x10000 };
-      if( CodePoint < s_Smallest[ Length ] || CodePoint > 0x10FFFF || ( CodePoint >= 0xD800 && CodePoint <= 0xDFFF ) )
+      static const std::uint32_t s_Smallest[5] = { 0, 0, 0x80, 0x800, 0x10000 };
+      if( CodePoint < s_Smallest[Length] || CodePoint > 0x10FFFF || ( CodePoint >= 0xD800 && CodePoint <= 0xDFFF ) )
         return 0;
       return Length;
     }
-  }
+  } // namespace
 
   std::string VJsonWriter::Quote( const std::string& i_rText )
   {
     std::string Quoted = "\"";
     for( std::size_t i = 0; i < i_rText.size(); ++i )
     {
-      const auto c = static_cast< unsigned char >( i_rText[ i ] );
+      const auto c = static_cast< unsigned char >( i_rText[i] );
       if( c >= 0x80 )
       {
         const std::size_t Length = Utf8SequenceLength( i_rText, i );
@@ -172,7 +172,7 @@ namespace LumekVideoTool
       default:
         if( c < 0x20 )
         {
-          char Buffer[ 8 ];
+          char Buffer[8];
           std::snprintf( Buffer, sizeof( Buffer ), "\\u%04x", c );
           Quoted += Buffer;
         }
@@ -183,4 +183,4 @@ namespace LumekVideoTool
     Quoted += '"';
     return Quoted;
   }
-}
+} // namespace LumekVideoTool

@@ -36,4 +36,4 @@ namespace LumekVideoTool
     std::vector< bool > m_First; // per open object or array: nothing written in it yet
     bool m_bAfterKey = false;
   };
-}
+} // namespace LumekVideoTool

@@ -22,9 +22,9 @@ namespace LumekVideoTool
     const auto Variables = ParseArguments( i_rArguments, Options, Positional, "make-sample", o_rErr );
     if( !Variables )
       return Exit_Usage;
-    if( ( *Variables )[ "no-audio" ].as< bool >() )
+    if( ( *Variables )["no-audio"].as< bool >() )
       Sample.bAudio = false;
-    const std::string FormatName = ( *Variables )[ "format" ].as< std::string >();
+    const std::string FormatName = ( *Variables )["format"].as< std::string >();
     if( !ZOL::FromString( FormatName, Sample.Format ) || Sample.Format == ZOL::PixelFormat_Unspecified )
     {
       o_rErr << "lumekvideotool make-sample: unknown pixel format '" << FormatName << "'\n\n" << UsageText();
@@ -39,11 +39,11 @@ namespace LumekVideoTool
     }
 
     std::string Error;
-    if( !WriteSampleRecording( ( *Variables )[ "output" ].as< std::string >(), Sample, Error ) )
+    if( !WriteSampleRecording( ( *Variables )["output"].as< std::string >(), Sample, Error ) )
     {
       o_rErr << "lumekvideotool make-sample: " << Error << std::endl;
       return Exit_CannotOpen;
     }
     return Exit_Success;
   }
-}
+} // namespace LumekVideoTool

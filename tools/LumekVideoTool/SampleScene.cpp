@@ -23,14 +23,14 @@ namespace LumekVideoTool
       return static_cast< std::uint8_t >( std::lround( std::min( 1.0, std::max( 0.0, i_Value ) ) * 255.0 ) );
     }
 
-    void Blend( std::uint8_t* io_pPixel, const double i_Colour[ 3 ], double i_Alpha )
+    void Blend( std::uint8_t* io_pPixel, const double i_Colour[3], double i_Alpha )
     {
       for( int c = 0; c < 3; ++c )
-        io_pPixel[ c ] = ToByte( io_pPixel[ c ] / 255.0 * ( 1.0 - i_Alpha ) + i_Colour[ c ] * i_Alpha );
+        io_pPixel[c] = ToByte( io_pPixel[c] / 255.0 * ( 1.0 - i_Alpha ) + i_Colour[c] * i_Alpha );
     }
 
     // A soft-edged disc, touching only the pixels of its bounding box.
-    void DrawDisc( VRGBImage& io_rImage, double i_X, double i_Y, double i_Radius, const double i_Colour[ 3 ] )
+    void DrawDisc( VRGBImage& io_rImage, double i_X, double i_Y, double i_Radius, const double i_Colour[3] )
     {
       const int X0 = std::max( 0, static_cast< int >( i_X - i_Radius - 2 ) );
       const int X1 = std::min( io_rImage.Width - 1, static_cast< int >( i_X + i_Radius + 2 ) );
@@ -45,12 +45,12 @@ namespace LumekVideoTool
           {
             // A little shading so the discs read as spheres.
             const double Light = 0.75 + 0.25 * ( 1.0 - Distance / std::max( 1.0, i_Radius ) );
-            const double Shaded[ 3 ] = { i_Colour[ 0 ] * Light, i_Colour[ 1 ] * Light, i_Colour[ 2 ] * Light };
+            const double Shaded[3] = { i_Colour[0] * Light, i_Colour[1] * Light, i_Colour[2] * Light };
             Blend( io_rImage.At( x, y ), Shaded, Alpha );
           }
         }
     }
-  }
+  } // namespace
 
   void RenderSampleScene( int i_FrameIndex, double i_FramesPerSecond, VRGBImage& io_rImage )
   {
@@ -66,7 +66,7 @@ namespace LumekVideoTool
     {
       const double u = static_cast< double >( x ) / W;
       for( int c = 0; c < 3; ++c )
-        Column[ x * 3 + c ] = 0.5 + 0.5 * std::cos( 2.0 * Pi * ( 0.08 * t + 0.7 * u + c / 3.0 ) );
+        Column[x * 3 + c] = 0.5 + 0.5 * std::cos( 2.0 * Pi * ( 0.08 * t + 0.7 * u + c / 3.0 ) );
     }
     const double GridStep = std::max( 8.0, H / 12.0 );
     for( int y = 0; y < H; ++y )
@@ -80,25 +80,26 @@ namespace LumekVideoTool
         const bool bGrid = bGridRow || std::fmod( x, GridStep ) < 1.0;
         const double Lift = bGrid ? 0.10 : 0.0;
         for( int c = 0; c < 3; ++c )
-          p[ c ] = ToByte( Column[ x * 3 + c ] * Shade + Lift );
+          p[c] = ToByte( Column[x * 3 + c] * Shade + Lift );
       }
     }
 
     // A bar sweeping across, soft at its edges: motion that shows dropped or repeated frames.
     const double BarCentre = std::fmod( t * 0.25, 1.0 ) * ( W + W * 0.1 ) - W * 0.05;
     const double BarHalf = std::max( 2.0, W * 0.012 );
-    const double White[ 3 ] = { 0.95, 0.95, 0.92 };
+    const double White[3] = { 0.95, 0.95, 0.92 };
     for( int x = std::max( 0, static_cast< int >( BarCentre - BarHalf - 2 ) );
          x <= std::min( W - 1, static_cast< int >( BarCentre + BarHalf + 2 ) ); ++x )
     {
-      const double Alpha = 0.55 * ( 1.0 - SmoothStep( BarHalf - 1.5, BarHalf + 0.5, std::fabs( x + 0.5 - BarCentre ) ) );
+      const double Alpha =
+          0.55 * ( 1.0 - SmoothStep( BarHalf - 1.5, BarHalf + 0.5, std::fabs( x + 0.5 - BarCentre ) ) );
       if( Alpha > 0.0 )
         for( int y = 0; y < H * 4 / 5; ++y )
           Blend( io_rImage.At( x, y ), White, Alpha );
     }
 
     // Discs of saturated colour on orbits of different speeds.
-    static const double s_Colours[ 5 ][ 3 ] = {
+    static const double s_Colours[5][3] = {
         { 0.95, 0.25, 0.20 }, { 0.20, 0.85, 0.35 }, { 0.25, 0.45, 0.95 }, { 0.98, 0.80, 0.15 }, { 0.85, 0.30, 0.90 } };
     const double Radius = std::max( 3.0, std::min( W, H ) * 0.07 );
     for( int i = 0; i < 5; ++i )
@@ -106,14 +107,13 @@ namespace LumekVideoTool
       const double Phase = t * ( 0.35 + 0.12 * i ) * 2.0 * Pi + i * 1.3;
       const double X = W * ( 0.5 + ( 0.30 + 0.03 * i ) * std::cos( Phase ) );
       const double Y = H * ( 0.42 + ( 0.22 - 0.02 * i ) * std::sin( Phase * ( i % 2 ? 1.0 : -1.0 ) ) );
-      DrawDisc( io_rImage, X, Y, Radius * ( 1.0 - 0.08 * i ), s_Colours[ i ] );
+      DrawDisc( io_rImage, X, Y, Radius * ( 1.0 - 0.08 * i ), s_Colours[i] );
     }
 
     // Reference strip: primaries and secondaries, then grey steps.
-    static const std::uint8_t s_Patches[ 12 ][ 3 ] = { { 255, 0, 0 },     { 0, 255, 0 },     { 0, 0, 255 },
-                                                       { 0, 255, 255 },   { 255, 0, 255 },   { 255, 255, 0 },
-                                                       { 0, 0, 0 },       { 51, 51, 51 },    { 102, 102, 102 },
-                                                       { 153, 153, 153 }, { 204, 204, 204 }, { 255, 255, 255 } };
+    static const std::uint8_t s_Patches[12][3] = {
+        { 255, 0, 0 }, { 0, 255, 0 },  { 0, 0, 255 },     { 0, 255, 255 },   { 255, 0, 255 },   { 255, 255, 0 },
+        { 0, 0, 0 },   { 51, 51, 51 }, { 102, 102, 102 }, { 153, 153, 153 }, { 204, 204, 204 }, { 255, 255, 255 } };
     const int StripTop = H * 17 / 20, StripBottom = H * 19 / 20;
     for( int y = StripTop; y < StripBottom; ++y )
       for( int x = 0; x < W; ++x )
@@ -121,7 +121,7 @@ namespace LumekVideoTool
         const int Patch = std::min( 11, x * 12 / W );
         std::uint8_t* p = io_rImage.At( x, y );
         for( int c = 0; c < 3; ++c )
-          p[ c ] = s_Patches[ Patch ][ c ];
+          p[c] = s_Patches[Patch][c];
       }
   }
 
@@ -132,12 +132,14 @@ namespace LumekVideoTool
       return Bytes;
     // Frames share the samples out so that no sample is lost to rounding.
     const auto First = static_cast< std::int64_t >( std::floor( i_FrameIndex * i_SampleRate / i_FramesPerSecond ) );
-    const auto Next = static_cast< std::int64_t >( std::floor( ( i_FrameIndex + 1 ) * i_SampleRate / i_FramesPerSecond ) );
+    const auto Next =
+        static_cast< std::int64_t >( std::floor( ( i_FrameIndex + 1 ) * i_SampleRate / i_FramesPerSecond ) );
     Bytes.reserve( static_cast< std::size_t >( Next - First ) * 4 );
     for( std::int64_t n = First; n < Next; ++n )
     {
       const double Time = static_cast< double >( n ) / i_SampleRate;
-      const double Samples[ 2 ] = { 0.25 * std::sin( 2.0 * Pi * 440.0 * Time ), 0.25 * std::sin( 2.0 * Pi * 660.0 * Time ) };
+      const double Samples[2] = { 0.25 * std::sin( 2.0 * Pi * 440.0 * Time ),
+                                  0.25 * std::sin( 2.0 * Pi * 660.0 * Time ) };
       for( double Sample : Samples )
       {
         const auto Value = static_cast< std::int16_t >( std::lround( Sample * 32767.0 ) );
@@ -150,7 +152,8 @@ namespace LumekVideoTool
 
   bool WriteSampleRecording( const std::string& i_rPath, const VSampleOptions& i_rOptions, std::string& o_rError )
   {
-    if( i_rOptions.Width <= 0 || i_rOptions.Height <= 0 || i_rOptions.Frames <= 0 || !( i_rOptions.FramesPerSecond > 0.0 ) )
+    if( i_rOptions.Width <= 0 || i_rOptions.Height <= 0 || i_rOptions.Frames <= 0 ||
+        !( i_rOptions.FramesPerSecond > 0.0 ) )
     {
       o_rError = "width, height, frames and fps must be positive";
       return false;
@@ -195,7 +198,8 @@ namespace LumekVideoTool
     // A mild barrel distortion about the sensor's centre: a few pixels at the corners.
     CoreLumekTypes::VLensDistortionCalibration Lens;
     Lens.RadialModel = ZOL::RadialModel_Lumek3Parameter;
-    const double HalfDiagonalSquared = ( i_rOptions.Width * i_rOptions.Width + i_rOptions.Height * i_rOptions.Height ) / 4.0;
+    const double HalfDiagonalSquared =
+        ( i_rOptions.Width * i_rOptions.Width + i_rOptions.Height * i_rOptions.Height ) / 4.0;
     Lens.RadialDistortionParameters = { -0.02 / HalfDiagonalSquared, 0.0, 0.0 };
     Lens.RadialDistortionCentre_X = i_rOptions.Width / 2.0;
     Lens.RadialDistortionCentre_Y = i_rOptions.Height / 2.0;
@@ -220,8 +224,8 @@ namespace LumekVideoTool
       const std::vector< std::uint8_t > Bytes = EncodeFrame( Image, i_rOptions.Format );
       if( Bytes.empty() )
       {
-        o_rError = std::string( "cannot encode frames of format " ) + ZOL::ToString( i_rOptions.Format ) +
-                   " at this width";
+        o_rError =
+            std::string( "cannot encode frames of format " ) + ZOL::ToString( i_rOptions.Format ) + " at this width";
         return false;
       }
       std::vector< std::uint8_t > Tone;
@@ -241,4 +245,4 @@ namespace LumekVideoTool
     }
     return true;
   }
-}
+} // namespace LumekVideoTool

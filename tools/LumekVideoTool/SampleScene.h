@@ -31,4 +31,4 @@ namespace LumekVideoTool
   // calibration, the tone, and two frames in the middle left out of the index so that missing
   // frames can be seen. False with a reason in o_rError.
   bool WriteSampleRecording( const std::string& i_rPath, const VSampleOptions& i_rOptions, std::string& o_rError );
-}
+} // namespace LumekVideoTool

@@ -36,7 +36,8 @@ namespace LumekVideoTool
     std::vector< std::string > Reasons;
     std::mutex ReasonsMutex;
     const int Sink = ZOL::GlobalLog().AddSink(
-        [ & ]( const ZOL::ILogRecord& i_rRecord ) {
+        [&]( const ZOL::ILogRecord& i_rRecord )
+        {
           std::lock_guard< std::mutex > Lock( ReasonsMutex );
           Reasons.push_back( i_rRecord.Message );
         },
@@ -75,23 +76,23 @@ namespace LumekVideoTool
   {
     using Command = int ( * )( const VArguments&, std::ostream&, std::ostream& );
     static const std::map< std::string, Command > s_Commands = {
-        { "info", &RunInfo },   { "frames", &RunFrames },         { "dump", &RunDump },
-        { "convert", &RunConvert }, { "bench", &RunBench }, { "make-sample", &RunMakeSample } };
+        { "info", &RunInfo },       { "frames", &RunFrames }, { "dump", &RunDump },
+        { "convert", &RunConvert }, { "bench", &RunBench },   { "make-sample", &RunMakeSample } };
 
     if( i_rArguments.empty() )
     {
       o_rErr << UsageText();
       return Exit_Usage;
     }
-    if( i_rArguments[ 0 ] == "--help" || i_rArguments[ 0 ] == "-h" || i_rArguments[ 0 ] == "help" )
+    if( i_rArguments[0] == "--help" || i_rArguments[0] == "-h" || i_rArguments[0] == "help" )
     {
       o_rOut << UsageText();
       return Exit_Success;
     }
-    const auto Found = s_Commands.find( i_rArguments[ 0 ] );
+    const auto Found = s_Commands.find( i_rArguments[0] );
     if( Found == s_Commands.end() )
     {
-      o_rErr << "lumekvideotool: unknown command '" << i_rArguments[ 0 ] << "'\n\n" << UsageText();
+      o_rErr << "lumekvideotool: unknown command '" << i_rArguments[0] << "'\n\n" << UsageText();
       return Exit_Usage;
     }
     const VArguments Rest( i_rArguments.begin() + 1, i_rArguments.end() );
@@ -103,4 +104,4 @@ namespace LumekVideoTool
       }
     return Found->second( Rest, o_rOut, o_rErr );
   }
-}
+} // namespace LumekVideoTool

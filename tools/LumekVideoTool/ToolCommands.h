@@ -30,4 +30,4 @@ namespace LumekVideoTool
   int RunTool( const VArguments& i_rArguments, std::ostream& o_rOut, std::ostream& o_rErr );
 
   const char* UsageText();
-}
+} // namespace LumekVideoTool

@@ -18,6 +18,6 @@ namespace LumekVideoTool
   // gives nothing.
   std::optional< boost::program_options::variables_map >
   ParseArguments( const VArguments& i_rArguments, const boost::program_options::options_description& i_rOptions,
-                  const boost::program_options::positional_options_description& i_rPositional,
-                  const char* i_pCommand, std::ostream& o_rErr );
-}
+                  const boost::program_options::positional_options_description& i_rPositional, const char* i_pCommand,
+                  std::ostream& o_rErr );
+} // namespace LumekVideoTool

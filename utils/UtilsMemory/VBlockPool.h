@@ -12,8 +12,7 @@
 
 namespace UtilsMemory
 {
-  template< std::size_t Size, std::size_t Alignment >
-  class VBlockPool
+  template < std::size_t Size, std::size_t Alignment > class VBlockPool
   {
   public:
     static VBlockPool& Instance()
@@ -52,16 +51,12 @@ namespace UtilsMemory
 
   // A standard allocator over the pool of its type's size: give it to std::shared_ptr's
   // constructor so that the control block comes from the pool.
-  template< typename T >
-  struct VPooledAllocator
+  template < typename T > struct VPooledAllocator
   {
     using value_type = T;
 
     VPooledAllocator() = default;
-    template< typename U >
-    VPooledAllocator( const VPooledAllocator< U >& ) noexcept
-    {
-    }
+    template < typename U > VPooledAllocator( const VPooledAllocator< U >& ) noexcept {}
 
     T* allocate( std::size_t i_Count )
     {
@@ -78,15 +73,7 @@ namespace UtilsMemory
         VBlockPool< sizeof( T ), alignof( T ) >::Instance().Free( i_p );
     }
 
-    template< typename U >
-    bool operator==( const VPooledAllocator< U >& ) const noexcept
-    {
-      return true;
-    }
-    template< typename U >
-    bool operator!=( const VPooledAllocator< U >& ) const noexcept
-    {
-      return false;
-    }
+    template < typename U > bool operator==( const VPooledAllocator< U >& ) const noexcept { return true; }
+    template < typename U > bool operator!=( const VPooledAllocator< U >& ) const noexcept { return false; }
   };
-}
+} // namespace UtilsMemory

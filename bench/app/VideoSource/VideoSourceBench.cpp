@@ -23,7 +23,8 @@ namespace
 
   const std::string& Recording()
   {
-    static const std::string s_Path = [] {
+    static const std::string s_Path = []
+    {
       const std::string Path =
           ( boost::filesystem::temp_directory_path() / boost::filesystem::unique_path( "bench-%%%%%%.lvid" ) ).string();
       ZOL::IVideoFrameInfo Video;
@@ -70,10 +71,10 @@ namespace
     }
     io_rState.SetItemsProcessed( io_rState.iterations() );
     io_rState.SetBytesProcessed( io_rState.iterations() * 1920 * 1080 );
-    io_rState.counters[ "residentAfterWarmUpMiB" ] = WarmResident;
-    io_rState.counters[ "residentAtEndMiB" ] = ResidentMiB();
+    io_rState.counters["residentAfterWarmUpMiB"] = WarmResident;
+    io_rState.counters["residentAtEndMiB"] = ResidentMiB();
   }
-}
+} // namespace
 
 BENCHMARK( SteadyPlayback )->Iterations( 10000 )->Unit( benchmark::kMicrosecond );
 

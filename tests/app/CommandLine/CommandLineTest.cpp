@@ -39,7 +39,7 @@ namespace
   {
     return "Error parsing command line: " + i_rReason + "\nUse --help for more information.\n";
   }
-}
+} // namespace
 
 TEST( CommandLine, DefaultsAndValues )
 {
@@ -49,7 +49,8 @@ TEST( CommandLine, DefaultsAndValues )
   EXPECT_EQ( Empty.CommandLine.SpoofVersion, "" );
   EXPECT_EQ( Empty.CommandLine.InputFile, "" );
 
-  const VParse Full = Parse( { "--version-server", "http://127.0.0.1:9/", "--spoof-version=0.3.0.55914h", "clip.lvid" } );
+  const VParse Full =
+      Parse( { "--version-server", "http://127.0.0.1:9/", "--spoof-version=0.3.0.55914h", "clip.lvid" } );
   EXPECT_EQ( Full.Result, 0 );
   EXPECT_EQ( Full.CommandLine.VersionServer, "http://127.0.0.1:9/" );
   EXPECT_EQ( Full.CommandLine.SpoofVersion, "0.3.0.55914h" );
@@ -91,12 +92,13 @@ TEST_P( CommandLineErrors, TwoLinesAndExitCode255 )
 
 INSTANTIATE_TEST_SUITE_P(
     Cases, CommandLineErrors,
-    testing::Values( VBadCommandLine{ { "--help" }, "unrecognised option '--help'" },
-                     VBadCommandLine{ { "--bogus" }, "unrecognised option '--bogus'" },
-                     VBadCommandLine{ { "a.lvid", "b.lvid" }, "option '--input-file' cannot be specified more than once" },
-                     VBadCommandLine{ { "--version-server" }, "the required argument for option '--version-server' is missing" },
-                     VBadCommandLine{ { "--version-server=a", "--version-server=b" },
-                                      "option '--version-server' cannot be specified more than once" } ) );
+    testing::Values(
+        VBadCommandLine{ { "--help" }, "unrecognised option '--help'" },
+        VBadCommandLine{ { "--bogus" }, "unrecognised option '--bogus'" },
+        VBadCommandLine{ { "a.lvid", "b.lvid" }, "option '--input-file' cannot be specified more than once" },
+        VBadCommandLine{ { "--version-server" }, "the required argument for option '--version-server' is missing" },
+        VBadCommandLine{ { "--version-server=a", "--version-server=b" },
+                         "option '--version-server' cannot be specified more than once" } ) );
 
 TEST( CommandLine, TheProgramItselfAnswersOnStandardError )
 {
@@ -105,7 +107,7 @@ TEST( CommandLine, TheProgramItselfAnswersOnStandardError )
   FILE* pPipe = popen( Command.c_str(), "r" );
   ASSERT_NE( pPipe, nullptr );
   std::string Text;
-  char Buffer[ 256 ];
+  char Buffer[256];
   while( std::fgets( Buffer, sizeof( Buffer ), pPipe ) )
     Text += Buffer;
   const int Status = pclose( pPipe );

@@ -21,8 +21,9 @@ namespace
   {
   public:
     VRecording( std::uint64_t i_FrameCount, std::uint32_t i_FramePeriodInTicks )
-        : m_Path( ( boost::filesystem::temp_directory_path() / boost::filesystem::unique_path( "playback-%%%%%%.lvid" ) )
-                      .string() )
+        : m_Path(
+              ( boost::filesystem::temp_directory_path() / boost::filesystem::unique_path( "playback-%%%%%%.lvid" ) )
+                  .string() )
     {
       ZOL::IVideoFrameInfo Video;
       Video.ImageWidth = 2;
@@ -35,7 +36,7 @@ namespace
       ZOL::WriteVideoTiming( Attributes, Timing );
       LumekVideo::VWriter Writer;
       EXPECT_TRUE( Writer.Create( m_Path, Video, ZOL::IAudioFrameInfo(), Attributes ) );
-      const std::uint8_t Pixels[ 4 ] = {};
+      const std::uint8_t Pixels[4] = {};
       for( std::uint64_t i = 0; i < i_FrameCount; ++i )
         EXPECT_TRUE( Writer.AppendFrame( i, Pixels, sizeof( Pixels ) ) );
       EXPECT_TRUE( Writer.Close() );
@@ -53,17 +54,20 @@ namespace
     std::string m_Path;
   };
 
-  constexpr std::uint32_t TicksAt( std::uint32_t i_FramesPerSecond ) { return 135000000u / i_FramesPerSecond; }
+  constexpr std::uint32_t TicksAt( std::uint32_t i_FramesPerSecond )
+  {
+    return 135000000u / i_FramesPerSecond;
+  }
 
   // A manager whose clock the test moves, with every signal recorded.
   struct VClockedManager
   {
-    explicit VClockedManager( VVideoSource& i_rSource )
-        : Manager( &i_rSource, [ this ] { return Now; } )
+    explicit VClockedManager( VVideoSource& i_rSource ) : Manager( &i_rSource, [this] { return Now; } )
     {
-      QObject::connect( &Manager, &VPlayBackManager::FrameUpdated, [ this ]( int i_Frame ) { Frames.push_back( i_Frame ); } );
-      QObject::connect( &Manager, &VPlayBackManager::Stopped, [ this ] { ++StoppedCount; } );
-      QObject::connect( &Manager, &VPlayBackManager::End, [ this ] { ++EndCount; } );
+      QObject::connect( &Manager, &VPlayBackManager::FrameUpdated,
+                        [this]( int i_Frame ) { Frames.push_back( i_Frame ); } );
+      QObject::connect( &Manager, &VPlayBackManager::Stopped, [this] { ++StoppedCount; } );
+      QObject::connect( &Manager, &VPlayBackManager::End, [this] { ++EndCount; } );
     }
 
     void TickAt( double i_Milliseconds )
@@ -78,7 +82,7 @@ namespace
     int StoppedCount = 0;
     int EndCount = 0;
   };
-}
+} // namespace
 
 TEST( PlayBackManager, RoundsHalfAFrameAheadOfTheClock )
 {
@@ -192,7 +196,7 @@ TEST( PlayBackManager, StopAnnouncesOnceAndResetIsSilent )
   VClockedManager Clock( Recording.Source );
   int FrameSeenByStopped = -1;
   QObject::connect( &Clock.Manager, &VPlayBackManager::Stopped,
-                    [ & ] { FrameSeenByStopped = static_cast< int >( Clock.Manager.GetCurrentFrame() ); } );
+                    [&] { FrameSeenByStopped = static_cast< int >( Clock.Manager.GetCurrentFrame() ); } );
   Clock.Manager.Start();
   Clock.TickAt( 500.0 );
   Clock.Manager.Stop();

@@ -29,7 +29,8 @@ struct VSourceRecording
     ZOL::IVideoTiming Timing;
     Timing.FramePeriodInTicks = 135000000u / 50;
     ZOL::WriteVideoTiming( Attributes, Timing );
-    Path = ( boost::filesystem::temp_directory_path() / boost::filesystem::unique_path( "source-%%%%%%%%.lvid" ) ).string();
+    Path = ( boost::filesystem::temp_directory_path() / boost::filesystem::unique_path( "source-%%%%%%%%.lvid" ) )
+               .string();
   }
   ~VSourceRecording() { boost::filesystem::remove( Path ); }
 

@@ -42,10 +42,10 @@ TEST( VideoSource, CountsMissingFramesAndReadsWhatIsThere )
   ASSERT_TRUE( Source.GetFrame( 5, Frame ) );
   ASSERT_TRUE( Frame.Video );
   EXPECT_EQ( Frame.Video->GetSize(), 32u );
-  EXPECT_EQ( Frame.Video->GetData()[ 31 ], 6 );
+  EXPECT_EQ( Frame.Video->GetData()[31], 6 );
   EXPECT_EQ( Frame.VideoFrameInfo.PixelFormat, ZOL::PixelFormat_BayerGB8 );
   ASSERT_EQ( Frame.Audio.size(), 1u );
-  EXPECT_EQ( Frame.Audio[ 0 ]->GetSize(), 24u );
+  EXPECT_EQ( Frame.Audio[0]->GetSize(), 24u );
   EXPECT_EQ( Frame.AudioFrameInfo.SampleRate, 48000 );
 }
 
@@ -130,11 +130,11 @@ TEST( VideoSource, PropertiesListEveryKeyWithTheRecords )
   const auto Rows = LumekVideoViewer::ComposePropertyRows( Source );
   std::map< std::string, std::string > Map( Rows.begin(), Rows.end() );
   EXPECT_EQ( Map.size(), Rows.size() );
-  EXPECT_EQ( Map[ "VideoFrameInfo.PixelFormat" ], "BayerGB8" );
-  EXPECT_EQ( Map[ "VideoFrameInfo.ImageWidth" ], "8" );
-  EXPECT_EQ( Map[ "AudioFrameInfo.Present" ], "0" );
-  EXPECT_EQ( Map[ "GammaCorrection" ], "1" );
-  EXPECT_EQ( Map[ "FramePeriodInTicks" ], "2700000" );
+  EXPECT_EQ( Map["VideoFrameInfo.PixelFormat"], "BayerGB8" );
+  EXPECT_EQ( Map["VideoFrameInfo.ImageWidth"], "8" );
+  EXPECT_EQ( Map["AudioFrameInfo.Present"], "0" );
+  EXPECT_EQ( Map["GammaCorrection"], "1" );
+  EXPECT_EQ( Map["FramePeriodInTicks"], "2700000" );
   std::vector< std::string > Keys;
   for( const auto& rRow : Rows )
     Keys.push_back( rRow.first );

@@ -15,13 +15,13 @@ namespace
     VRGBImage Image( i_Width, i_Height );
     for( std::size_t i = 0; i < Image.Pixels.size(); i += 3 )
     {
-      Image.Pixels[ i ] = R;
-      Image.Pixels[ i + 1 ] = G;
-      Image.Pixels[ i + 2 ] = B;
+      Image.Pixels[i] = R;
+      Image.Pixels[i + 1] = G;
+      Image.Pixels[i + 2] = B;
     }
     return Image;
   }
-}
+} // namespace
 
 TEST( FrameEncoding, BayerSitesFollowTheirPattern )
 {
@@ -43,7 +43,7 @@ TEST( FrameEncoding, PackedSamplesAreMostSignificantBitFirst )
   EXPECT_EQ( Seven, std::vector< std::uint8_t >( 7, 0xFF ) );
   // One white sample among black: 000000 111111 000000 000000 -> 0000 0011 | 1111 0000 | 0000 0000.
   VRGBImage Image = Uniform( 4, 1, 0, 0, 0 );
-  Image.Pixels[ 3 ] = Image.Pixels[ 4 ] = Image.Pixels[ 5 ] = 255; // second pixel
+  Image.Pixels[3] = Image.Pixels[4] = Image.Pixels[5] = 255; // second pixel
   const auto Six = LumekVideoTool::EncodeFrame( Image, ZOL::PixelFormat_Luminance6 );
   EXPECT_EQ( Six, ( std::vector< std::uint8_t >{ 0x03, 0xF0, 0x00 } ) );
 }
@@ -53,21 +53,23 @@ TEST( FrameEncoding, TenBitYUVGroupsAndRowPadding )
   // Grey 128: Y = 127, U = V = 128, so the samples are U 512, Y 508, V 512.
   const auto Frame = LumekVideoTool::EncodeFrame( Uniform( 50, 2, 128, 128, 128 ), ZOL::PixelFormat_U10Y10V10Y10 );
   ASSERT_EQ( Frame.size(), 2u * 2 * 128 ); // two groups of 48 pixels per row
-  const std::uint32_t Word = Frame[ 0 ] | Frame[ 1 ] << 8 | Frame[ 2 ] << 16 | static_cast< std::uint32_t >( Frame[ 3 ] ) << 24;
+  const std::uint32_t Word = Frame[0] | Frame[1] << 8 | Frame[2] << 16 | static_cast< std::uint32_t >( Frame[3] ) << 24;
   EXPECT_EQ( Word & 0x3FF, 512u );
   EXPECT_EQ( ( Word >> 10 ) & 0x3FF, 508u );
   EXPECT_EQ( ( Word >> 20 ) & 0x3FF, 512u );
   EXPECT_EQ( Word >> 30, 0u );
   // Pixels 50 to 95 of the first row are padding.
-  EXPECT_EQ( Frame[ 255 ], 0 );
+  EXPECT_EQ( Frame[255], 0 );
 }
 
 TEST( FrameEncoding, EveryFormatHasItsFrameSize )
 {
   const VRGBImage Image = Uniform( 16, 4, 1, 2, 3 );
-  const std::size_t Expected[] = { 0, 64, 64, 64, 64, 64, 128, 192, 192, 256, 256, 128, 128, 512, 56, 48, 56, 48, 128, 192 };
+  const std::size_t Expected[] = { 0,   64,  64,  64,  64, 64, 128, 192, 192, 256,
+                                   256, 128, 128, 512, 56, 48, 56,  48,  128, 192 };
   for( std::uint32_t Format = 1; Format < ZOL::PixelFormatCount; ++Format )
-    EXPECT_EQ( LumekVideoTool::EncodeFrame( Image, static_cast< ZOL::EPixelFormat >( Format ) ).size(), Expected[ Format ] )
+    EXPECT_EQ( LumekVideoTool::EncodeFrame( Image, static_cast< ZOL::EPixelFormat >( Format ) ).size(),
+               Expected[Format] )
         << ZOL::ToString( static_cast< ZOL::EPixelFormat >( Format ) );
 }
 
@@ -84,7 +86,14 @@ TEST( SampleScene, ToneRunsOnAcrossFrames )
 TEST( Json, EscapesAndKeepsItValid )
 {
   LumekVideoTool::VJsonWriter Json;
-  Json.BeginObject().Key( "a\"b" ).Value( std::string( "line\n\x01\xff\xc3\xa9" ) ).Key( "n" ).BeginArray().Value( 1 ).Value(
-      2.5 ).EndArray().EndObject();
+  Json.BeginObject()
+      .Key( "a\"b" )
+      .Value( std::string( "line\n\x01\xff\xc3\xa9" ) )
+      .Key( "n" )
+      .BeginArray()
+      .Value( 1 )
+      .Value( 2.5 )
+      .EndArray()
+      .EndObject();
   EXPECT_EQ( Json.GetText(), "{\"a\\\"b\":\"line\\n\\u0001\\ufffd\xc3\xa9\",\"n\":[1,2.5]}" );
 }

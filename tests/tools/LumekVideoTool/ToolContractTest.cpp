@@ -25,7 +25,7 @@ namespace
       return {};
     return std::vector< std::uint8_t >( Bytes.begin() + Consumed, Bytes.end() );
   }
-}
+} // namespace
 
 TEST( ToolUsage, ExitCodesForUsage )
 {
@@ -43,8 +43,8 @@ TEST( ToolUsage, UnopenableFilesExitWithOne )
 {
   VScratch Scratch;
   WriteFileBytes( Scratch.Path( "empty.lvid" ), {} );
-  for( const std::string& rPath : { Scratch.Path( "absent.lvid" ), Scratch.Path( "empty.lvid" ),
-                                     Scratch.Path( "clip.MOV" ) } )
+  for( const std::string& rPath :
+       { Scratch.Path( "absent.lvid" ), Scratch.Path( "empty.lvid" ), Scratch.Path( "clip.MOV" ) } )
   {
     const VRun Run = RunTool( { "info", rPath } );
     EXPECT_EQ( Run.ExitCode, 1 ) << rPath;
@@ -77,7 +77,8 @@ TEST( ToolInfo, ReportsWhatTheViewerShows )
   EXPECT_EQ( Json.get< std::string >( "audio.sampleFormat" ), "Int16" );
   EXPECT_EQ( Json.get< int >( "audio.channels" ), 2 );
 
-  EXPECT_EQ( Json.get< std::string >( "infoPanel.video" ), "V: 64 x 48 / BayerGB8 / 25.00Hz / 6 frames (2 missing) / 0.24s" );
+  EXPECT_EQ( Json.get< std::string >( "infoPanel.video" ),
+             "V: 64 x 48 / BayerGB8 / 25.00Hz / 6 frames (2 missing) / 0.24s" );
   EXPECT_EQ( Json.get< std::string >( "infoPanel.audio" ), "A: 2 channels / Int16 / 48000Hz" );
   // 25 fps timecode from 01:00:00:00; frame 1 is one timecode frame later.
   EXPECT_EQ( Json.get< std::string >( "infoPanel.timecode" ), "T: 01:00:00:01+00 [25 fps]" );
@@ -96,14 +97,14 @@ TEST( ToolInfo, ReportsWhatTheViewerShows )
     for( const auto& rCell : rRow.second )
       Pair.push_back( rCell.second.get_value< std::string >() );
     ASSERT_EQ( Pair.size(), 2u );
-    Keys.push_back( Pair[ 0 ] );
-    if( Pair[ 0 ] == "Test.Note" )
+    Keys.push_back( Pair[0] );
+    if( Pair[0] == "Test.Note" )
     {
-      EXPECT_EQ( Pair[ 1 ], "written by the tool's tests" );
+      EXPECT_EQ( Pair[1], "written by the tool's tests" );
     }
-    if( Pair[ 0 ] == "VideoFrameInfo.PixelFormat" )
+    if( Pair[0] == "VideoFrameInfo.PixelFormat" )
     {
-      EXPECT_EQ( Pair[ 1 ], "BayerGB8" );
+      EXPECT_EQ( Pair[1], "BayerGB8" );
     }
   }
   EXPECT_TRUE( std::is_sorted( Keys.begin(), Keys.end() ) );
@@ -145,8 +146,9 @@ TEST( ToolFrames, WritesExpectedPixels )
     for( std::uint64_t Frame : Spec.Frames )
     {
       int Width = 0, Height = 0;
-      const auto Pixels = PPMPixels( OutDir + ( Frame == 3 ? "/frame_000003.ppm" : Frame == 1 ? "/frame_000001.ppm"
-                                                                                                  : "/frame_000000.ppm" ),
+      const auto Pixels = PPMPixels( OutDir + ( Frame == 3   ? "/frame_000003.ppm"
+                                                : Frame == 1 ? "/frame_000001.ppm"
+                                                             : "/frame_000000.ppm" ),
                                      Width, Height );
       ASSERT_EQ( Width, Spec.Width );
       ASSERT_EQ( Height, Spec.Height );
@@ -156,16 +158,16 @@ TEST( ToolFrames, WritesExpectedPixels )
         const std::uint8_t* p = Picture.Pixels.data() + i;
         if( Format == ZOL::PixelFormat_Luminance8 )
         {
-          const std::uint8_t Y = LumekVideoTool::Luma( p[ 0 ], p[ 1 ], p[ 2 ] );
-          ASSERT_EQ( Pixels[ i ], Y );
-          ASSERT_EQ( Pixels[ i + 1 ], Y );
-          ASSERT_EQ( Pixels[ i + 2 ], Y );
+          const std::uint8_t Y = LumekVideoTool::Luma( p[0], p[1], p[2] );
+          ASSERT_EQ( Pixels[i], Y );
+          ASSERT_EQ( Pixels[i + 1], Y );
+          ASSERT_EQ( Pixels[i + 2], Y );
         }
         else
         {
-          ASSERT_EQ( Pixels[ i ], p[ 0 ] ) << Name << " byte " << i;
-          ASSERT_EQ( Pixels[ i + 1 ], p[ 1 ] );
-          ASSERT_EQ( Pixels[ i + 2 ], p[ 2 ] );
+          ASSERT_EQ( Pixels[i], p[0] ) << Name << " byte " << i;
+          ASSERT_EQ( Pixels[i + 1], p[1] );
+          ASSERT_EQ( Pixels[i + 2], p[2] );
         }
       }
     }
@@ -186,8 +188,8 @@ TEST( ToolFrames, RangeAndPNG )
   EXPECT_FALSE( boost::filesystem::exists( Scratch.Path( "png/frame_000003.png" ) ) );
   const auto Bytes = ReadFileBytes( Scratch.Path( "png/frame_000001.png" ) );
   ASSERT_GE( Bytes.size(), 8u );
-  EXPECT_EQ( Bytes[ 1 ], 'P' );
-  EXPECT_EQ( Bytes[ 2 ], 'N' );
+  EXPECT_EQ( Bytes[1], 'P' );
+  EXPECT_EQ( Bytes[2], 'N' );
 }
 
 TEST( ToolConvert, RoundTripKeepsFramesAndAttributes )
@@ -228,15 +230,15 @@ TEST( ToolConvert, RoundTripKeepsFramesAndAttributes )
     // Every property of the input is kept, and the conversion is recorded.
     std::map< std::string, std::string > OutProperties;
     for( const auto& rRow : Out.get_child( "properties" ) )
-      OutProperties[ rRow.second.front().second.get_value< std::string >() ] =
+      OutProperties[rRow.second.front().second.get_value< std::string >()] =
           rRow.second.back().second.get_value< std::string >();
     for( const auto& rRow : In.get_child( "properties" ) )
     {
       const std::string Key = rRow.second.front().second.get_value< std::string >();
-      EXPECT_EQ( OutProperties[ Key ], rRow.second.back().second.get_value< std::string >() ) << Key;
+      EXPECT_EQ( OutProperties[Key], rRow.second.back().second.get_value< std::string >() ) << Key;
     }
-    EXPECT_EQ( OutProperties[ "ConversionRecord.0.Container" ], "LVID" );
-    EXPECT_EQ( OutProperties[ "ConversionRecord.0.VideoFrameInfo.PixelFormat" ], Name );
+    EXPECT_EQ( OutProperties["ConversionRecord.0.Container"], "LVID" );
+    EXPECT_EQ( OutProperties["ConversionRecord.0.VideoFrameInfo.PixelFormat"], Name );
   }
 }
 
@@ -269,18 +271,19 @@ TEST( ToolMakeSample, WritesAPlayableRecording )
 {
   VScratch Scratch;
   const std::string Path = Scratch.Path( "sample.lvid" );
-  const VRun Make = RunTool( { "make-sample", Path, "--width", "96", "--height", "54", "--frames", "10", "--fps", "50" } );
+  const VRun Make =
+      RunTool( { "make-sample", Path, "--width", "96", "--height", "54", "--frames", "10", "--fps", "50" } );
   ASSERT_EQ( Make.ExitCode, 0 ) << Make.Err;
   const auto Json = ParseJson( RunTool( { "info", Path } ).Out );
-  EXPECT_EQ( Json.get< std::string >( "infoPanel.video" ), "V: 96 x 54 / BayerGB8 / 50.00Hz / 10 frames (2 missing) / 0.20s" );
+  EXPECT_EQ( Json.get< std::string >( "infoPanel.video" ),
+             "V: 96 x 54 / BayerGB8 / 50.00Hz / 10 frames (2 missing) / 0.20s" );
   EXPECT_EQ( Json.get< std::string >( "infoPanel.audio" ), "A: 2 channels / Int16 / 48000Hz" );
   EXPECT_TRUE( boost::starts_with( Json.get< std::string >( "infoPanel.timecode" ), "T: 10:00:00:00" ) );
   // 960 stereo 16-bit samples a frame at 50 fps.
   EXPECT_EQ( Json.get_child( "frame.audioBlocks" ).front().second.get_value< int >(), 960 * 4 );
 
-  const VRun NoAudio =
-      RunTool( { "make-sample", Scratch.Path( "quiet.lvid" ), "--width", "32", "--height", "16", "--frames", "2",
-                 "--format", "U8Y8V8Y8", "--no-audio" } );
+  const VRun NoAudio = RunTool( { "make-sample", Scratch.Path( "quiet.lvid" ), "--width", "32", "--height", "16",
+                                  "--frames", "2", "--format", "U8Y8V8Y8", "--no-audio" } );
   ASSERT_EQ( NoAudio.ExitCode, 0 ) << NoAudio.Err;
   const auto Quiet = ParseJson( RunTool( { "info", Scratch.Path( "quiet.lvid" ) } ).Out );
   EXPECT_EQ( Quiet.get< std::string >( "audio.payload" ), "None" );
@@ -305,10 +308,12 @@ TEST( ToolConvert, AnInterruptedConversionLeavesNoHalfFile )
   if( Child == 0 )
   {
     std::freopen( "/dev/null", "w", stderr );
-    execl( LUMEK_TOOL_PATH, LUMEK_TOOL_PATH, "convert", Input.c_str(), Output.c_str(), static_cast< char* >( nullptr ) );
+    execl( LUMEK_TOOL_PATH, LUMEK_TOOL_PATH, "convert", Input.c_str(), Output.c_str(),
+           static_cast< char* >( nullptr ) );
     _exit( 127 );
   }
-  const auto HasPartial = [ & ] {
+  const auto HasPartial = [&]
+  {
     for( const auto& rEntry : boost::filesystem::directory_iterator( Scratch.Path( "" ) ) )
       if( rEntry.path().string().find( ".partial" ) != std::string::npos )
         return true;

@@ -20,7 +20,7 @@ namespace
     Spec.bAudio = true;
     return WriteRecording( i_rScratch, "good.lvid", Spec );
   }
-}
+} // namespace
 
 TEST( ToolMalformedInput, EveryCutFailsToOpen )
 {
@@ -58,10 +58,10 @@ TEST( ToolMalformedInput, FlippedBytesNeverCrash )
     for( int i = 0; i < Flips; ++i )
     {
       // Most flips land in the structure (header, attributes, index), where they matter.
-      const std::size_t Position = ( Trial % 3 == 0 ) ? Random() % Bytes.size()
+      const std::size_t Position = ( Trial % 3 == 0 )   ? Random() % Bytes.size()
                                    : ( Trial % 3 == 1 ) ? Random() % std::min< std::size_t >( Bytes.size(), 600 )
                                                         : Bytes.size() - 1 - Random() % 64;
-      Bytes[ Position ] ^= static_cast< std::uint8_t >( 1u << ( Random() % 8 ) );
+      Bytes[Position] ^= static_cast< std::uint8_t >( 1u << ( Random() % 8 ) );
     }
     WriteFileBytes( Path, Bytes );
     for( const char* pCommand : { "frames", "info" } )

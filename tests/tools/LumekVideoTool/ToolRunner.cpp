@@ -33,7 +33,7 @@ namespace LumekVideoToolTest
       Text << File.rdbuf();
       return Text.str();
     }
-  }
+  } // namespace
 
   VRun RunTool( const std::vector< std::string >& i_rArguments )
   {
@@ -93,9 +93,9 @@ namespace LumekVideoToolTest
       for( int x = 0; x < i_Width; ++x )
       {
         std::uint8_t* p = Image.At( x, y );
-        p[ 0 ] = static_cast< std::uint8_t >( 20 + 30 * x + 7 * i_Frame );
-        p[ 1 ] = static_cast< std::uint8_t >( 40 + 25 * y + 3 * i_Frame );
-        p[ 2 ] = static_cast< std::uint8_t >( 200 - 10 * x - 10 * y );
+        p[0] = static_cast< std::uint8_t >( 20 + 30 * x + 7 * i_Frame );
+        p[1] = static_cast< std::uint8_t >( 40 + 25 * y + 3 * i_Frame );
+        p[2] = static_cast< std::uint8_t >( 200 - 10 * x - 10 * y );
       }
     return Image;
   }
@@ -126,12 +126,13 @@ namespace LumekVideoToolTest
     EXPECT_TRUE( Writer.Create( Path, Video, Audio, Attributes ) );
     for( std::uint64_t Frame : i_rSpec.Frames )
     {
-      const auto Bytes = LumekVideoTool::EncodeFrame( PictureFor( Frame, i_rSpec.Width, i_rSpec.Height ), i_rSpec.Format );
+      const auto Bytes =
+          LumekVideoTool::EncodeFrame( PictureFor( Frame, i_rSpec.Width, i_rSpec.Height ), i_rSpec.Format );
       std::vector< std::uint8_t > Tone;
       if( i_rSpec.bAudio )
         Tone.assign( 1920 * 4, static_cast< std::uint8_t >( Frame ) );
-      EXPECT_TRUE( Writer.AppendFrame( Frame, Bytes.data(), Bytes.size(), Tone.empty() ? nullptr : Tone.data(),
-                                       Tone.size() ) );
+      EXPECT_TRUE(
+          Writer.AppendFrame( Frame, Bytes.data(), Bytes.size(), Tone.empty() ? nullptr : Tone.data(), Tone.size() ) );
     }
     EXPECT_TRUE( Writer.Close() );
     return Path;
@@ -148,4 +149,4 @@ namespace LumekVideoToolTest
     std::ofstream File( i_rPath, std::ios::binary );
     File.write( reinterpret_cast< const char* >( i_rBytes.data() ), static_cast< std::streamsize >( i_rBytes.size() ) );
   }
-}
+} // namespace LumekVideoToolTest

@@ -54,4 +54,4 @@ namespace LumekVideoToolTest
 
   std::vector< std::uint8_t > ReadFileBytes( const std::string& i_rPath );
   void WriteFileBytes( const std::string& i_rPath, const std::vector< std::uint8_t >& i_rBytes );
-}
+} // namespace LumekVideoToolTest
