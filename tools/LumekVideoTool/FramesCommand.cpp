@@ -1,4 +1,4 @@
-#include "graphics/CoreVideoUtils/PixelFormatConverter.h"
+#include "graphics/CoreVideoUtils/DisplayConversion.h"
 #include "tools/LumekVideoTool/Json.h"
 #include "tools/LumekVideoTool/ToolCommon.h"
 
@@ -21,25 +21,16 @@ namespace LumekVideoTool
 {
   namespace
   {
-    // Converts a decoded frame to upright R8G8B8 with the file's display settings; the converter
+    // A decoded frame as upright R8G8B8 with the file's display settings; the converter
     // colour-corrects a Bayer frame once, inside the conversion.
-    bool ToRGB( CoreVideoUtils::VPixelFormatConverter& io_rConverter, const ZOL::IVideoFrame& i_rFrame,
+    bool ToRGB( const ZOL::IVideoSettings& i_rSettings, const ZOL::IVideoFrame& i_rFrame,
                 std::vector< std::uint8_t >& o_rRGB )
     {
       const ZOL::IVideoFrameInfo& rInfo = i_rFrame.VideoFrameInfo;
-      if( !i_rFrame.Video || !rInfo.IsValid() )
+      if( !i_rFrame.Video || !CoreVideoUtils::ConvertToDisplayRGB( rInfo, i_rFrame.Video->GetData(),
+                                                                   i_rFrame.Video->GetSize(), i_rSettings, o_rRGB ) )
         return false;
       const std::uint64_t Row = static_cast< std::uint64_t >( rInfo.ImageWidth ) * 3;
-      o_rRGB.resize( static_cast< std::size_t >( Row * rInfo.ImageHeight ) );
-      if( rInfo.PixelFormat == ZOL::PixelFormat_R8G8B8 )
-      {
-        if( i_rFrame.Video->GetSize() < o_rRGB.size() )
-          return false;
-        std::copy( i_rFrame.Video->GetData(), i_rFrame.Video->GetData() + o_rRGB.size(), o_rRGB.begin() );
-      }
-      else if( !io_rConverter.Convert( rInfo, i_rFrame.Video->GetData(), i_rFrame.Video->GetSize(),
-                                       ZOL::PixelFormat_R8G8B8, o_rRGB.data(), o_rRGB.size() ) )
-        return false;
       if( rInfo.IsInverted() )
         for( std::int32_t y = 0; y < rInfo.ImageHeight / 2; ++y )
           std::swap_ranges( o_rRGB.begin() + y * Row, o_rRGB.begin() + ( y + 1 ) * Row,
@@ -100,8 +91,6 @@ namespace LumekVideoTool
       return Exit_Usage;
     }
 
-    CoreVideoUtils::VPixelFormatConverter Converter;
-    Converter.SetVideoSettings( Source.GetVideoSettings() );
     std::vector< std::uint8_t > RGB;
     bool bAllWritten = true;
     const std::uint64_t End = Count > UINT64_MAX - First ? UINT64_MAX : First + Count;
@@ -122,7 +111,7 @@ namespace LumekVideoTool
         continue;
       }
       ZOL::IVideoFrame Frame;
-      if( !Source.GetFrame( Index, Frame ) || !ToRGB( Converter, Frame, RGB ) )
+      if( !Source.GetFrame( Index, Frame ) || !ToRGB( Source.GetVideoSettings(), Frame, RGB ) )
       {
         o_rErr << "Frame " << Index << " could not be read or decoded." << std::endl;
         bAllWritten = false;
@@ -160,8 +149,6 @@ namespace LumekVideoTool
     const std::uint64_t Frames =
         Variables->count( "frames" ) ? ( *Variables )["frames"].as< std::uint64_t >() : Source.GetFrameCount();
 
-    CoreVideoUtils::VPixelFormatConverter Converter;
-    Converter.SetVideoSettings( Source.GetVideoSettings() );
     std::vector< std::uint8_t > RGB;
     std::uint64_t Failed = 0, Read = 0;
     const auto Start = std::chrono::steady_clock::now();
@@ -172,7 +159,7 @@ namespace LumekVideoTool
       // Frames are taken and dropped as playback takes and drops them, so buffers recycle.
       ZOL::IVideoFrame Frame;
       ++Read;
-      if( !Source.GetFrame( *Index, Frame ) || ( bSoftware && !ToRGB( Converter, Frame, RGB ) ) )
+      if( !Source.GetFrame( *Index, Frame ) || ( bSoftware && !ToRGB( Source.GetVideoSettings(), Frame, RGB ) ) )
         ++Failed;
     }
     const double Seconds = std::chrono::duration< double >( std::chrono::steady_clock::now() - Start ).count();
