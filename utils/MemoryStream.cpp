@@ -99,4 +99,4 @@ namespace UtilsIO
     m_bAtEnd = false;
     return true;
   }
-}
+} // namespace UtilsIO

@@ -47,4 +47,4 @@ namespace UtilsIO
     std::uint64_t m_Position = 0;
     bool m_bAtEnd = false;
   };
-}
+} // namespace UtilsIO

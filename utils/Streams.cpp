@@ -32,4 +32,4 @@ namespace ZOL
       return false;
     return i_rStream.Seek( static_cast< std::int64_t >( Position ) + i_Bytes );
   }
-}
+} // namespace ZOL

@@ -65,15 +65,14 @@ namespace ZOL
   bool Skip( IInputStreamSeekable& i_rStream, std::int64_t i_Bytes );
 
   // Little-endian values on a stream.
-  template< typename T >
-  bool ReadLE( IInputStream& i_rStream, T& o_rValue )
+  template < typename T > bool ReadLE( IInputStream& i_rStream, T& o_rValue )
   {
-    std::uint8_t Bytes[ sizeof( T ) ];
+    std::uint8_t Bytes[sizeof( T )];
     if( !i_rStream.Read( Bytes, sizeof( T ) ) )
       return false;
     std::uint64_t Value = 0;
     for( std::size_t i = 0; i < sizeof( T ); ++i )
-      Value |= static_cast< std::uint64_t >( Bytes[ i ] ) << ( 8 * i );
+      Value |= static_cast< std::uint64_t >( Bytes[i] ) << ( 8 * i );
     if constexpr( sizeof( T ) == 4 && std::is_floating_point_v< T > )
     {
       std::uint32_t Bits = static_cast< std::uint32_t >( Value );
@@ -86,8 +85,7 @@ namespace ZOL
     return true;
   }
 
-  template< typename T >
-  bool WriteLE( IOutputStream& i_rStream, T i_Value )
+  template < typename T > bool WriteLE( IOutputStream& i_rStream, T i_Value )
   {
     std::uint64_t Value = 0;
     if constexpr( sizeof( T ) == 4 && std::is_floating_point_v< T > )
@@ -100,9 +98,9 @@ namespace ZOL
       std::memcpy( &Value, &i_Value, sizeof( T ) );
     else
       Value = static_cast< std::uint64_t >( i_Value );
-    std::uint8_t Bytes[ sizeof( T ) ];
+    std::uint8_t Bytes[sizeof( T )];
     for( std::size_t i = 0; i < sizeof( T ); ++i )
-      Bytes[ i ] = static_cast< std::uint8_t >( Value >> ( 8 * i ) );
+      Bytes[i] = static_cast< std::uint8_t >( Value >> ( 8 * i ) );
     return i_rStream.Write( Bytes, sizeof( T ) );
   }
-}
+} // namespace ZOL

@@ -3,9 +3,9 @@
 // The records spread over named attribute keys, and how each is read from and written to a
 // store. A record is never stored as a binary structure.
 
+#include "videointerface/ITimecode.h"
 #include "videointerface/IVideoAttributes.h"
 #include "videointerface/IVideoFrameInfo.h"
-#include "videointerface/ITimecode.h"
 
 #include <string>
 #include <vector>
@@ -36,7 +36,7 @@ namespace CoreLumekTypes
     bool operator==( const VLensDistortionCalibration& i_rOther ) const;
     bool operator!=( const VLensDistortionCalibration& i_rOther ) const { return !( *this == i_rOther ); }
   };
-}
+} // namespace CoreLumekTypes
 
 namespace ZOL
 {
@@ -65,8 +65,10 @@ namespace ZOL
   bool WriteVideoTiming( IVideoAttributes& io_rStore, const IVideoTiming& i_rTiming );
 
   // Both keys are optional: a missing one keeps the record's value. True when both were there.
-  bool ReadVideoSettings( const IVideoAttributes& i_rStore, const std::string& i_rPrefix, IVideoSettings& io_rSettings );
-  bool WriteVideoSettings( IVideoAttributes& io_rStore, const std::string& i_rPrefix, const IVideoSettings& i_rSettings );
+  bool ReadVideoSettings( const IVideoAttributes& i_rStore, const std::string& i_rPrefix,
+                          IVideoSettings& io_rSettings );
+  bool WriteVideoSettings( IVideoAttributes& io_rStore, const std::string& i_rPrefix,
+                           const IVideoSettings& i_rSettings );
 
   bool ReadTimecode( const IVideoAttributes& i_rStore, ITimecode& io_rTimecode );
   bool WriteTimecode( IVideoAttributes& io_rStore, const ITimecode& i_rTimecode );
@@ -83,4 +85,4 @@ namespace ZOL
   void ReadConversionRecords( const IVideoAttributes& i_rStore, std::vector< VConversionRecord >& o_rRecords );
   bool WriteConversionRecords( IVideoAttributes& io_rStore, const std::vector< VConversionRecord >& i_rRecords );
   std::string ConversionRecordPrefix( std::size_t i_Index );
-}
+} // namespace ZOL

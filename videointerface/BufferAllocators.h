@@ -9,4 +9,4 @@ namespace ZOL
   using VReaderBufferAllocator = IStandardBufferAllocator< UtilsMemory::VThreadSafeRecycler< IStandardBuffer, 16 > >;
   // Decoded frames are large: blocks of 4.
   using VFrameBufferAllocator = IStandardBufferAllocator< UtilsMemory::VThreadSafeRecycler< IStandardBuffer, 4 > >;
-}
+} // namespace ZOL

@@ -162,8 +162,11 @@ namespace ZOL
   constexpr ResultCode Result_FileIOFailure = 0x80000021u;
   constexpr ResultCode Result_FileNotOpen = 0x80000026u;
   constexpr ResultCode Result_FileNotFound = 0x8000002Au;
-  inline bool Succeeded( ResultCode i_Code ) { return ( i_Code & 0x80000000u ) == 0; }
+  inline bool Succeeded( ResultCode i_Code )
+  {
+    return ( i_Code & 0x80000000u ) == 0;
+  }
 
   // The message of a result code, or "Unknown result code".
   const std::string& GetResultText( ResultCode i_Code );
-}
+} // namespace ZOL

@@ -48,8 +48,7 @@ namespace ZOL
   };
 
   // Wraps a byte array with static storage so that it can join a list of buffers without a copy.
-  template< const std::uint8_t* pData, std::uint64_t Size >
-  class VTrivialBuffer : public IBufferConst
+  template < const std::uint8_t* pData, std::uint64_t Size > class VTrivialBuffer : public IBufferConst
   {
   public:
     const std::uint8_t* GetData() const override { return pData; }
@@ -66,7 +65,7 @@ namespace ZOL
 
   // An allocator over a recycler of IStandardBuffer. It must be owned by a shared pointer: each
   // buffer it gives out keeps it alive, so buffers may outlive whoever made the allocator.
-  template< typename TRecycler >
+  template < typename TRecycler >
   class IStandardBufferAllocator : public IBufferAllocator,
                                    public std::enable_shared_from_this< IStandardBufferAllocator< TRecycler > >
   {
@@ -104,7 +103,7 @@ namespace ZOL
       }
       // The control block comes from a pool too: with it, a recycled frame costs no allocation.
       std::shared_ptr< IStandardBuffer > pShared(
-          pBuffer, [ pSelf ]( IStandardBuffer* i_pBuffer ) { pSelf->Recycler.Release( i_pBuffer ); },
+          pBuffer, [pSelf]( IStandardBuffer* i_pBuffer ) { pSelf->Recycler.Release( i_pBuffer ); },
           UtilsMemory::VPooledAllocator< IStandardBuffer >() );
       try
       {
@@ -131,4 +130,4 @@ namespace ZOL
                       i_Size );
     }
   };
-}
+} // namespace ZOL

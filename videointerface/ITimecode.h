@@ -55,4 +55,4 @@ namespace ZOL
   // clock exactly shows the start timecode for every frame.
   std::string GetFrameTimecodeText( const ITimecode& i_rStart, const IVideoTiming& i_rTiming,
                                     std::uint64_t i_FrameIndex );
-}
+} // namespace ZOL

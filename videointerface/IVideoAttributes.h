@@ -113,8 +113,7 @@ namespace ZOL
     Map m_Values;
   };
 
-  template< typename T >
-  class VValueTyped : public IVideoAttributes::IValue
+  template < typename T > class VValueTyped : public IVideoAttributes::IValue
   {
   public:
     VValueTyped( T i_Value, std::uint32_t i_Type ) : Value( std::move( i_Value ) ), Type( i_Type ) {}
@@ -125,4 +124,4 @@ namespace ZOL
     T Value;
     const std::uint32_t Type;
   };
-}
+} // namespace ZOL

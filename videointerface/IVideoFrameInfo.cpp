@@ -85,4 +85,4 @@ namespace ZOL
   {
     return static_cast< std::uint32_t >( GetVideoFrameSizeInBytes64( i_rInfo ) );
   }
-}
+} // namespace ZOL

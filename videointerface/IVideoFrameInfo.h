@@ -106,4 +106,4 @@ namespace ZOL
   std::uint32_t GetVideoFrameSizeInBytes( const IVideoFrameInfo& i_rInfo );
   // The same in 64 bits, for callers that must not be fooled by a huge size from a file.
   std::uint64_t GetVideoFrameSizeInBytes64( const IVideoFrameInfo& i_rInfo );
-}
+} // namespace ZOL

@@ -37,10 +37,10 @@ namespace ZOL
     const IEnumTable& rTable = VideoContainerTable();
     for( std::size_t i = 0; i < rTable.RowCount; ++i )
     {
-      const auto Container = static_cast< EVideoContainer >( rTable.Rows[ i ].Value );
+      const auto Container = static_cast< EVideoContainer >( rTable.Rows[i].Value );
       if( Name == ContainerExtension( Container ) )
         return Container;
     }
     return std::nullopt;
   }
-}
+} // namespace ZOL

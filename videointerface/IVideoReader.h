@@ -85,4 +85,4 @@ namespace ZOL
   // The container a file name names: "%FRAME%" or "%FRAME_NUMBER%" anywhere, or no extension,
   // means an image sequence; otherwise the extension compared exactly, case and all.
   std::optional< EVideoContainer > FindVideoContainer( const std::string& i_rFileName );
-}
+} // namespace ZOL

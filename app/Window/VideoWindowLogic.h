@@ -75,8 +75,8 @@ namespace LumekVideoViewer
   // is raised for a missing frame only while paused; during playback a gap just holds the picture.
   // Indices at or past i_FrameCount are known to be empty and are not read. With a finder, the
   // walk down jumps over a gap in one step instead of reading every missing number in it.
-  VFrameChoice ChooseFrame( int i_FrameIndex, std::uint64_t i_FrameCount, bool i_bPlaying,
-                            const VFrameReader& i_rRead, const VEarlierFrameFinder& i_rFindEarlier = nullptr );
+  VFrameChoice ChooseFrame( int i_FrameIndex, std::uint64_t i_FrameCount, bool i_bPlaying, const VFrameReader& i_rRead,
+                            const VEarlierFrameFinder& i_rFindEarlier = nullptr );
 
   // Where the surface places the image on the sensor. Offsets without a sensor size to measure
   // them against would push the picture off the outline, so they are dropped.

@@ -118,4 +118,3 @@ INSTANTIATE_TEST_SUITE_P( Formats, LogBadFormatTest,
                                            VBadFormatCase{ "PercentSignsInRawText", "100%% %q %", ZOL::LogFailure } ),
                           []( const testing::TestParamInfo< VBadFormatCase >& i_rInfo )
                           { return std::string( i_rInfo.param.Name ); } );
-

@@ -548,4 +548,3 @@ TEST( AttributeStore, SetReplacesTypeAndRemoveReportsPresence )
   EXPECT_FALSE( Store.Remove( "K" ) );
   EXPECT_FALSE( Store.GetType( "K", Type ) );
 }
-

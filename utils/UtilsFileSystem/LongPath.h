@@ -11,4 +11,4 @@ namespace UtilsFileSystem
   // to systems that need it.
   std::wstring MakeLongPath( const std::wstring& i_rPath );
   std::string MakeLongPath( const std::string& i_rPath );
-}
+} // namespace UtilsFileSystem

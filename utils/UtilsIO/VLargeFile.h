@@ -52,4 +52,4 @@ namespace UtilsIO
 
   // The C library's mode text for an open mode; empty for an unknown one.
   const char* OpenModeText( int i_Mode );
-}
+} // namespace UtilsIO

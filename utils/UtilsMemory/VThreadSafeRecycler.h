@@ -12,19 +12,19 @@
 
 namespace UtilsMemory
 {
-  template< typename T, std::size_t N >
-  class VThreadSafeRecycler
+  template < typename T, std::size_t N > class VThreadSafeRecycler
   {
     static_assert( N > 0, "blocks of at least one object" );
 
   public:
     VThreadSafeRecycler()
-        : m_Local( &VThreadSafeRecycler::DeleteLocal ),
-          m_pPool( new std::vector< T* >, []( std::vector< T* >* i_pPool ) {
-            for( T* p : *i_pPool )
-              delete p;
-            delete i_pPool;
-          } )
+        : m_Local( &VThreadSafeRecycler::DeleteLocal ), m_pPool( new std::vector< T* >,
+                                                                 []( std::vector< T* >* i_pPool )
+                                                                 {
+                                                                   for( T* p : *i_pPool )
+                                                                     delete p;
+                                                                   delete i_pPool;
+                                                                 } )
     {
     }
     VThreadSafeRecycler( const VThreadSafeRecycler& ) = delete;
@@ -111,11 +111,10 @@ namespace UtilsMemory
     boost::thread_specific_ptr< std::vector< T* > > m_Local;
     std::shared_ptr< std::vector< T* > > m_pPool;
   };
-}
+} // namespace UtilsMemory
 
 namespace ZOL
 {
   class IStandardBuffer;
-  template< typename TRecycler >
-  class IStandardBufferAllocator;
-}
+  template < typename TRecycler > class IStandardBufferAllocator;
+} // namespace ZOL

@@ -123,8 +123,8 @@ namespace
       benchmark::DoNotOptimize( pVideo->GetData() );
       Frame = ( Frame + 1 ) % FrameCount;
     }
-    io_rState.counters["heap/iter"] = benchmark::Counter( static_cast< double >( LumekTest::HeapCalls() - HeapCallsBefore ),
-                                                          benchmark::Counter::kAvgIterations );
+    io_rState.counters["heap/iter"] = benchmark::Counter(
+        static_cast< double >( LumekTest::HeapCalls() - HeapCallsBefore ), benchmark::Counter::kAvgIterations );
     ReportFrames( io_rState, rRecording.FrameSize );
   }
 

@@ -148,9 +148,8 @@ TEST( FrameChoiceEdges, IndicesPastTheEndAreNotRead )
 TEST( FrameChoiceEdges, AGapIsCrossedInOneStep )
 {
   std::vector< std::uint64_t > Reads;
-  const auto FindEarlier = []( std::uint64_t i_Index ) -> std::optional< std::uint64_t > {
-    return i_Index >= 2000000000u ? 2000000000u : 0u;
-  };
+  const auto FindEarlier = []( std::uint64_t i_Index ) -> std::optional< std::uint64_t >
+  { return i_Index >= 2000000000u ? 2000000000u : 0u; };
   const VFrameChoice Choice = ChooseFrame( 2000000001, 2000000002, false, GappyFile( { 0 }, &Reads ), FindEarlier );
   EXPECT_EQ( Choice.ShownIndex, 0 );
   EXPECT_TRUE( Choice.bMissingWarning );
