@@ -2,33 +2,98 @@
 #include "tools/LumekVideoTool/ToolCommon.h"
 
 #include <iostream>
-#include <map>
 #include <mutex>
+#include <sstream>
 
 namespace po = boost::program_options;
 
 namespace LumekVideoTool
 {
-  const char* UsageText()
+  const std::vector< VToolCommand >& ToolCommands()
   {
-    return "Usage: lumekvideotool COMMAND ...\n"
-           "\n"
-           "Commands:\n"
-           "  info FILE [--frame N]         what the viewer shows about the file and frame N, as JSON\n"
-           "  frames FILE OUTDIR [--first N] [--count N] [--png]\n"
-           "                                writes frames as OUTDIR/frame_NNNNNN.ppm (or .png), converted\n"
-           "                                to RGB with the file's display settings\n"
-           "  dump FILE                     the container's structure, where the reader has one\n"
-           "  convert INPUT OUTPUT.lvid     every frame of INPUT into a .lvid recording\n"
-           "  bench FILE [--frames N] [--software]\n"
-           "                                reads and decodes frames as playback does; speed as JSON\n"
-           "  make-sample OUTPUT.lvid [--width W] [--height H] [--frames N] [--fps F] [--format NAME]\n"
-           "                          [--audio | --no-audio]\n"
-           "                                writes a synthetic recording (default BayerGB8 1280x720,\n"
-           "                                300 frames at 100 fps, with a stereo test tone)\n"
-           "\n"
-           "Exit codes: 0 success, 1 the file cannot be opened, 2 usage error, 3 some frames could not\n"
-           "be read or decoded (the others are written).\n";
+    static const std::vector< VToolCommand > s_Commands = {
+        { "info", "FILE [--frame N]", "what the viewer shows about the file and frame N, as JSON", &RunInfo },
+        { "frames", "FILE OUTDIR [--first N] [--count N] [--png]",
+          "writes frames as OUTDIR/frame_NNNNNN.ppm (or .png), converted\n"
+          "to RGB with the file's display settings",
+          &RunFrames },
+        { "dump", "FILE", "the container's structure, where the reader has one", &RunDump },
+        { "convert", "INPUT OUTPUT.lvid", "every frame of INPUT into a .lvid recording", &RunConvert },
+        { "bench", "FILE [--frames N] [--software]", "reads and decodes frames as playback does; speed as JSON",
+          &RunBench },
+        { "make-sample",
+          "OUTPUT.lvid [--width W] [--height H] [--frames N] [--fps F] [--format NAME]\n"
+          "[--audio | --no-audio]",
+          "writes a synthetic recording (default BayerGB8 1280x720,\n"
+          "300 frames at 100 fps, with a stereo test tone)",
+          &RunMakeSample },
+    };
+    return s_Commands;
+  }
+
+  const VToolCommand* FindToolCommand( const std::string& i_rName )
+  {
+    for( const VToolCommand& rCommand : ToolCommands() )
+      if( i_rName == rCommand.Name )
+        return &rCommand;
+    return nullptr;
+  }
+
+  namespace
+  {
+    // Descriptions start in this column; a synopsis that reaches it puts its description below.
+    constexpr std::size_t s_DescriptionColumn = 32;
+
+    std::vector< std::string > SplitLines( const std::string& i_rText )
+    {
+      std::vector< std::string > Lines;
+      std::istringstream Stream( i_rText );
+      for( std::string Line; std::getline( Stream, Line ); )
+        Lines.push_back( Line );
+      return Lines;
+    }
+
+    void WriteCommandUsage( std::string& io_rText, const VToolCommand& i_rCommand )
+    {
+      const std::string Lead = std::string( "  " ) + i_rCommand.Name + " ";
+      const std::vector< std::string > Arguments = SplitLines( i_rCommand.Arguments );
+      std::string Line = Lead + ( Arguments.empty() ? std::string() : Arguments[0] );
+      for( std::size_t i = 1; i < Arguments.size(); ++i )
+      {
+        io_rText += Line + "\n";
+        Line = std::string( Lead.size(), ' ' ) + Arguments[i];
+      }
+      for( const std::string& rDescription : SplitLines( i_rCommand.Description ) )
+      {
+        if( Line.size() >= s_DescriptionColumn )
+        {
+          io_rText += Line + "\n";
+          Line.clear();
+        }
+        Line.resize( s_DescriptionColumn, ' ' );
+        io_rText += Line + rDescription + "\n";
+        Line.clear();
+      }
+      if( !Line.empty() )
+        io_rText += Line + "\n";
+    }
+  } // namespace
+
+  const std::string& UsageText()
+  {
+    static const std::string s_Text = []
+    {
+      std::string Text = "Usage: lumekvideotool COMMAND ...\n"
+                         "\n"
+                         "Commands:\n";
+      for( const VToolCommand& rCommand : ToolCommands() )
+        WriteCommandUsage( Text, rCommand );
+      Text += "\n"
+              "Exit codes: 0 success, 1 the file cannot be opened, 2 usage error, 3 some frames could not\n"
+              "be read or decoded (the others are written).\n";
+      return Text;
+    }();
+    return s_Text;
   }
 
   bool OpenSource( LumekVideoViewer::VVideoSource& io_rSource, const std::string& i_rPath, std::ostream& o_rErr )
@@ -74,11 +139,6 @@ namespace LumekVideoTool
 
   int RunTool( const VArguments& i_rArguments, std::ostream& o_rOut, std::ostream& o_rErr )
   {
-    using Command = int ( * )( const VArguments&, std::ostream&, std::ostream& );
-    static const std::map< std::string, Command > s_Commands = {
-        { "info", &RunInfo },       { "frames", &RunFrames }, { "dump", &RunDump },
-        { "convert", &RunConvert }, { "bench", &RunBench },   { "make-sample", &RunMakeSample } };
-
     if( i_rArguments.empty() )
     {
       o_rErr << UsageText();
@@ -89,8 +149,8 @@ namespace LumekVideoTool
       o_rOut << UsageText();
       return Exit_Success;
     }
-    const auto Found = s_Commands.find( i_rArguments[0] );
-    if( Found == s_Commands.end() )
+    const VToolCommand* pCommand = FindToolCommand( i_rArguments[0] );
+    if( !pCommand )
     {
       o_rErr << "lumekvideotool: unknown command '" << i_rArguments[0] << "'\n\n" << UsageText();
       return Exit_Usage;
@@ -102,6 +162,6 @@ namespace LumekVideoTool
         o_rOut << UsageText();
         return Exit_Success;
       }
-    return Found->second( Rest, o_rOut, o_rErr );
+    return pCommand->Run( Rest, o_rOut, o_rErr );
   }
 } // namespace LumekVideoTool
