@@ -1,7 +1,10 @@
 #include "app/VideoSource/VVideoSource.h"
 
+#include "fileio/H264IO/VH264Decoder.h"
+#include "fileio/H264Utils/H264Utils.h"
 #include "fileio/VideoEncoding/VideoFrameDecoder.h"
 #include "fileio/VideoReaders/CreateVideoReader.h"
+#include "services/Log.h"
 
 #include <algorithm>
 #include <climits>
@@ -18,8 +21,13 @@ namespace LumekVideoViewer
 
   bool VVideoSource::Open( const std::string& i_rPath )
   {
+    return Open( i_rPath, CreateVideoReader( i_rPath ) );
+  }
+
+  bool VVideoSource::Open( const std::string& i_rPath, std::shared_ptr< ZOL::IVideoReader > i_pReader )
+  {
     // The previous reader goes only now, with the assignment.
-    m_pReader = CreateVideoReader( i_rPath );
+    m_pReader = std::move( i_pReader );
     if( !m_pReader || !m_pReader->Open( i_rPath ) )
     {
       Close();
@@ -47,6 +55,9 @@ namespace LumekVideoViewer
 
     // Only H.264 payloads need a decoder object; without one such frames fail to decode, and say so.
     m_pH264Decoder.reset();
+    m_LastH264Frame.reset();
+    if( m_pReader->GetVideoPayload() == ZOL::VideoPayload_VideoH264 )
+      m_pH264Decoder = H264IO::VH264Decoder::Create( m_pFirstAllocator );
     return true;
   }
 
@@ -54,12 +65,16 @@ namespace LumekVideoViewer
   {
     m_pIndexQueries = nullptr;
     m_pReader.reset();
+    m_LastH264Frame.reset();
     return true;
   }
 
   bool VVideoSource::GetFrame( std::uint64_t i_Index, ZOL::IVideoFrame& o_rFrame )
   {
     if( !m_pReader )
+      return false;
+    const bool bH264 = m_pH264Decoder && m_pReader->GetVideoPayload() == ZOL::VideoPayload_VideoH264;
+    if( bH264 && !( m_LastH264Frame && *m_LastH264Frame + 1 == i_Index ) && !SeekH264( i_Index ) )
       return false;
     std::shared_ptr< ZOL::IBuffer > pBuffer;
     // The list is kept between frames, and copied into the caller's, so that a caller that keeps
@@ -79,6 +94,74 @@ namespace LumekVideoViewer
     const bool bDecoded = VideoEncoding::VideoFrameDecoder( Payload, Info, pBuffer, pFirst, pSecond, m_pH264Decoder );
     o_rFrame.VideoFrameInfo = Info;
     o_rFrame.Video = std::move( pBuffer );
+    if( bH264 )
+      m_LastH264Frame = bDecoded ? std::optional< std::uint64_t >( i_Index ) : std::nullopt;
+    return bDecoded;
+  }
+
+  namespace
+  {
+    // How far back a key frame is looked for. Encoders put one every few seconds; a file
+    // without one in this many frames cannot be scrubbed, and says so rather than stalling.
+    constexpr std::uint64_t MaxH264WalkBack = 1200;
+  } // namespace
+
+  bool VVideoSource::SeekH264( std::uint64_t i_Index )
+  {
+    // Frames missing from the index between the last decoded frame and this one cost nothing:
+    // the next stored frame still follows in decoding order.
+    if( m_LastH264Frame && *m_LastH264Frame < i_Index && FindFrameAtOrAfter( *m_LastH264Frame + 1 ) == i_Index )
+      return true;
+    const std::optional< std::uint64_t > Start = FindH264KeyFrame( i_Index );
+    if( !Start )
+    {
+      LUMEK_LOG( "H264IO", ZOL::LogFailure, "No key frame within %d frames before frame %d.", MaxH264WalkBack,
+                 i_Index );
+      m_LastH264Frame.reset();
+      return false;
+    }
+    // Only the last picture is kept; a frame that fails on the way leaves a gap in the
+    // references, as it would in playback.
+    for( std::optional< std::uint64_t > Frame = FindFrameAtOrAfter( *Start ); Frame && *Frame < i_Index;
+         Frame = FindFrameAtOrAfter( *Frame + 1 ) )
+      DecodeH264Frame( *Frame );
+    return true;
+  }
+
+  std::optional< std::uint64_t > VVideoSource::FindH264KeyFrame( std::uint64_t i_Index )
+  {
+    std::shared_ptr< ZOL::IBuffer > pBuffer;
+    std::uint64_t Walked = 0;
+    for( std::optional< std::uint64_t > Frame = FindFrameAtOrBefore( i_Index );
+         Frame && *Frame <= i_Index && Walked < MaxH264WalkBack; ++Walked )
+    {
+      // Reached the frame the decoder stands on: going on from there is cheaper than a key frame.
+      if( m_LastH264Frame && *m_LastH264Frame == *Frame && *Frame < i_Index )
+        return *Frame + 1;
+      m_AudioScratch.clear();
+      if( m_pReader->ReadFrameData( *Frame, pBuffer, m_AudioScratch, true, false ) && pBuffer &&
+          H264Utils::ContainsNALUnit( *pBuffer, H264Utils::H264NALUnitType_CodedSliceIDR,
+                                      H264Utils::EH264StreamForm::AnnexB ) )
+        return *Frame;
+      if( *Frame == 0 )
+        break;
+      Frame = FindFrameAtOrBefore( *Frame - 1 );
+    }
+    return std::nullopt;
+  }
+
+  bool VVideoSource::DecodeH264Frame( std::uint64_t i_Index )
+  {
+    std::shared_ptr< ZOL::IBuffer > pBuffer;
+    m_AudioScratch.clear();
+    if( !m_pReader->ReadFrameData( i_Index, pBuffer, m_AudioScratch, true, false ) )
+      return false;
+    ZOL::IVideoFrameInfo Info = m_pReader->GetVideoFrameInfo();
+    Info.PixelFormat = ZOL::PixelFormat_U8Y8V8Y8;
+    const std::shared_ptr< ZOL::IBufferAllocator > pFirst = m_pFirstAllocator;
+    const bool bDecoded =
+        VideoEncoding::VideoFrameDecoder( ZOL::VideoPayload_VideoH264, Info, pBuffer, pFirst, pFirst, m_pH264Decoder );
+    m_LastH264Frame = bDecoded ? std::optional< std::uint64_t >( i_Index ) : std::nullopt;
     return bDecoded;
   }
 

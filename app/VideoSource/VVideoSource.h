@@ -29,6 +29,8 @@ namespace LumekVideoViewer
 
     // Picks a reader by the path's name alone and opens it; false when no reader takes the file.
     bool Open( const std::string& i_rPath );
+    // The same with a reader the caller made, for containers not reached by name (tests).
+    bool Open( const std::string& i_rPath, std::shared_ptr< ZOL::IVideoReader > i_pReader );
     bool Close();
     bool IsOpen() const { return m_pReader != nullptr; }
 
@@ -68,6 +70,12 @@ namespace LumekVideoViewer
     const std::shared_ptr< ZOL::IVideoReader >& GetReader() const { return m_pReader; }
 
   private:
+    // H.264 frames depend on earlier ones: a frame that does not follow the last one decoded
+    // is reached by decoding forward from the key frame before it.
+    bool SeekH264( std::uint64_t i_Index );
+    std::optional< std::uint64_t > FindH264KeyFrame( std::uint64_t i_Index );
+    bool DecodeH264Frame( std::uint64_t i_Index );
+
     std::shared_ptr< ZOL::IVideoReader > m_pReader;
     const ZOL::IFrameIndexQueries* m_pIndexQueries = nullptr;
     std::string m_FilePath;
@@ -78,5 +86,7 @@ namespace LumekVideoViewer
     CoreLumekTypes::VLensDistortionCalibration m_Lens;
     CoreLumekTypes::VCameraHardware m_Camera;
     ZOL::IAudioBuffers m_AudioScratch;
+    // The frame the H.264 decoder's references belong to: the last one it decoded in order.
+    std::optional< std::uint64_t > m_LastH264Frame;
   };
 } // namespace LumekVideoViewer

@@ -26,7 +26,8 @@ namespace H264Utils
       return false;
     o_rCleaned.assign( i_pData, i_pData + First );
     o_rCleaned.reserve( static_cast< std::size_t >( i_Size ) );
-    Zeros = 0;
+    // The scan stopped on the escape itself, behind its two zeros.
+    Zeros = 2;
     for( std::uint64_t i = First; i < i_Size; ++i )
     {
       if( Zeros >= 2 && i_pData[i] == 3 && i + 1 < i_Size && i_pData[i + 1] <= 3 )
