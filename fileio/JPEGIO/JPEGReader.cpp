@@ -167,7 +167,8 @@ namespace JPEGIO
     int Subsampling = 0;
     if( i_pData == nullptr || i_Size == 0 || i_Size > ULONG_MAX ||
         tjDecompressHeader2( Decompressor.Get(), const_cast< unsigned char* >( i_pData ),
-                             static_cast< unsigned long >( i_Size ), &Width, &Height, &Subsampling ) != 0 )
+                             static_cast< unsigned long >( i_Size ), &Width, &Height, &Subsampling ) != 0 ||
+        Width <= 0 || Height <= 0 )
     {
       LUMEK_LOG( "JPEGIO", LogFailure, "Couldn't decode JPEG header." );
       return false;
@@ -175,7 +176,7 @@ namespace JPEGIO
     const VOutputRow& rOutput = ChooseOutput( io_VideoFrameInfo.PixelFormat, Subsampling, Width );
     const std::uint64_t Bytes =
         static_cast< std::uint64_t >( Width ) * static_cast< std::uint64_t >( Height ) * rOutput.BytesPerPixel;
-    if( Width <= 0 || Height <= 0 || Width > MaxImageSide || Height > MaxImageSide || Bytes > MaxImageBytes )
+    if( Width > MaxImageSide || Height > MaxImageSide || Bytes >= MaxImageBytes )
     {
       LUMEK_LOG( "JPEGIO", LogFailure, "JPEG image of %d x %d is too large to decode.", Width, Height );
       return false;

@@ -11,8 +11,9 @@
 
 namespace JPEGIO
 {
-  // No frame the viewer shows comes near these; a header that claims more is not believed, so
-  // that a few damaged bytes cannot ask for gigabytes.
+  // No frame the viewer shows comes near these; a header that claims a longer side, or a frame
+  // of MaxImageBytes or more, is not believed, so that a few damaged bytes cannot ask for
+  // gigabytes.
   constexpr std::int32_t MaxImageSide = 32768;
   constexpr std::uint64_t MaxImageBytes = std::uint64_t( 1 ) << 31;
 
