@@ -216,8 +216,7 @@ namespace JPEGUtils
     {
       const std::uint64_t Start = Window.Position();
       std::uint8_t First = 0;
-      std::uint8_t Second = 0;
-      if( !Window.Next( First ) || !Window.Next( Second ) )
+      if( !Window.Next( First ) )
         break;
       if( First != 0xFF )
       {
@@ -226,9 +225,13 @@ namespace JPEGUtils
           LUMEK_LOG( "JPEGIO", ZOL::LogFailure, "Unrecognised data found in buffer at 0x%x", Start );
           return false;
         }
-        Window.Seek( Start + 1 );
+        // Entropy-coded data, or bytes after the image: only a marker ends them, and the last
+        // byte of the range may be one of them.
         continue;
       }
+      std::uint8_t Second = 0;
+      if( !Window.Next( Second ) )
+        break;
       if( Second == 0 )
       {
         if( bInScan )
