@@ -4,6 +4,8 @@
 // enumeration has one constant table that converts both ways, and whose descriptions are
 // the texts of the properties panel.
 
+#include "utils/ResultCodes.h"
+
 #include <cstdint>
 #include <optional>
 #include <string>
@@ -154,19 +156,4 @@ namespace ZOL
 
   // Parameters a radial model takes; -1 for a model that is not usable.
   int RadialModelParameterCount( ERadialModel i_Model );
-
-  // Result codes: top bit clear is success, set is failure.
-  using ResultCode = std::uint32_t;
-  constexpr ResultCode Result_Ok = 0x0;
-  constexpr ResultCode Result_Failed = 0x80000000u;
-  constexpr ResultCode Result_FileIOFailure = 0x80000021u;
-  constexpr ResultCode Result_FileNotOpen = 0x80000026u;
-  constexpr ResultCode Result_FileNotFound = 0x8000002Au;
-  inline bool Succeeded( ResultCode i_Code )
-  {
-    return ( i_Code & 0x80000000u ) == 0;
-  }
-
-  // The message of a result code, or "Unknown result code".
-  const std::string& GetResultText( ResultCode i_Code );
 } // namespace ZOL
