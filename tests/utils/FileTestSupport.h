@@ -1,0 +1,92 @@
+#pragma once
+
+// Files and log lines for the file function tests.
+
+#include "services/ILogCategorised.h"
+
+#include <boost/filesystem.hpp>
+
+#include <cstdint>
+#include <fstream>
+#include <string>
+#include <vector>
+
+namespace LumekTest
+{
+  // A folder of its own for each test, removed with everything in it.
+  class VTemporaryFolder
+  {
+  public:
+    VTemporaryFolder()
+        : m_Path( boost::filesystem::temp_directory_path() / boost::filesystem::unique_path( "fileio-%%%%-%%%%-%%%%" ) )
+    {
+      boost::filesystem::create_directories( m_Path );
+    }
+    ~VTemporaryFolder()
+    {
+      boost::system::error_code Error;
+      boost::filesystem::remove_all( m_Path, Error );
+    }
+    std::string File( const std::string& i_rName ) const { return ( m_Path / i_rName ).string(); }
+    std::string Path() const { return m_Path.string(); }
+
+  private:
+    boost::filesystem::path m_Path;
+  };
+
+  // Bytes that differ at every position within a page, so a byte read from the wrong offset shows.
+  inline std::vector< std::uint8_t > PatternBytes( std::uint64_t i_Size )
+  {
+    std::vector< std::uint8_t > Bytes( i_Size );
+    for( std::uint64_t i = 0; i < i_Size; ++i )
+      Bytes[i] = static_cast< std::uint8_t >( ( i * 131 + ( i >> 12 ) * 7 ) & 0xFF );
+    return Bytes;
+  }
+
+  inline void WriteBytes( const std::string& i_rPath, const std::vector< std::uint8_t >& i_rBytes )
+  {
+    std::ofstream File( i_rPath, std::ios::binary | std::ios::trunc );
+    File.write( reinterpret_cast< const char* >( i_rBytes.data() ), static_cast< std::streamsize >( i_rBytes.size() ) );
+  }
+
+  inline std::string ReadText( const std::string& i_rPath )
+  {
+    std::ifstream File( i_rPath, std::ios::binary );
+    return std::string( std::istreambuf_iterator< char >( File ), std::istreambuf_iterator< char >() );
+  }
+
+  // Every message of one category up to a level, with standard error quiet, for the life of a test.
+  class VSystemLogCapture
+  {
+  public:
+    explicit VSystemLogCapture( int i_Level = ZOL::LogDetail )
+    {
+      m_StandardErrorLevel = ZOL::GlobalLog().GetStandardErrorLevel();
+      ZOL::GlobalLog().SetStandardErrorLevel( 0 );
+      m_Sink = ZOL::GlobalLog().AddSink(
+          [this]( const ZOL::ILogRecord& i_rRecord )
+          {
+            if( i_rRecord.Category == "System" )
+              Messages.push_back( i_rRecord.Message );
+          },
+          i_Level );
+    }
+    ~VSystemLogCapture()
+    {
+      ZOL::GlobalLog().RemoveSink( m_Sink );
+      ZOL::GlobalLog().SetStandardErrorLevel( m_StandardErrorLevel );
+    }
+    bool Has( const std::string& i_rMessage ) const
+    {
+      for( const std::string& rMessage : Messages )
+        if( rMessage == i_rMessage )
+          return true;
+      return false;
+    }
+    std::vector< std::string > Messages;
+
+  private:
+    int m_Sink = 0;
+    int m_StandardErrorLevel = 0;
+  };
+} // namespace LumekTest
