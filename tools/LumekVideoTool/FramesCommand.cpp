@@ -12,6 +12,7 @@
 #include <algorithm>
 #include <chrono>
 #include <climits>
+#include <ctime>
 #include <cstdio>
 #include <fstream>
 
@@ -152,6 +153,8 @@ namespace LumekVideoTool
     std::vector< std::uint8_t > RGB;
     std::uint64_t Failed = 0, Read = 0;
     const auto Start = std::chrono::steady_clock::now();
+    // Processor time too: it compares with "ffmpeg -benchmark" whatever else runs on the machine.
+    const std::clock_t ProcessorStart = std::clock();
     // A frame missing from the index is not a decoding failure: playback shows the one before.
     for( auto Index = Source.FindFrameAtOrAfter( 0 ); Index && *Index < Frames;
          Index = Source.FindFrameAtOrAfter( *Index + 1 ) )
@@ -163,6 +166,7 @@ namespace LumekVideoTool
         ++Failed;
     }
     const double Seconds = std::chrono::duration< double >( std::chrono::steady_clock::now() - Start ).count();
+    const double ProcessorSeconds = static_cast< double >( std::clock() - ProcessorStart ) / CLOCKS_PER_SEC;
 
     VJsonWriter Json;
     Json.BeginObject();
@@ -170,6 +174,8 @@ namespace LumekVideoTool
     Json.Key( "seconds" ).Value( Seconds );
     Json.Key( "fps" ).Value( Seconds > 0.0 ? Read / Seconds : 0.0 );
     Json.Key( "msPerFrame" ).Value( Read > 0 ? Seconds * 1000.0 / Read : 0.0 );
+    Json.Key( "payload" ).Value( ZOL::ToString( Source.GetVideoPayload() ) );
+    Json.Key( "processorSeconds" ).Value( ProcessorSeconds );
     Json.Key( "peakRssMiB" ).Value( PeakResidentMiB() );
     Json.EndObject();
     o_rOut << Json.GetText() << std::endl;

@@ -8,49 +8,43 @@ namespace LumekVideoTool
 {
   namespace
   {
-    void WriteVideo( VJsonWriter& io_rJson, const LumekVideoViewer::VVideoSource& i_rSource )
+    QJsonObject Video( const LumekVideoViewer::VVideoSource& i_rSource )
     {
       const ZOL::IVideoFrameInfo& rInfo = i_rSource.GetVideoFrameInfo();
-      io_rJson.Key( "video" ).BeginObject();
-      io_rJson.Key( "payload" ).Value( ZOL::ToString( i_rSource.GetVideoPayload() ) );
-      io_rJson.Key( "pixelFormat" ).Value( ZOL::ToString( rInfo.PixelFormat ) );
-      io_rJson.Key( "width" ).Value( rInfo.ImageWidth );
-      io_rJson.Key( "height" ).Value( rInfo.ImageHeight );
-      io_rJson.Key( "frameRate" ).Value( i_rSource.GetFrameRate() );
-      io_rJson.Key( "frameCount" ).Value( i_rSource.GetFrameCount() );
-      io_rJson.Key( "missingFrames" ).Value( i_rSource.GetMissingFrameCount() );
-      io_rJson.Key( "durationSeconds" ).Value( i_rSource.GetDurationInSeconds() );
-      io_rJson.Key( "pixelAspectRatio" ).Value( rInfo.PixelAspectRatio );
-      io_rJson.Key( "inverted" ).Value( rInfo.IsInverted() );
-      io_rJson.EndObject();
+      return { { "payload", JsonText( ZOL::ToString( i_rSource.GetVideoPayload() ) ) },
+               { "pixelFormat", JsonText( ZOL::ToString( rInfo.PixelFormat ) ) },
+               { "width", rInfo.ImageWidth },
+               { "height", rInfo.ImageHeight },
+               { "frameRate", JsonNumber( i_rSource.GetFrameRate() ) },
+               { "frameCount", JsonCount( i_rSource.GetFrameCount() ) },
+               { "missingFrames", JsonCount( i_rSource.GetMissingFrameCount() ) },
+               { "durationSeconds", JsonNumber( i_rSource.GetDurationInSeconds() ) },
+               { "pixelAspectRatio", JsonNumber( rInfo.PixelAspectRatio ) },
+               { "inverted", rInfo.IsInverted() } };
     }
 
-    void WriteAudio( VJsonWriter& io_rJson, const LumekVideoViewer::VVideoSource& i_rSource )
+    QJsonObject Audio( const LumekVideoViewer::VVideoSource& i_rSource )
     {
       const ZOL::IAudioFrameInfo& rInfo = i_rSource.GetAudioFrameInfo();
-      io_rJson.Key( "audio" ).BeginObject();
-      io_rJson.Key( "payload" ).Value( ZOL::ToString( i_rSource.GetAudioPayload() ) );
-      io_rJson.Key( "sampleFormat" ).Value( ZOL::ToString( rInfo.SampleFormat ) );
-      io_rJson.Key( "sampleRate" ).Value( rInfo.SampleRate );
-      io_rJson.Key( "channels" ).Value( rInfo.Channels );
-      io_rJson.EndObject();
+      return { { "payload", JsonText( ZOL::ToString( i_rSource.GetAudioPayload() ) ) },
+               { "sampleFormat", JsonText( ZOL::ToString( rInfo.SampleFormat ) ) },
+               { "sampleRate", rInfo.SampleRate },
+               { "channels", rInfo.Channels } };
     }
 
-    void WriteFrame( VJsonWriter& io_rJson, LumekVideoViewer::VVideoSource& io_rSource, std::uint64_t i_Index )
+    QJsonObject FrameReport( LumekVideoViewer::VVideoSource& io_rSource, std::uint64_t i_Index )
     {
       ZOL::IVideoFrame Frame;
       const bool bRead = io_rSource.GetFrame( i_Index, Frame );
-      io_rJson.Key( "frame" ).BeginObject();
-      io_rJson.Key( "index" ).Value( i_Index );
-      io_rJson.Key( "read" ).Value( bRead );
-      io_rJson.Key( "width" ).Value( Frame.VideoFrameInfo.ImageWidth );
-      io_rJson.Key( "height" ).Value( Frame.VideoFrameInfo.ImageHeight );
-      io_rJson.Key( "pixelFormat" ).Value( ZOL::ToString( Frame.VideoFrameInfo.PixelFormat ) );
-      io_rJson.Key( "audioBlocks" ).BeginArray();
+      QJsonArray AudioBlocks;
       for( const auto& rpBlock : Frame.Audio )
-        io_rJson.Value( static_cast< std::uint64_t >( rpBlock ? rpBlock->GetSize() : 0 ) );
-      io_rJson.EndArray();
-      io_rJson.EndObject();
+        AudioBlocks.append( JsonCount( rpBlock ? rpBlock->GetSize() : 0 ) );
+      return { { "index", JsonCount( i_Index ) },
+               { "read", bRead },
+               { "width", Frame.VideoFrameInfo.ImageWidth },
+               { "height", Frame.VideoFrameInfo.ImageHeight },
+               { "pixelFormat", JsonText( ZOL::ToString( Frame.VideoFrameInfo.PixelFormat ) ) },
+               { "audioBlocks", AudioBlocks } };
     }
   } // namespace
 
@@ -59,10 +53,14 @@ namespace LumekVideoTool
     po::options_description Options;
     Options.add_options()( "file", po::value< std::string >()->required() )(
         "frame", po::value< std::uint64_t >()->default_value( 0 ) );
+    AddJsonLayoutOptions( Options );
     po::positional_options_description Positional;
     Positional.add( "file", 1 );
     const auto Variables = ParseArguments( i_rArguments, Options, Positional, "info", o_rErr );
     if( !Variables )
+      return Exit_Usage;
+    const auto Layout = JsonLayoutFrom( *Variables, o_rErr );
+    if( !Layout )
       return Exit_Usage;
     const std::string Path = ( *Variables )["file"].as< std::string >();
     const std::uint64_t Index = ( *Variables )["frame"].as< std::uint64_t >();
@@ -71,29 +69,25 @@ namespace LumekVideoTool
     if( !OpenSource( Source, Path, o_rErr ) )
       return Exit_CannotOpen;
 
-    VJsonWriter Json;
-    Json.BeginObject();
-    Json.Key( "file" ).Value( Path );
+    QJsonObject Report;
+    Report.insert( "file", JsonText( Path ) );
     const auto Container = ZOL::FindVideoContainer( Path );
-    Json.Key( "container" ).Value( Container ? ZOL::ToString( *Container ) : "" );
-    WriteVideo( Json, Source );
-    WriteAudio( Json, Source );
+    Report.insert( "container", JsonText( Container ? ZOL::ToString( *Container ) : "" ) );
+    Report.insert( "video", Video( Source ) );
+    Report.insert( "audio", Audio( Source ) );
 
     const LumekVideoViewer::VInfoPanelTexts Texts = LumekVideoViewer::ComposeInfoPanelTexts( Source, Index );
-    Json.Key( "infoPanel" ).BeginObject();
-    Json.Key( "video" ).Value( Texts.Video );
-    Json.Key( "audio" ).Value( Texts.Audio );
-    Json.Key( "timecode" ).Value( Texts.Timecode );
-    Json.EndObject();
+    Report.insert( "infoPanel", QJsonObject{ { "video", JsonText( Texts.Video ) },
+                                             { "audio", JsonText( Texts.Audio ) },
+                                             { "timecode", JsonText( Texts.Timecode ) } } );
 
-    WriteFrame( Json, Source, Index );
+    Report.insert( "frame", FrameReport( Source, Index ) );
 
-    Json.Key( "properties" ).BeginArray();
+    QJsonArray Properties;
     for( const auto& rRow : LumekVideoViewer::ComposePropertyRows( Source ) )
-      Json.BeginArray().Value( rRow.first ).Value( rRow.second ).EndArray();
-    Json.EndArray();
-    Json.EndObject();
-    o_rOut << Json.GetText() << std::endl;
+      Properties.append( QJsonArray{ JsonText( rRow.first ), JsonText( rRow.second ) } );
+    Report.insert( "properties", Properties );
+    WriteJson( o_rOut, Report, *Layout );
     return Exit_Success;
   }
 

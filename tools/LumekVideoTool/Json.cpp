@@ -1,186 +1,64 @@
 #include "tools/LumekVideoTool/Json.h"
 
+#include <QJsonDocument>
+
+#include <unistd.h>
+
 #include <cmath>
-#include <cstdio>
+#include <iostream>
+#include <limits>
+
+namespace po = boost::program_options;
 
 namespace LumekVideoTool
 {
-  void VJsonWriter::Separate()
+  void AddJsonLayoutOptions( po::options_description& io_rOptions )
   {
-    if( m_bAfterKey )
+    io_rOptions.add_options()( "compact", po::bool_switch() )( "pretty", po::bool_switch() );
+  }
+
+  std::optional< EJsonLayout > JsonLayoutFrom( const po::variables_map& i_rVariables, std::ostream& o_rErr )
+  {
+    const bool bCompact = i_rVariables.count( "compact" ) && i_rVariables["compact"].as< bool >();
+    const bool bPretty = i_rVariables.count( "pretty" ) && i_rVariables["pretty"].as< bool >();
+    if( bCompact && bPretty )
     {
-      m_bAfterKey = false;
-      return;
+      o_rErr << "lumekvideotool: choose one of --compact and --pretty" << std::endl;
+      return std::nullopt;
     }
-    if( !m_First.empty() )
-    {
-      if( !m_First.back() )
-        m_Text += ',';
-      m_First.back() = false;
-    }
+    if( bCompact )
+      return EJsonLayout::Compact;
+    return bPretty ? EJsonLayout::Indented : EJsonLayout::Automatic;
   }
 
-  VJsonWriter& VJsonWriter::BeginObject()
+  void WriteJson( std::ostream& o_rOut, const QJsonObject& i_rReport, EJsonLayout i_Layout )
   {
-    Separate();
-    m_Text += '{';
-    m_First.push_back( true );
-    return *this;
+    // Only std::cout is standard output; any other stream is a file or a test's buffer.
+    const bool bIndented = i_Layout == EJsonLayout::Indented ||
+                           ( i_Layout == EJsonLayout::Automatic && &o_rOut == &std::cout && isatty( STDOUT_FILENO ) );
+    const QByteArray Text =
+        QJsonDocument( i_rReport ).toJson( bIndented ? QJsonDocument::Indented : QJsonDocument::Compact );
+    o_rOut.write( Text.constData(), Text.size() );
+    // The indented form ends in a newline already.
+    if( !Text.endsWith( '\n' ) )
+      o_rOut << '\n';
+    o_rOut.flush();
   }
 
-  VJsonWriter& VJsonWriter::EndObject()
+  QJsonValue JsonText( const std::string& i_rText )
   {
-    m_Text += '}';
-    m_First.pop_back();
-    return *this;
+    return QString::fromUtf8( i_rText.data(), static_cast< int >( i_rText.size() ) );
   }
 
-  VJsonWriter& VJsonWriter::BeginArray()
+  QJsonValue JsonCount( std::uint64_t i_Count )
   {
-    Separate();
-    m_Text += '[';
-    m_First.push_back( true );
-    return *this;
+    if( i_Count <= static_cast< std::uint64_t >( std::numeric_limits< qint64 >::max() ) )
+      return static_cast< qint64 >( i_Count );
+    return static_cast< double >( i_Count );
   }
 
-  VJsonWriter& VJsonWriter::EndArray()
+  QJsonValue JsonNumber( double i_Value )
   {
-    m_Text += ']';
-    m_First.pop_back();
-    return *this;
-  }
-
-  VJsonWriter& VJsonWriter::Key( const std::string& i_rKey )
-  {
-    Separate();
-    m_Text += Quote( i_rKey );
-    m_Text += ':';
-    m_bAfterKey = true;
-    return *this;
-  }
-
-  VJsonWriter& VJsonWriter::Value( const std::string& i_rValue )
-  {
-    Separate();
-    m_Text += Quote( i_rValue );
-    return *this;
-  }
-
-  VJsonWriter& VJsonWriter::Value( bool i_bValue )
-  {
-    Separate();
-    m_Text += i_bValue ? "true" : "false";
-    return *this;
-  }
-
-  VJsonWriter& VJsonWriter::Value( std::int64_t i_Value )
-  {
-    Separate();
-    m_Text += std::to_string( i_Value );
-    return *this;
-  }
-
-  VJsonWriter& VJsonWriter::Value( std::uint64_t i_Value )
-  {
-    Separate();
-    m_Text += std::to_string( i_Value );
-    return *this;
-  }
-
-  VJsonWriter& VJsonWriter::Value( double i_Value )
-  {
-    Separate();
-    if( !std::isfinite( i_Value ) )
-    {
-      m_Text += "null";
-      return *this;
-    }
-    char Buffer[32];
-    std::snprintf( Buffer, sizeof( Buffer ), "%.15g", i_Value );
-    m_Text += Buffer;
-    return *this;
-  }
-
-  namespace
-  {
-    // Length of the well-formed UTF-8 sequence at i, or 0. Texts from a damaged file may hold any
-    // bytes, and the report must stay valid JSON.
-    std::size_t Utf8SequenceLength( const std::string& i_rText, std::size_t i )
-    {
-      const auto Lead = static_cast< unsigned char >( i_rText[i] );
-      std::size_t Length = 0;
-      std::uint32_t CodePoint = 0;
-      if( Lead >= 0xC2 && Lead <= 0xDF )
-        Length = 2, CodePoint = Lead & 0x1Fu;
-      else if( Lead >= 0xE0 && Lead <= 0xEF )
-        Length = 3, CodePoint = Lead & 0x0Fu;
-      else if( Lead >= 0xF0 && Lead <= 0xF4 )
-        Length = 4, CodePoint = Lead & 0x07u;
-      else
-        return 0;
-      if( i + Length > i_rText.size() )
-        return 0;
-      for( std::size_t k = 1; k < Length; ++k )
-      {
-        const auto Next = static_cast< unsigned char >( i_rText[i + k] );
-        if( ( Next & 0xC0u ) != 0x80u )
-          return 0;
-        CodePoint = ( CodePoint << 6 ) | ( Next & 0x3Fu );
-      }
-      static const std::uint32_t s_Smallest[5] = { 0, 0, 0x80, 0x800, 0x10000 };
-      if( CodePoint < s_Smallest[Length] || CodePoint > 0x10FFFF || ( CodePoint >= 0xD800 && CodePoint <= 0xDFFF ) )
-        return 0;
-      return Length;
-    }
-  } // namespace
-
-  std::string VJsonWriter::Quote( const std::string& i_rText )
-  {
-    std::string Quoted = "\"";
-    for( std::size_t i = 0; i < i_rText.size(); ++i )
-    {
-      const auto c = static_cast< unsigned char >( i_rText[i] );
-      if( c >= 0x80 )
-      {
-        const std::size_t Length = Utf8SequenceLength( i_rText, i );
-        if( Length == 0 )
-          Quoted += "\\ufffd";
-        else
-        {
-          Quoted.append( i_rText, i, Length );
-          i += Length - 1;
-        }
-        continue;
-      }
-      switch( c )
-      {
-      case '"':
-        Quoted += "\\\"";
-        break;
-      case '\\':
-        Quoted += "\\\\";
-        break;
-      case '\n':
-        Quoted += "\\n";
-        break;
-      case '\r':
-        Quoted += "\\r";
-        break;
-      case '\t':
-        Quoted += "\\t";
-        break;
-      default:
-        if( c < 0x20 )
-        {
-          char Buffer[8];
-          std::snprintf( Buffer, sizeof( Buffer ), "\\u%04x", c );
-          Quoted += Buffer;
-        }
-        else
-          Quoted += static_cast< char >( c );
-      }
-    }
-    Quoted += '"';
-    return Quoted;
+    return std::isfinite( i_Value ) ? QJsonValue( i_Value ) : QJsonValue();
   }
 } // namespace LumekVideoTool

@@ -1,39 +1,45 @@
 #pragma once
 
-// A small writer of compact JSON text, enough for the tool's reports.
+// The tool's JSON reports are built as Qt JSON objects and written by QJsonDocument. Like ffprobe
+// and jq, a report is indented for a person at a terminal and compact for a pipe or a file.
+
+#include <QJsonArray>
+#include <QJsonObject>
+#include <QJsonValue>
+
+#include <boost/program_options.hpp>
 
 #include <cstdint>
+#include <optional>
+#include <ostream>
 #include <string>
-#include <vector>
 
 namespace LumekVideoTool
 {
-  class VJsonWriter
+  enum class EJsonLayout
   {
-  public:
-    VJsonWriter& BeginObject();
-    VJsonWriter& EndObject();
-    VJsonWriter& BeginArray();
-    VJsonWriter& EndArray();
-    // The key of the next value inside an object.
-    VJsonWriter& Key( const std::string& i_rKey );
-    VJsonWriter& Value( const std::string& i_rValue );
-    VJsonWriter& Value( const char* i_pValue ) { return Value( std::string( i_pValue ) ); }
-    VJsonWriter& Value( bool i_bValue );
-    VJsonWriter& Value( std::int64_t i_Value );
-    VJsonWriter& Value( std::uint64_t i_Value );
-    VJsonWriter& Value( int i_Value ) { return Value( static_cast< std::int64_t >( i_Value ) ); }
-    VJsonWriter& Value( double i_Value );
-
-    const std::string& GetText() const { return m_Text; }
-
-    static std::string Quote( const std::string& i_rText );
-
-  private:
-    void Separate();
-
-    std::string m_Text;
-    std::vector< bool > m_First; // per open object or array: nothing written in it yet
-    bool m_bAfterKey = false;
+    Automatic, // indented when standard output is a terminal
+    Compact,
+    Indented,
   };
+
+  // Adds "--compact" and "--pretty" to a command's options.
+  void AddJsonLayoutOptions( boost::program_options::options_description& io_rOptions );
+
+  // The layout the options chose; nothing (and the reason on o_rErr) when both were given.
+  std::optional< EJsonLayout > JsonLayoutFrom( const boost::program_options::variables_map& i_rVariables,
+                                               std::ostream& o_rErr );
+
+  // Writes the report and a newline.
+  void WriteJson( std::ostream& o_rOut, const QJsonObject& i_rReport, EJsonLayout i_Layout );
+
+  // Texts from a file may hold any bytes: a broken UTF-8 sequence becomes U+FFFD, so the report
+  // stays valid JSON.
+  QJsonValue JsonText( const std::string& i_rText );
+
+  // Qt writes every number through a double: counts are exact up to 2^53.
+  QJsonValue JsonCount( std::uint64_t i_Count );
+
+  // JSON has no infinity or NaN; they are written as null.
+  QJsonValue JsonNumber( double i_Value );
 } // namespace LumekVideoTool

@@ -12,21 +12,28 @@ namespace LumekVideoTool
   const std::vector< VToolCommand >& ToolCommands()
   {
     static const std::vector< VToolCommand > s_Commands = {
-        { "info", "FILE [--frame N]", "what the viewer shows about the file and frame N, as JSON", &RunInfo },
+        { "info", "FILE [--frame N] [--compact | --pretty]",
+          "what the viewer shows about the file and frame N, as JSON\n"
+          "(indented at a terminal, compact otherwise)",
+          &RunInfo },
         { "frames", "FILE OUTDIR [--first N] [--count N] [--png]",
           "writes frames as OUTDIR/frame_NNNNNN.ppm (or .png), converted\n"
           "to RGB with the file's display settings",
           &RunFrames },
         { "dump", "FILE", "the container's structure, where the reader has one", &RunDump },
         { "convert", "INPUT OUTPUT.lvid", "every frame of INPUT into a .lvid recording", &RunConvert },
-        { "bench", "FILE [--frames N] [--software]", "reads and decodes frames as playback does; speed as JSON",
-          &RunBench },
+        { "bench", "FILE [--frames N] [--software] [--compact | --pretty]",
+          "reads and decodes frames as playback does; speed as JSON", &RunBench },
         { "make-sample",
           "OUTPUT.lvid [--width W] [--height H] [--frames N] [--fps F] [--format NAME]\n"
           "[--audio | --no-audio]",
           "writes a synthetic recording (default BayerGB8 1280x720,\n"
           "300 frames at 100 fps, with a stereo test tone)",
           &RunMakeSample },
+        { "thumbnail", "INPUT OUTPUT.png [--size N]",
+          "a PNG preview for file managers: the first frame that reads, as\n"
+          "the viewer shows it, scaled to fit N x N (default 256)",
+          &RunThumbnail },
     };
     return s_Commands;
   }

@@ -25,6 +25,7 @@ namespace LumekVideoTool
   int RunConvert( const VArguments& i_rArguments, std::ostream& o_rOut, std::ostream& o_rErr );
   int RunBench( const VArguments& i_rArguments, std::ostream& o_rOut, std::ostream& o_rErr );
   int RunMakeSample( const VArguments& i_rArguments, std::ostream& o_rOut, std::ostream& o_rErr );
+  int RunThumbnail( const VArguments& i_rArguments, std::ostream& o_rOut, std::ostream& o_rErr );
 
   using VCommandEntry = int ( * )( const VArguments& i_rArguments, std::ostream& o_rOut, std::ostream& o_rErr );
 

@@ -1,7 +1,6 @@
 // The sample encoder writes the stored layouts by hand; check them against the layout rules.
 
 #include "tools/LumekVideoTool/FrameEncoding.h"
-#include "tools/LumekVideoTool/Json.h"
 #include "tools/LumekVideoTool/SampleScene.h"
 
 #include <gtest/gtest.h>
@@ -81,19 +80,4 @@ TEST( SampleScene, ToneRunsOnAcrossFrames )
   for( int Frame = 0; Frame < 7; ++Frame )
     Total += LumekVideoTool::RenderSampleTone( Frame, 7.0, 48000 ).size();
   EXPECT_EQ( Total, 48000u * 4 );
-}
-
-TEST( Json, EscapesAndKeepsItValid )
-{
-  LumekVideoTool::VJsonWriter Json;
-  Json.BeginObject()
-      .Key( "a\"b" )
-      .Value( std::string( "line\n\x01\xff\xc3\xa9" ) )
-      .Key( "n" )
-      .BeginArray()
-      .Value( 1 )
-      .Value( 2.5 )
-      .EndArray()
-      .EndObject();
-  EXPECT_EQ( Json.GetText(), "{\"a\\\"b\":\"line\\n\\u0001\\ufffd\xc3\xa9\",\"n\":[1,2.5]}" );
 }

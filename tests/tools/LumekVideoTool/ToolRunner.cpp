@@ -107,6 +107,8 @@ namespace LumekVideoToolTest
     Video.ImageHeight = i_rSpec.Height;
     Video.PixelFormat = i_rSpec.Format;
     Video.PixelAspectRatio = 1.0;
+    if( i_rSpec.bInverted )
+      Video.Flags |= ZOL::IVideoFrameInfo::Flag_Inverted;
     ZOL::IAudioFrameInfo Audio;
     if( i_rSpec.bAudio )
       Audio = { ZOL::AudioSampleFormat_Int16, 48000, 2 };

@@ -45,6 +45,7 @@ namespace LumekVideoToolTest
     int Height = 4;
     std::vector< std::uint64_t > Frames = { 0, 1, 2 };
     bool bAudio = false;
+    bool bInverted = false; // rows stored bottom to top
     ZOL::IVideoSettings Settings;
   };
 

@@ -1,0 +1,140 @@
+// Thumbnails are what a file manager shows of a recording: the first frame that reads, as the
+// viewer shows it, fitted into the requested square.
+
+#include "ToolRunner.h"
+
+#include <gtest/gtest.h>
+
+#include <QImage>
+
+#include <boost/format.hpp>
+
+#include <cstdlib>
+
+using namespace LumekVideoToolTest;
+
+namespace
+{
+  struct VThumbnailCase
+  {
+    const char* Name;
+    ZOL::EPixelFormat Format;
+    int Width;
+    int Height;
+    std::vector< std::uint64_t > Frames;
+    bool bInverted;
+    int Size;
+    int ExpectedWidth; // by hand: the longer side becomes Size, never more than the picture
+    int ExpectedHeight;
+  };
+
+  const VThumbnailCase s_Cases[] = {
+      { "BayerGB8", ZOL::PixelFormat_BayerGB8, 48, 32, { 0, 1 }, false, 24, 24, 16 },
+      { "YUV422", ZOL::PixelFormat_U8Y8V8Y8, 48, 32, { 0, 1 }, false, 32, 32, 21 },
+      { "Luminance8", ZOL::PixelFormat_Luminance8, 40, 40, { 0 }, false, 10, 10, 10 },
+      { "RGBNotEnlarged", ZOL::PixelFormat_R8G8B8, 48, 32, { 0, 1 }, false, 128, 48, 32 },
+      { "BGRInverted", ZOL::PixelFormat_B8G8R8, 30, 40, { 0, 1 }, true, 20, 15, 20 },
+      { "StartingWithMissingFrames", ZOL::PixelFormat_R8G8B8, 48, 32, { 3, 4, 5 }, false, 16, 16, 11 },
+  };
+
+  QImage LoadPNG( const std::string& i_rPath )
+  {
+    return QImage( QString::fromStdString( i_rPath ), "PNG" ).convertToFormat( QImage::Format_RGB888 );
+  }
+
+  // The largest difference of any channel of any pixel.
+  int LargestDifference( const QImage& i_rA, const QImage& i_rB )
+  {
+    int Largest = 0;
+    for( int y = 0; y < i_rA.height(); ++y )
+      for( int x = 0; x < i_rA.width() * 3; ++x )
+        Largest =
+            std::max( Largest, std::abs( int( i_rA.constScanLine( y )[x] ) - int( i_rB.constScanLine( y )[x] ) ) );
+    return Largest;
+  }
+
+  double MeanOf( const QImage& i_rImage, int i_Channel )
+  {
+    double Sum = 0.0;
+    for( int y = 0; y < i_rImage.height(); ++y )
+      for( int x = 0; x < i_rImage.width(); ++x )
+        Sum += i_rImage.constScanLine( y )[x * 3 + i_Channel];
+    return Sum / ( double( i_rImage.width() ) * i_rImage.height() );
+  }
+
+  class ThumbnailOfFormat : public ::testing::TestWithParam< VThumbnailCase >
+  {
+  };
+} // namespace
+
+TEST_P( ThumbnailOfFormat, FitsTheSquareAndShowsTheFirstFrameThatReads )
+{
+  const VThumbnailCase& rCase = GetParam();
+  VScratch Scratch;
+  VRecordingSpec Spec;
+  Spec.Format = rCase.Format;
+  Spec.Width = rCase.Width;
+  Spec.Height = rCase.Height;
+  Spec.Frames = rCase.Frames;
+  Spec.bInverted = rCase.bInverted;
+  Spec.Settings.GammaCorrection = 1.4f;
+  Spec.Settings.Saturation = 0.7f;
+  const std::string Input = WriteRecording( Scratch, "clip.lvid", Spec );
+  const std::string Output = Scratch.Path( "thumb.png" );
+
+  const VRun Run = RunTool( { "thumbnail", Input, Output, "--size", std::to_string( rCase.Size ) } );
+  ASSERT_EQ( Run.ExitCode, 0 ) << Run.Err;
+  const QImage Thumbnail = LoadPNG( Output );
+  ASSERT_FALSE( Thumbnail.isNull() );
+  EXPECT_EQ( Thumbnail.width(), rCase.ExpectedWidth );
+  EXPECT_EQ( Thumbnail.height(), rCase.ExpectedHeight );
+
+  const std::uint64_t First = rCase.Frames.front();
+  ASSERT_EQ( RunTool( { "frames", Input, Scratch.Path( "frames" ), "--first", std::to_string( First ), "--count", "1",
+                        "--png" } )
+                 .ExitCode,
+             0 );
+  const QImage Frame = LoadPNG( Scratch.Path( ( boost::format( "frames/frame_%06d.png" ) % First ).str() ) );
+  ASSERT_FALSE( Frame.isNull() );
+  const QImage Scaled = Frame.scaled( Thumbnail.size(), Qt::IgnoreAspectRatio, Qt::SmoothTransformation )
+                            .convertToFormat( QImage::Format_RGB888 );
+  EXPECT_LE( LargestDifference( Thumbnail, Scaled ), 2 );
+  // Scaling moves no colour: the averages match the full picture's.
+  for( int Channel = 0; Channel < 3; ++Channel )
+    EXPECT_NEAR( MeanOf( Thumbnail, Channel ), MeanOf( Frame, Channel ), 4.0 ) << "channel " << Channel;
+
+  // RGB is shown as stored, so the written picture itself is the expectation, upside down
+  // where the rows were stored bottom to top.
+  if( rCase.Format == ZOL::PixelFormat_R8G8B8 || rCase.Format == ZOL::PixelFormat_B8G8R8 )
+  {
+    const LumekVideoTool::VRGBImage Written = PictureFor( First, rCase.Width, rCase.Height );
+    const QImage Upright =
+        QImage( Written.Pixels.data(), Written.Width, Written.Height, Written.Width * 3, QImage::Format_RGB888 )
+            .mirrored( false, rCase.bInverted )
+            .scaled( Thumbnail.size(), Qt::IgnoreAspectRatio, Qt::SmoothTransformation )
+            .convertToFormat( QImage::Format_RGB888 );
+    EXPECT_LE( LargestDifference( Thumbnail, Upright ), 2 );
+  }
+}
+
+INSTANTIATE_TEST_SUITE_P( Formats, ThumbnailOfFormat, ::testing::ValuesIn( s_Cases ),
+                          []( const ::testing::TestParamInfo< VThumbnailCase >& i_rInfo )
+                          { return std::string( i_rInfo.param.Name ); } );
+
+TEST( Thumbnail, FailuresHaveTheirExitCodes )
+{
+  VScratch Scratch;
+  VRecordingSpec Spec;
+  const std::string Input = WriteRecording( Scratch, "clip.lvid", Spec );
+  EXPECT_EQ( RunTool( { "thumbnail", Input } ).ExitCode, 2 );
+  EXPECT_EQ( RunTool( { "thumbnail", Input, Scratch.Path( "t.png" ), "--size", "0" } ).ExitCode, 2 );
+  EXPECT_EQ( RunTool( { "thumbnail", Scratch.Path( "absent.lvid" ), Scratch.Path( "t.png" ) } ).ExitCode, 1 );
+  EXPECT_EQ( RunTool( { "thumbnail", Input, Scratch.Path( "no-folder/t.png" ) } ).ExitCode, 1 );
+
+  // A recording with no frame at all has nothing to show.
+  Spec.Frames = {};
+  const std::string Empty = WriteRecording( Scratch, "empty.lvid", Spec );
+  const VRun Run = RunTool( { "thumbnail", Empty, Scratch.Path( "t.png" ) } );
+  EXPECT_EQ( Run.ExitCode, 3 ) << Run.Err;
+  EXPECT_NE( Run.Err.find( "No frame of" ), std::string::npos ) << Run.Err;
+}
