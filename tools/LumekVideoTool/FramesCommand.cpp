@@ -20,25 +20,24 @@ namespace po = boost::program_options;
 
 namespace LumekVideoTool
 {
+  // The converter colour-corrects a Bayer frame once, inside the conversion.
+  bool ToDisplayRGB( const ZOL::IVideoSettings& i_rSettings, const ZOL::IVideoFrame& i_rFrame,
+                     std::vector< std::uint8_t >& o_rRGB )
+  {
+    const ZOL::IVideoFrameInfo& rInfo = i_rFrame.VideoFrameInfo;
+    if( !i_rFrame.Video || !CoreVideoUtils::ConvertToDisplayRGB( rInfo, i_rFrame.Video->GetData(),
+                                                                 i_rFrame.Video->GetSize(), i_rSettings, o_rRGB ) )
+      return false;
+    const std::uint64_t Row = static_cast< std::uint64_t >( rInfo.ImageWidth ) * 3;
+    if( rInfo.IsInverted() )
+      for( std::int32_t y = 0; y < rInfo.ImageHeight / 2; ++y )
+        std::swap_ranges( o_rRGB.begin() + y * Row, o_rRGB.begin() + ( y + 1 ) * Row,
+                          o_rRGB.begin() + ( rInfo.ImageHeight - 1 - y ) * Row );
+    return true;
+  }
+
   namespace
   {
-    // A decoded frame as upright R8G8B8 with the file's display settings; the converter
-    // colour-corrects a Bayer frame once, inside the conversion.
-    bool ToRGB( const ZOL::IVideoSettings& i_rSettings, const ZOL::IVideoFrame& i_rFrame,
-                std::vector< std::uint8_t >& o_rRGB )
-    {
-      const ZOL::IVideoFrameInfo& rInfo = i_rFrame.VideoFrameInfo;
-      if( !i_rFrame.Video || !CoreVideoUtils::ConvertToDisplayRGB( rInfo, i_rFrame.Video->GetData(),
-                                                                   i_rFrame.Video->GetSize(), i_rSettings, o_rRGB ) )
-        return false;
-      const std::uint64_t Row = static_cast< std::uint64_t >( rInfo.ImageWidth ) * 3;
-      if( rInfo.IsInverted() )
-        for( std::int32_t y = 0; y < rInfo.ImageHeight / 2; ++y )
-          std::swap_ranges( o_rRGB.begin() + y * Row, o_rRGB.begin() + ( y + 1 ) * Row,
-                            o_rRGB.begin() + ( rInfo.ImageHeight - 1 - y ) * Row );
-      return true;
-    }
-
     bool WritePicture( const std::string& i_rPath, int i_Width, int i_Height, const std::vector< std::uint8_t >& i_rRGB,
                        bool i_bPNG )
     {
@@ -97,7 +96,8 @@ namespace LumekVideoTool
     const std::uint64_t End = Count > UINT64_MAX - First ? UINT64_MAX : First + Count;
     for( std::uint64_t Index = First; Index < End; )
     {
-      // Gaps are reported as one range: a damaged index may name a frame in the billions.
+      // Gaps are reported as one range: a damaged index may name a frame in the
+      // billions.
       const auto Next = Source.FindFrameAtOrAfter( Index );
       const std::uint64_t Stop = Next ? std::min( *Next, End ) : End;
       if( Stop > Index )
@@ -112,7 +112,7 @@ namespace LumekVideoTool
         continue;
       }
       ZOL::IVideoFrame Frame;
-      if( !Source.GetFrame( Index, Frame ) || !ToRGB( Source.GetVideoSettings(), Frame, RGB ) )
+      if( !Source.GetFrame( Index, Frame ) || !ToDisplayRGB( Source.GetVideoSettings(), Frame, RGB ) )
       {
         o_rErr << "Frame " << Index << " could not be read or decoded." << std::endl;
         bAllWritten = false;
@@ -136,10 +136,14 @@ namespace LumekVideoTool
     po::options_description Options;
     Options.add_options()( "file", po::value< std::string >()->required() )( "frames", po::value< std::uint64_t >() )(
         "software", po::bool_switch() );
+    AddJsonLayoutOptions( Options );
     po::positional_options_description Positional;
     Positional.add( "file", 1 );
     const auto Variables = ParseArguments( i_rArguments, Options, Positional, "bench", o_rErr );
     if( !Variables )
+      return Exit_Usage;
+    const auto Layout = JsonLayoutFrom( *Variables, o_rErr );
+    if( !Layout )
       return Exit_Usage;
     const std::string Path = ( *Variables )["file"].as< std::string >();
     const bool bSoftware = ( *Variables )["software"].as< bool >();
@@ -155,30 +159,30 @@ namespace LumekVideoTool
     const auto Start = std::chrono::steady_clock::now();
     // Processor time too: it compares with "ffmpeg -benchmark" whatever else runs on the machine.
     const std::clock_t ProcessorStart = std::clock();
-    // A frame missing from the index is not a decoding failure: playback shows the one before.
+    // A frame missing from the index is not a decoding failure: playback shows
+    // the one before.
     for( auto Index = Source.FindFrameAtOrAfter( 0 ); Index && *Index < Frames;
          Index = Source.FindFrameAtOrAfter( *Index + 1 ) )
     {
-      // Frames are taken and dropped as playback takes and drops them, so buffers recycle.
+      // Frames are taken and dropped as playback takes and drops them, so buffers
+      // recycle.
       ZOL::IVideoFrame Frame;
       ++Read;
-      if( !Source.GetFrame( *Index, Frame ) || ( bSoftware && !ToRGB( Source.GetVideoSettings(), Frame, RGB ) ) )
+      if( !Source.GetFrame( *Index, Frame ) || ( bSoftware && !ToDisplayRGB( Source.GetVideoSettings(), Frame, RGB ) ) )
         ++Failed;
     }
     const double Seconds = std::chrono::duration< double >( std::chrono::steady_clock::now() - Start ).count();
     const double ProcessorSeconds = static_cast< double >( std::clock() - ProcessorStart ) / CLOCKS_PER_SEC;
 
-    VJsonWriter Json;
-    Json.BeginObject();
-    Json.Key( "frames" ).Value( Read );
-    Json.Key( "seconds" ).Value( Seconds );
-    Json.Key( "fps" ).Value( Seconds > 0.0 ? Read / Seconds : 0.0 );
-    Json.Key( "msPerFrame" ).Value( Read > 0 ? Seconds * 1000.0 / Read : 0.0 );
-    Json.Key( "payload" ).Value( ZOL::ToString( Source.GetVideoPayload() ) );
-    Json.Key( "processorSeconds" ).Value( ProcessorSeconds );
-    Json.Key( "peakRssMiB" ).Value( PeakResidentMiB() );
-    Json.EndObject();
-    o_rOut << Json.GetText() << std::endl;
+    WriteJson( o_rOut,
+               QJsonObject{ { "frames", JsonCount( Read ) },
+                            { "seconds", JsonNumber( Seconds ) },
+                            { "fps", JsonNumber( Seconds > 0.0 ? Read / Seconds : 0.0 ) },
+                            { "msPerFrame", JsonNumber( Read > 0 ? Seconds * 1000.0 / Read : 0.0 ) },
+                            { "payload", ZOL::ToString( Source.GetVideoPayload() ) },
+                            { "processorSeconds", JsonNumber( ProcessorSeconds ) },
+                            { "peakRssMiB", JsonNumber( PeakResidentMiB() ) } },
+               *Layout );
     if( Failed != 0 )
       o_rErr << Failed << " frames could not be read or decoded." << std::endl;
     return Failed == 0 ? Exit_Success : Exit_FramesFailed;
