@@ -34,6 +34,10 @@ namespace ZOL
       return VideoContainer_IMAGES;
     // Exact comparison on purpose: "CLIP.MOV" is not a MOV file to this system.
     const std::string Name = Extension.substr( 1 );
+    // One numbered image stands for the sequence it belongs to.
+    for( const char* pImage : { "jpg", "jpeg", "png", "tif", "tiff" } )
+      if( Name == pImage )
+        return VideoContainer_IMAGES;
     const IEnumTable& rTable = VideoContainerTable();
     for( std::size_t i = 0; i < rTable.RowCount; ++i )
     {

@@ -1,5 +1,6 @@
 #include "fileio/VideoReaders/CreateVideoReader.h"
 
+#include "fileio/ImageSequenceIO/VImageSequenceReader.h"
 #include "fileio/LumekVideo/VReader.h"
 #include "fileio/MovIO/VMovReader.h"
 
@@ -22,6 +23,7 @@ namespace
 
   // One row per container that has a reader; a container without a row gives no reader.
   constexpr VReaderRow s_Readers[] = {
+      { ZOL::VideoContainer_IMAGES, &MakeReader< ImageSequenceIO::VImageSequenceReader > },
       { ZOL::VideoContainer_LVID, &MakeReader< LumekVideo::VReader > },
       { ZOL::VideoContainer_MOV, &MakeReader< MovIO::VMovReader > },
       { ZOL::VideoContainer_MP4, &MakeReader< MovIO::VMovReader > },
