@@ -1,0 +1,44 @@
+// Writes small files of the family as the Matroska fuzz target's seeds: mkv_make_seeds <folder>.
+
+#include "tests/fileio/MkvIO/MkvTestSupport.h"
+
+#include <iostream>
+
+int main( int i_ArgumentCount, char** i_ppArguments )
+{
+  if( i_ArgumentCount != 2 )
+  {
+    std::cerr << "usage: mkv_make_seeds <folder>\n";
+    return 1;
+  }
+  const std::string Folder = i_ppArguments[1];
+  MkvTest::VFamilyCase Case;
+  Case.Width = 4;
+  Case.Height = 2;
+  Case.Frames = 2;
+  Case.Format = ZOL::PixelFormat_U8Y8V8Y8;
+  Case.Audio = ZOL::AudioSampleFormat_Int16;
+  bool bGood = MkvTest::WriteFamilyFile( Folder + "/uyvy_audio.mkv", Case, {} );
+  Case.Format = ZOL::PixelFormat_Luminance8;
+  Case.Audio = ZOL::AudioSampleFormat_Unspecified;
+  bGood = bGood &&
+          MkvTest::WriteFamilyFile( Folder + "/grey_vfw.mkv", Case, {},
+                                    []( MkvIO::VMkvDescription& io_rD ) { io_rD.Video.CodecID = "V_MS/VFW/FOURCC"; } );
+  // Odd Clusters: a third track, a group without a block, two audio blocks.
+  Case.Audio = ZOL::AudioSampleFormat_Float32;
+  bGood = bGood && MkvTest::WriteFamilyFile( Folder + "/odd_clusters.mkv", Case, {}, {},
+                                             []( int i_Frame )
+                                             {
+                                               std::vector< MkvIO::VMkvBlock > Blocks( 4 );
+                                               Blocks[0].Track = 3;
+                                               Blocks[0].Bytes = { 1, 2 };
+                                               Blocks[1].bWithBlock = i_Frame != 0;
+                                               Blocks[1].Bytes = std::vector< std::uint8_t >( 8, 7 );
+                                               Blocks[2].Track = 2;
+                                               Blocks[2].Bytes = std::vector< std::uint8_t >( 8, 1 );
+                                               Blocks[3].Track = 2;
+                                               Blocks[3].Bytes = std::vector< std::uint8_t >( 16, 2 );
+                                               return Blocks;
+                                             } );
+  return bGood ? 0 : 1;
+}
