@@ -131,9 +131,8 @@ namespace LumekVideoViewer
   std::optional< std::uint64_t > VVideoSource::FindH264KeyFrame( std::uint64_t i_Index )
   {
     std::shared_ptr< ZOL::IBuffer > pBuffer;
-    std::uint64_t Walked = 0;
-    for( std::optional< std::uint64_t > Frame = FindFrameAtOrBefore( i_Index );
-         Frame && *Frame <= i_Index && Walked < MaxH264WalkBack; ++Walked )
+    std::optional< std::uint64_t > Frame = FindFrameAtOrBefore( i_Index );
+    for( std::uint64_t Walked = 0; Frame && *Frame <= i_Index && Walked < MaxH264WalkBack; ++Walked )
     {
       // Reached the frame the decoder stands on: going on from there is cheaper than a key frame.
       if( m_LastH264Frame && *m_LastH264Frame == *Frame && *Frame < i_Index )
@@ -143,9 +142,12 @@ namespace LumekVideoViewer
           H264Utils::ContainsNALUnit( *pBuffer, H264Utils::H264NALUnitType_CodedSliceIDR,
                                       H264Utils::EH264StreamForm::AnnexB ) )
         return *Frame;
-      if( *Frame == 0 )
-        break;
-      Frame = FindFrameAtOrBefore( *Frame - 1 );
+      const std::optional< std::uint64_t > Earlier = *Frame > 0 ? FindFrameAtOrBefore( *Frame - 1 ) : std::nullopt;
+      // The first frame of the file is where playback starts decoding anyway: a stream that
+      // opens on a recovery point rather than an IDR picture plays from there.
+      if( !Earlier || *Earlier >= *Frame )
+        return *Frame;
+      Frame = Earlier;
     }
     return std::nullopt;
   }

@@ -110,20 +110,38 @@ namespace
     EXPECT_TRUE( FrameIs( Source, Numbers[55], 55 ) );
   }
 
-  TEST_F( VRandomAccessFixture, NoKeyFrameBeforeTheFrameIsAFalseAnswer )
+  TEST_F( VRandomAccessFixture, AStreamCutInsideAGroupPlaysFromItsNextKeyFrame )
   {
-    // Without the first group the frames before 30 have nothing to start from.
+    // The first ten frames are gone: 0 to 19 of the rest lack their references, 20 (the
+    // original 30) is a key frame and everything from there matches.
     VH264Stream Tail = Stream;
     Tail.AccessUnits.erase( Tail.AccessUnits.begin(), Tail.AccessUnits.begin() + 10 );
-    auto pReader = std::make_shared< VMemoryH264Reader >( Tail );
+    VVideoSource Source;
+    ASSERT_TRUE( Source.Open( "memory.h264", std::make_shared< VMemoryH264Reader >( Tail ) ) );
+    ZOL::IVideoFrame Frame;
+    EXPECT_FALSE( Source.GetFrame( 5, Frame ) );
+    EXPECT_TRUE( FrameIs( Source, 21, 31 ) );
+    EXPECT_TRUE( FrameIs( Source, 20, 30 ) );
+    for( std::uint64_t i = 21; i < 70; ++i )
+      ASSERT_TRUE( FrameIs( Source, i, i + 10 ) );
+  }
+
+  TEST_F( VRandomAccessFixture, NoKeyFrameWithinReachIsAFalseAnswer )
+  {
+    // A key frame, then far more frames without one than a scrub will walk back over. The
+    // copies are never decoded: the walk back finds nothing and stops.
+    VH264Stream Long = Stream;
+    Long.AccessUnits.resize( 1 );
+    Long.AccessUnits.insert( Long.AccessUnits.end(), 1500, Stream.AccessUnits[1] );
+    const auto pReader = std::make_shared< VMemoryH264Reader >( Long );
     VVideoSource Source;
     ASSERT_TRUE( Source.Open( "memory.h264", pReader ) );
     VLogCapture Log( "H264IO" );
     ZOL::IVideoFrame Frame;
-    EXPECT_FALSE( Source.GetFrame( 5, Frame ) );
-    EXPECT_TRUE( Log.Contains( "No key frame within" ) );
-    // Frame 20 of the shortened stream is frame 30 of the original, a key frame.
-    EXPECT_TRUE( FrameIs( Source, 20, 30 ) );
-    EXPECT_TRUE( FrameIs( Source, 21, 31 ) );
+    EXPECT_FALSE( Source.GetFrame( 1400, Frame ) );
+    EXPECT_TRUE( Log.Contains( "No key frame within 1200 frames before frame 1400." ) );
+    EXPECT_EQ( pReader->Reads, 1200u );
+    EXPECT_TRUE( FrameIs( Source, 0, 0 ) );
+    EXPECT_TRUE( FrameIs( Source, 1, 1 ) );
   }
 } // namespace
