@@ -15,7 +15,7 @@ packages=(
   libgtest-dev libgmock-dev libbenchmark-dev
   xvfb xauth libgl1-mesa-dri libglx-mesa0 mesa-utils
   ffmpeg python3 imagemagick
-  desktop-file-utils appstream libxml2-utils shared-mime-info xdg-utils dpkg-dev
+  desktop-file-utils appstream libxml2-utils shared-mime-info xdg-utils dpkg-dev libglib2.0-bin man-db
 )
 
 missing=()
