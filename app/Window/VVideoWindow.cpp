@@ -288,7 +288,8 @@ namespace LumekVideoViewer
     const QString Path =
         QFileDialog::getOpenFileName( this, "Open File", QDir::currentPath(),
                                       "Lumek Video Files (*.lvid *.lumekimagesequence);;Video Files (*.lvid *.mov "
-                                      "*.mp4 *.avi);;All Files (*.*)" );
+                                      "*.mp4 *.avi);;Image Sequences (*.lumekimagesequence *.jpg *.jpeg *.png *.tif "
+                                      "*.tiff);;All Files (*.*)" );
     if( !Path.isNull() )
       OpenFile( Path );
   }
