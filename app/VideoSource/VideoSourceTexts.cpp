@@ -1,7 +1,9 @@
 #include "app/VideoSource/VideoSourceTexts.h"
 
 #include "app/VideoSource/VVideoSource.h"
+#include "utils/UtilsFileSystem/FileIO.h"
 
+#include <boost/algorithm/string/join.hpp>
 #include <boost/format.hpp>
 
 namespace LumekVideoViewer
@@ -44,6 +46,15 @@ namespace LumekVideoViewer
   {
     static const boost::format s_DecoderFormat( "%s @ %.1ffps" );
     return ( boost::format( s_DecoderFormat ) % i_rDecoderName % i_FramesPerSecond ).str();
+  }
+
+  std::string ComposeOpenFailureText( const std::string& i_rPath )
+  {
+    std::string Text = "The video file could not be opened.";
+    std::vector< std::string > Writers;
+    if( UtilsFileSystem::GetWritingProcesses( i_rPath, Writers ) && !Writers.empty() )
+      Text += " It is still being written by " + boost::algorithm::join( Writers, ", " ) + ".";
+    return Text;
   }
 
   VPropertyRows ComposePropertyRows( const VVideoSource& i_rSource )

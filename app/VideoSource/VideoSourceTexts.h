@@ -25,6 +25,11 @@ namespace LumekVideoViewer
   // "Hardware (GPU) @ 99.8fps"
   std::string ComposeDecoderText( const std::string& i_rDecoderName, double i_FramesPerSecond );
 
+  // The "Invalid file" message for a path that would not open: "The video file could not be
+  // opened.", and when another program holds the file open for writing, a second sentence that
+  // names it, since a recording still being captured has no index yet.
+  std::string ComposeOpenFailureText( const std::string& i_rPath );
+
   using VPropertyRows = std::vector< std::pair< std::string, std::string > >;
 
   // Every attribute of the file, with the audio, video and display records added in their

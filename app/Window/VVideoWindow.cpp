@@ -226,7 +226,9 @@ namespace LumekVideoViewer
     CloseFile();
     if( !m_VideoSource.Open( i_Path.toStdString() ) )
     {
-      QMessageBox::critical( this, "Invalid file", "The video file could not be opened.", QMessageBox::Ok );
+      QMessageBox::critical( this, "Invalid file",
+                             QString::fromStdString( ComposeOpenFailureText( i_Path.toStdString() ) ),
+                             QMessageBox::Ok );
       m_pVideoSettingsDialog->SetControlsEnabled( false );
       UpdateControls();
       return false;

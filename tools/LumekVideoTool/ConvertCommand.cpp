@@ -1,6 +1,7 @@
 #include "fileio/LumekVideo/VWriter.h"
 #include "fileio/VideoEncoding/VideoFrameDecoder.h"
 #include "tools/LumekVideoTool/ToolCommon.h"
+#include "utils/UtilsFileSystem/FileIO.h"
 
 #include <boost/filesystem.hpp>
 
@@ -201,8 +202,10 @@ namespace LumekVideoTool
         return Exit_CannotOpen;
       }
     }
+    // The output's name holds the old file or the whole new one at every moment, even if the
+    // process is killed or the machine stops here.
     boost::system::error_code Error;
-    if( !Writer.Close() || ( fs::rename( Temporary, Output, Error ), Error ) )
+    if( !Writer.Close() || !ZOL::Succeeded( UtilsFileSystem::ReplaceFileAtomic( Output, Temporary ) ) )
     {
       o_rErr << "Cannot finish " << Output << std::endl;
       fs::remove( Temporary, Error );

@@ -1,3 +1,4 @@
+#include "app/VideoSource/VideoSourceTexts.h"
 #include "services/Log.h"
 #include "tools/LumekVideoTool/ToolCommon.h"
 
@@ -118,7 +119,7 @@ namespace LumekVideoTool
     ZOL::GlobalLog().RemoveSink( Sink );
     if( bOpen )
       return true;
-    o_rErr << "The video file could not be opened." << std::endl;
+    o_rErr << LumekVideoViewer::ComposeOpenFailureText( i_rPath ) << std::endl;
     for( const std::string& rReason : Reasons )
       o_rErr << rReason << std::endl;
     return false;

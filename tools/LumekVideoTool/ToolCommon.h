@@ -11,8 +11,8 @@
 
 namespace LumekVideoTool
 {
-  // Opens the file; on failure writes "The video file could not be opened." and the reasons the
-  // readers logged to o_rErr.
+  // Opens the file; on failure writes "The video file could not be opened." (naming the program
+  // still writing it, if one is) and the reasons the readers logged to o_rErr.
   bool OpenSource( LumekVideoViewer::VVideoSource& io_rSource, const std::string& i_rPath, std::ostream& o_rErr );
 
   // A decoded frame as the viewer shows it: upright R8G8B8 with the file's display settings.
