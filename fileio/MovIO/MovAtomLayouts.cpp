@@ -47,8 +47,6 @@ namespace MovIO
     constexpr std::uint32_t FixedSizeFiel = 10;
     constexpr std::uint32_t FixedSizePasp = 16;
     constexpr std::uint32_t FixedSizeColr = 18;
-    // Bytes of a video sample description from its size field to the colour table ID.
-    constexpr std::uint64_t VideoDescriptionFixedBytes = 86;
   } // namespace
 
   bool VMovReader::ReadMvhd( const VMovAtom& i_rRoot )

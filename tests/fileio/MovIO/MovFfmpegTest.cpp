@@ -4,8 +4,10 @@
 
 #include "MovTestSupport.h"
 
+#include "fileio/H264IO/VH264Decoder.h"
 #include "fileio/MovIO/VMovReader.h"
 #include "tests/support/FfmpegFixtures.h"
+#include "videointerface/BufferAllocators.h"
 #include "videointerface/IBuffer.h"
 
 #include <gtest/gtest.h>
@@ -495,5 +497,94 @@ namespace
 
   INSTANTIATE_TEST_SUITE_P( Formats, MovFfmpegTest, ::testing::ValuesIn( s_Cases ),
                             []( const ::testing::TestParamInfo< VFfmpegCase >& i_rInfo )
+                            { return std::string( i_rInfo.param.Name ); } );
+
+  struct VDecodeCase
+  {
+    const char* Name;
+    // Largest difference from ffmpeg's decode in any sample; 0 for lossless payloads.
+    int Tolerance;
+  };
+
+  std::ostream& operator<<( std::ostream& o_rStream, const VDecodeCase& i_rCase )
+  {
+    return o_rStream << i_rCase.Name;
+  }
+
+  // JPEG's colour conversion is the image library's, not swscale's: a few levels apart.
+  const VDecodeCase s_DecodeCases[] = {
+      { "Mjpeg", 8 }, { "Png", 0 }, { "Tiff", 0 }, { "H264Baseline", 0 }, { "H264InMp4", 0 } };
+
+  const VFfmpegCase& FindCase( const std::string& i_rName )
+  {
+    for( const VFfmpegCase& rCase : s_Cases )
+      if( i_rName == rCase.Name )
+        return rCase;
+    throw std::logic_error( "no case " + i_rName );
+  }
+
+  class MovDecodeTest : public ::testing::TestWithParam< VDecodeCase >
+  {
+  protected:
+    void SetUp() override
+    {
+      if( !LumekTest::HaveFfmpeg() )
+        GTEST_SKIP() << "ffmpeg is not installed";
+    }
+  };
+
+  // The pictures, decoded from the payload this reader delivers, against ffmpeg's own decode.
+  TEST_P( MovDecodeTest, PixelsMatchFfmpeg )
+  {
+    const VFfmpegCase& rCase = FindCase( GetParam().Name );
+    const std::string Path = MakeFixture( rCase );
+    ASSERT_FALSE( Path.empty() );
+    MovIO::VMovReader Reader;
+    ASSERT_TRUE( Reader.Open( Path ) );
+    const bool bH264 = rCase.Payload == ZOL::VideoPayload_VideoH264;
+    const auto pAllocator = std::make_shared< ZOL::VFrameBufferAllocator >( "Test" );
+    const std::shared_ptr< ZOL::IH264Decoder > pDecoder = bH264 ? H264IO::VH264Decoder::Create( pAllocator ) : nullptr;
+    ASSERT_TRUE( !bH264 || pDecoder );
+
+    // H.264 is compared by its luma, which a conforming decoder gives bit for bit; the still
+    // images by their RGB samples.
+    const std::vector< std::uint8_t > Expected = LumekTest::FfmpegDecode( Path, bH264 ? "yuv420p" : "rgb24" );
+    const std::size_t Pixels = 64 * 48;
+    const std::size_t ExpectedFrameBytes = bH264 ? Pixels * 3 / 2 : Pixels * 3;
+    ASSERT_EQ( Expected.size(), ExpectedFrameBytes * Reader.GetFrameCount() );
+    for( std::uint64_t f = 0; f < Reader.GetFrameCount(); ++f )
+    {
+      ZOL::IVideoFrame Frame;
+      if( bH264 )
+      {
+        std::shared_ptr< ZOL::IBuffer > pUnit;
+        ZOL::IAudioBuffers Audio;
+        ASSERT_TRUE( Reader.ReadFrameData( f, pUnit, Audio, true, false ) );
+        Frame.VideoFrameInfo = Reader.GetVideoFrameInfo();
+        ASSERT_TRUE( pDecoder->Decode( *pUnit, ZOL::PixelFormat_U8Y8V8Y8, Frame.Video, Frame.VideoFrameInfo ) )
+            << "frame " << f;
+      }
+      else
+      {
+        ASSERT_TRUE( Reader.ReadFrame( f, Frame, true, false ) ) << "frame " << f;
+      }
+      ASSERT_TRUE( Frame.Video );
+      const std::uint8_t* pWant = Expected.data() + f * ExpectedFrameBytes;
+      const std::uint8_t* pHave = Frame.Video->GetData();
+      const std::size_t Step = Frame.VideoFrameInfo.PixelFormat == ZOL::PixelFormat_R8G8B8u8 ? 4 : 3;
+      int Worst = 0;
+      for( std::size_t i = 0; i < Pixels; ++i )
+        for( std::size_t c = 0; c < ( bH264 ? 1u : 3u ); ++c )
+        {
+          const int Have = bH264 ? pHave[2 * i + 1] : pHave[i * Step + c];
+          const int Want = bH264 ? pWant[i] : pWant[i * 3 + c];
+          Worst = std::max( Worst, std::abs( Have - Want ) );
+        }
+      EXPECT_LE( Worst, GetParam().Tolerance ) << "frame " << f;
+    }
+  }
+
+  INSTANTIATE_TEST_SUITE_P( Payloads, MovDecodeTest, ::testing::ValuesIn( s_DecodeCases ),
+                            []( const ::testing::TestParamInfo< VDecodeCase >& i_rInfo )
                             { return std::string( i_rInfo.param.Name ); } );
 } // namespace
