@@ -1,6 +1,10 @@
 #include "app/VideoSource/VideoSourceTexts.h"
+#include "fileio/JPEGUtils/JPEGParser.h"
 #include "tools/LumekVideoTool/Json.h"
 #include "tools/LumekVideoTool/ToolCommon.h"
+#include "utils/UtilsIO/VLargeFile.h"
+
+#include <boost/algorithm/string/predicate.hpp>
 
 namespace po = boost::program_options;
 
@@ -91,6 +95,34 @@ namespace LumekVideoTool
     return Exit_Success;
   }
 
+  namespace
+  {
+    bool IsJPEGName( const std::string& i_rPath )
+    {
+      return boost::algorithm::iends_with( i_rPath, ".jpg" ) || boost::algorithm::iends_with( i_rPath, ".jpeg" );
+    }
+
+    // A single JPEG (a frame saved from a motion JPEG file, say): its marker segments. What was
+    // found is shown even when the image is not whole, since that is when one looks.
+    int DumpJPEGFile( const std::string& i_rPath, std::ostream& o_rOut, std::ostream& o_rErr )
+    {
+      UtilsIO::VLargeFile File;
+      std::uint64_t Size = 0;
+      if( !File.Open( i_rPath, UtilsIO::OpenMode_Read ) || !File.GetSize( Size ) )
+      {
+        o_rErr << "Cannot open " << i_rPath << std::endl;
+        return Exit_CannotOpen;
+      }
+      std::vector< JPEGUtils::VJPEGSegment > Segments;
+      const bool bWhole = JPEGUtils::ParseJPEG( File, Size, Segments );
+      o_rOut << JPEGUtils::DumpJPEG( Segments, File );
+      if( bWhole )
+        return Exit_Success;
+      o_rErr << "The JPEG is not whole: it is truncated or damaged." << std::endl;
+      return Exit_FramesFailed;
+    }
+  } // namespace
+
   int RunDump( const VArguments& i_rArguments, std::ostream& o_rOut, std::ostream& o_rErr )
   {
     po::options_description Options;
@@ -101,6 +133,8 @@ namespace LumekVideoTool
     if( !Variables )
       return Exit_Usage;
     const std::string Path = ( *Variables )["file"].as< std::string >();
+    if( IsJPEGName( Path ) )
+      return DumpJPEGFile( Path, o_rOut, o_rErr );
 
     LumekVideoViewer::VVideoSource Source;
     if( !OpenSource( Source, Path, o_rErr ) )
