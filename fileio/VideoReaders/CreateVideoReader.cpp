@@ -3,6 +3,7 @@
 #include "fileio/ImageSequenceIO/VImageSequenceReader.h"
 #include "fileio/LumekVideo/VReader.h"
 #include "fileio/MovIO/VMovReader.h"
+#include "fileio/RapidAVI/VRapidAVIReader.h"
 
 #include <iterator>
 
@@ -23,6 +24,7 @@ namespace
 
   // One row per container that has a reader; a container without a row gives no reader.
   constexpr VReaderRow s_Readers[] = {
+      { ZOL::VideoContainer_AVI, &MakeReader< RapidAVI::VRapidAVIReader > },
       { ZOL::VideoContainer_IMAGES, &MakeReader< ImageSequenceIO::VImageSequenceReader > },
       { ZOL::VideoContainer_LVID, &MakeReader< LumekVideo::VReader > },
       { ZOL::VideoContainer_MOV, &MakeReader< MovIO::VMovReader > },

@@ -1,0 +1,93 @@
+#pragma once
+
+// Hand-built AVI files: RIFF chunks put together byte by byte, so that each case of the chunk
+// rules can be made exactly, plus a capture of the reader's log lines.
+
+#include "fileio/RapidAVI/VRapidAVIReader.h"
+#include "services/ILogCategorised.h"
+#include "utils/MemoryStream.h"
+
+#include <cstdint>
+#include <memory>
+#include <string>
+#include <vector>
+
+namespace AviTest
+{
+  using VBytes = std::vector< std::uint8_t >;
+
+  void AppendLE( VBytes& io_rBytes, std::uint64_t i_Value, int i_Width );
+  void AppendText( VBytes& io_rBytes, const std::string& i_rText );
+  VBytes Join( const std::vector< VBytes >& i_rParts );
+
+  // A chunk with its pad byte when the payload is odd.
+  VBytes Chunk( const std::string& i_rId, const VBytes& i_rPayload );
+  VBytes List( const std::string& i_rType, const std::vector< VBytes >& i_rChildren );
+  VBytes Riff( const std::string& i_rForm, const std::vector< VBytes >& i_rChildren );
+
+  VBytes MainHeader( std::uint32_t i_MicrosecondsPerFrame, std::uint32_t i_Width, std::uint32_t i_Height );
+  VBytes StreamHeader( const std::string& i_rType, std::uint32_t i_Scale, std::uint32_t i_Rate );
+  VBytes BitmapFormat( std::int32_t i_Width, std::int32_t i_Height, std::uint16_t i_Bits, std::uint32_t i_Compression );
+  VBytes WaveFormat( std::uint16_t i_Tag, std::uint16_t i_Channels, std::uint32_t i_Rate, std::uint16_t i_Bits );
+  VBytes ExtensibleWaveFormat( bool i_bFloat, std::uint16_t i_Channels, std::uint32_t i_Rate, std::uint16_t i_Bits );
+  VBytes Creator( std::size_t i_Length );
+
+  struct VAviSpec
+  {
+    std::uint32_t Width = 8;
+    std::uint32_t Height = 4;
+    std::uint32_t MicrosecondsPerFrame = 40000;
+    std::uint32_t Scale = 1;
+    std::uint32_t Rate = 25;
+    // strf: compression 0 is BI_RGB.
+    std::uint32_t Compression = RapidAVI::MakeFourCC( "Y800" );
+    std::uint16_t Bits = 8;
+    std::int32_t StrfHeight = -4;
+    // Behind the bitmap header in strf.
+    VBytes Palette;
+    std::vector< VBytes > Frames;
+    std::vector< VBytes > AudioChunks;
+    // A whole "strf" chunk for the audio stream; empty for no audio stream.
+    VBytes AudioFormat;
+    // Entries of idx1 (video first n frames); no idx1 chunk when negative.
+    int OldIndexFrames = -1;
+    // Entries of an ix00 at the end of movi; none when negative.
+    int StandardIndexFrames = -1;
+    // Frames of one AVIX part behind the AVI part, with an ix00 of their own.
+    std::vector< VBytes > ExtendedFrames;
+    VBytes ExtraHeaderChunks; // inside hdrl, behind the stream lists
+    VBytes ExtraMoviChunks;   // at the start of movi
+    VBytes Trailer;           // behind everything
+  };
+
+  // A frame of i_Size bytes, every byte i_Value.
+  VBytes Frame( std::size_t i_Size, std::uint8_t i_Value );
+  // A Y800 file of i_Frames frames of 8 x 4 with an idx1 of all of them.
+  VAviSpec GreySpec( int i_Frames );
+  VBytes BuildAvi( const VAviSpec& i_rSpec );
+
+  // Keeps the bytes alive as long as the reader reads them.
+  struct VOpenedAvi
+  {
+    std::shared_ptr< VBytes > pBytes;
+    std::shared_ptr< RapidAVI::VRapidAVIReader > pReader;
+    bool bOpened = false;
+  };
+  VOpenedAvi OpenAvi( const VBytes& i_rBytes );
+  // The payload the reader gives for a frame; empty when the read failed.
+  VBytes ReadVideo( RapidAVI::VRapidAVIReader& io_rReader, std::uint64_t i_Frame );
+
+  // Lines the log receives while it lives, of every category.
+  class VLogCapture
+  {
+  public:
+    VLogCapture();
+    ~VLogCapture();
+    bool Contains( const std::string& i_rText ) const;
+    const std::vector< ZOL::ILogRecord >& GetRecords() const { return *m_pRecords; }
+
+  private:
+    std::shared_ptr< std::vector< ZOL::ILogRecord > > m_pRecords;
+    int m_Handle = 0;
+  };
+} // namespace AviTest
