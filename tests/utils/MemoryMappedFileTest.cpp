@@ -7,7 +7,10 @@
 
 #include <unistd.h>
 
+#include <algorithm>
+#include <atomic>
 #include <random>
+#include <thread>
 
 using namespace UtilsFileSystem;
 
@@ -171,6 +174,48 @@ namespace
     ASSERT_TRUE( Stream.Seek( static_cast< std::int64_t >( s_Page ) ) );
     ASSERT_TRUE( Stream.Read( Read.data(), Read.size() ) );
     EXPECT_EQ( Read, Slice( Bytes, s_Page, s_Page ) );
+  }
+
+  // Another program cutting and regrowing the file while it is read: a cut can land between the
+  // size check and the copy, and must still only fail that read.
+  TEST( MappedStream, AFileCutWhileBeingReadNeverTakesTheProcessDown )
+  {
+    const LumekTest::VTemporaryFolder Folder;
+    const std::string Path = Folder.File( "cut.bin" );
+    const auto Bytes = LumekTest::PatternBytes( 64 * s_Page );
+    LumekTest::WriteBytes( Path, Bytes );
+    VMemoryMappedInputStream Stream( 4 * s_Page, 4 );
+    ASSERT_EQ( Stream.Open( Path ), ZOL::Result_Ok );
+
+    std::atomic< bool > bStop( false );
+    std::thread Cutter(
+        [&]
+        {
+          for( int i = 0; !bStop; ++i )
+            static_cast< void >( ::truncate( Path.c_str(), static_cast< off_t >( ( i % 2 == 0 ? 8 : 64 ) * s_Page ) ) );
+        } );
+    std::mt19937 Random( 7 );
+    std::vector< std::uint8_t > Read( 16 * s_Page );
+    int Failed = 0;
+    for( int i = 0; i < 20000; ++i )
+    {
+      const std::uint64_t Offset = Random() % ( 48 * s_Page );
+      const std::uint64_t Size = 1 + Random() % ( 16 * s_Page );
+      ASSERT_TRUE( Stream.Seek( static_cast< std::int64_t >( Offset ) ) );
+      if( !Stream.Read( Read.data(), Size ) )
+      {
+        ++Failed;
+        continue;
+      }
+      if( Offset + Size <= 8 * s_Page )
+      {
+        ASSERT_TRUE( std::equal( Read.begin(), Read.begin() + static_cast< std::ptrdiff_t >( Size ),
+                                 Bytes.begin() + static_cast< std::ptrdiff_t >( Offset ) ) );
+      }
+    }
+    bStop = true;
+    Cutter.join();
+    EXPECT_GT( Failed, 0 );
   }
 
   TEST( OpenMemoryMappedInputStream, AnEmptyFileFallsBackToThePlainStream )

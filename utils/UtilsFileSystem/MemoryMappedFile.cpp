@@ -9,6 +9,7 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <atomic>
 #include <cerrno>
 #include <csetjmp>
 #include <csignal>
@@ -25,7 +26,9 @@ namespace UtilsFileSystem
     // A file that another program truncates under a mapping turns the next touch of a lost page
     // into SIGBUS. The size check before each read catches what happened before the read; this
     // guard catches a truncation during the copy itself, and turns it into a failed read.
-    thread_local sigjmp_buf* t_pRecovery = nullptr;
+    // Volatile and fenced: the copy does not read the pointer, so the compiler would otherwise drop
+    // the store before it as dead.
+    thread_local sigjmp_buf* volatile t_pRecovery = nullptr;
     struct sigaction s_PreviousBusHandler;
 
     void OnBusError( int, siginfo_t*, void* )
@@ -61,7 +64,9 @@ namespace UtilsFileSystem
         return false;
       }
       t_pRecovery = &Recovery;
+      std::atomic_signal_fence( std::memory_order_seq_cst );
       std::memcpy( o_pTarget, i_pSource, i_Size );
+      std::atomic_signal_fence( std::memory_order_seq_cst );
       t_pRecovery = nullptr;
       return true;
     }
