@@ -3,6 +3,8 @@
 
 #include "ToolRunner.h"
 
+#include "tests/support/FfmpegFixtures.h"
+
 #include <gtest/gtest.h>
 
 #include <QImage>
@@ -138,3 +140,61 @@ TEST( Thumbnail, FailuresHaveTheirExitCodes )
   EXPECT_EQ( Run.ExitCode, 3 ) << Run.Err;
   EXPECT_NE( Run.Err.find( "No frame of" ), std::string::npos ) << Run.Err;
 }
+
+namespace
+{
+  struct VContainerCase
+  {
+    const char* Name;
+    const char* Extension;
+    std::vector< std::string > Codec;
+  };
+
+  class ThumbnailOfContainer : public ::testing::TestWithParam< VContainerCase >
+  {
+  };
+} // namespace
+
+TEST_P( ThumbnailOfContainer, MatchesTheFramesCommandAndFfmpeg )
+{
+  const VContainerCase& rCase = GetParam();
+  if( !LumekTest::HaveFfmpeg() )
+    GTEST_SKIP() << "ffmpeg makes these recordings";
+  std::vector< std::string > Arguments = { "-f", "lavfi", "-i", "testsrc2=size=64x48:rate=25", "-frames:v", "2" };
+  Arguments.insert( Arguments.end(), rCase.Codec.begin(), rCase.Codec.end() );
+  const std::string Input =
+      LumekTest::FfmpegFixture( std::string( "thumbnail-" ) + rCase.Name + "." + rCase.Extension, Arguments );
+  ASSERT_FALSE( Input.empty() );
+  VScratch Scratch;
+  const VRun Run = RunTool( { "thumbnail", Input, Scratch.Path( "thumb.png" ), "--size", "32" } );
+  ASSERT_EQ( Run.ExitCode, 0 ) << Run.Err;
+  const QImage Thumbnail = LoadPNG( Scratch.Path( "thumb.png" ) );
+  ASSERT_EQ( Thumbnail.size(), QSize( 32, 24 ) );
+
+  ASSERT_EQ( RunTool( { "frames", Input, Scratch.Path( "frames" ), "--count", "1", "--png" } ).ExitCode, 0 );
+  const QImage Frame = LoadPNG( Scratch.Path( "frames/frame_000000.png" ) );
+  EXPECT_LE(
+      LargestDifference( Thumbnail, Frame.scaled( Thumbnail.size(), Qt::IgnoreAspectRatio, Qt::SmoothTransformation )
+                                        .convertToFormat( QImage::Format_RGB888 ) ),
+      2 );
+
+  // ffmpeg's own decode of the first frame, scaled the same way: the right frame with the right
+  // channels. The viewer takes YUV samples as full range where ffmpeg expands video range, which
+  // moves the averages by up to about 7.
+  std::vector< std::uint8_t > Decoded = LumekTest::FfmpegDecode( Input, "rgb24" );
+  ASSERT_GE( Decoded.size(), 64u * 48 * 3 );
+  const QImage Reference = QImage( Decoded.data(), 64, 48, 64 * 3, QImage::Format_RGB888 )
+                               .scaled( Thumbnail.size(), Qt::IgnoreAspectRatio, Qt::SmoothTransformation )
+                               .convertToFormat( QImage::Format_RGB888 );
+  for( int Channel = 0; Channel < 3; ++Channel )
+    EXPECT_NEAR( MeanOf( Thumbnail, Channel ), MeanOf( Reference, Channel ), 10.0 ) << "channel " << Channel;
+}
+
+INSTANTIATE_TEST_SUITE_P(
+    Containers, ThumbnailOfContainer,
+    ::testing::Values( VContainerCase{ "MovRgb", "mov", { "-c:v", "rawvideo", "-pix_fmt", "rgb24" } },
+                       VContainerCase{ "MovUyvy", "mov", { "-c:v", "rawvideo", "-pix_fmt", "uyvy422" } },
+                       VContainerCase{ "MovJpeg", "mov", { "-c:v", "mjpeg", "-pix_fmt", "yuvj422p" } },
+                       VContainerCase{
+                           "Mp4H264", "mp4", { "-c:v", "libx264", "-profile:v", "baseline", "-pix_fmt", "yuv420p" } } ),
+    []( const ::testing::TestParamInfo< VContainerCase >& i_rInfo ) { return std::string( i_rInfo.param.Name ); } );
