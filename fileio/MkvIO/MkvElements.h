@@ -5,9 +5,11 @@
 #include <ebml/EbmlElement.h>
 #include <ebml/EbmlMaster.h>
 #include <ebml/EbmlStream.h>
+#include <ebml/EbmlUnicodeString.h>
 
 #include <cstdint>
 #include <memory>
+#include <string>
 
 namespace MkvIO
 {
@@ -59,6 +61,20 @@ namespace MkvIO
       i_rVisit( pChild );
     }
   }
+  // The text of a string element as the file holds it, up to a terminating zero. libebml's own
+  // reading of UTF-8 throws on a bad byte and loses its buffer on the way out.
+  inline std::string ReadText( libebml::EbmlStream& io_rStream, const libebml::EbmlElement& i_rElement )
+  {
+    // The element lies inside its parent and so inside the file: its size is bounded.
+    std::string Text( static_cast< std::size_t >( i_rElement.GetSize() ), '\0' );
+    if( !Text.empty() )
+      Text.resize( io_rStream.I_O().read( &Text[0], Text.size() ) );
+    const std::size_t End = Text.find( '\0' );
+    if( End != std::string::npos )
+      Text.resize( End );
+    return Text;
+  }
+
   // Nesting deeper than this is not read: Matroska's own elements nest far less.
   constexpr int MaxTreeDepth = 8;
 

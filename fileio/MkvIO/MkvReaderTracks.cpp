@@ -88,23 +88,34 @@ namespace MkvIO
 
   bool VMkvReader::ReadInfo( EbmlElement& io_rInfo )
   {
-    ReadTree( *m_pStream, io_rInfo );
-    auto& rInfo = static_cast< EbmlMaster& >( io_rInfo );
-    if( KaxTimecodeScale* pScale = ChildOf< KaxTimecodeScale >( rInfo ) )
-      m_TimecodeScale = static_cast< std::uint64_t >( *pScale );
-    if( KaxDuration* pDuration = ChildOf< KaxDuration >( rInfo ) )
-      m_Duration = static_cast< double >( *pDuration );
-    if( KaxWritingApp* pApp = ChildOf< KaxWritingApp >( rInfo ) )
-      m_ExternalAttributes.Set( "Matroska.WritingApp", pApp->GetValueUTF8() );
-    if( KaxMuxingApp* pApp = ChildOf< KaxMuxingApp >( rInfo ) )
-      m_ExternalAttributes.Set( "Matroska.MuxingApp", pApp->GetValueUTF8() );
-    if( KaxDateUTC* pDate = ChildOf< KaxDateUTC >( rInfo ) )
-      m_ExternalAttributes.Set( "Matroska.DateUTC", DateText( pDate->GetEpochDate() ) );
-    if( KaxSegmentUID* pUID = ChildOf< KaxSegmentUID >( rInfo ) )
-      if( pUID->GetBuffer() )
-        m_ExternalAttributes.Set( "Matroska.SegmentUID", Hex( pUID->GetBuffer(), pUID->GetSize() ) );
-    ReleaseChildren( rInfo );
+    ForEachChild( *m_pStream, io_rInfo,
+                  [this]( std::unique_ptr< EbmlElement >& io_rpChild )
+                  {
+                    EbmlElement& rChild = *io_rpChild;
+                    if( Is< KaxWritingApp >( rChild ) )
+                      m_ExternalAttributes.Set( "Matroska.WritingApp", ReadText( *m_pStream, rChild ) );
+                    else if( Is< KaxMuxingApp >( rChild ) )
+                      m_ExternalAttributes.Set( "Matroska.MuxingApp", ReadText( *m_pStream, rChild ) );
+                    else if( Is< KaxTimecodeScale >( rChild ) || Is< KaxDuration >( rChild ) ||
+                             Is< KaxDateUTC >( rChild ) || Is< KaxSegmentUID >( rChild ) )
+                      ReadInfoValue( rChild );
+                  } );
     return true;
+  }
+
+  void VMkvReader::ReadInfoValue( EbmlElement& io_rValue )
+  {
+    io_rValue.ReadData( m_pStream->I_O(), SCOPE_ALL_DATA );
+    if( !io_rValue.ValueIsSet() )
+      return;
+    if( auto* pScale = dynamic_cast< KaxTimecodeScale* >( &io_rValue ) )
+      m_TimecodeScale = static_cast< std::uint64_t >( *pScale );
+    else if( auto* pDuration = dynamic_cast< KaxDuration* >( &io_rValue ) )
+      m_Duration = static_cast< double >( *pDuration );
+    else if( auto* pDate = dynamic_cast< KaxDateUTC* >( &io_rValue ) )
+      m_ExternalAttributes.Set( "Matroska.DateUTC", DateText( pDate->GetEpochDate() ) );
+    else if( auto* pUID = dynamic_cast< KaxSegmentUID* >( &io_rValue ); pUID && pUID->GetBuffer() )
+      m_ExternalAttributes.Set( "Matroska.SegmentUID", Hex( pUID->GetBuffer(), pUID->GetSize() ) );
   }
 
   bool VMkvReader::ReadTracks( EbmlElement& io_rTracks )
@@ -230,35 +241,30 @@ namespace MkvIO
     ForEachChild( *m_pStream, i_rTags,
                   [this]( std::unique_ptr< EbmlElement >& io_rpTag )
                   {
-                    EbmlElement& rTag = *io_rpTag;
-                    if( !Is< KaxTag >( rTag ) )
+                    if( !Is< KaxTag >( *io_rpTag ) )
                       return;
-                    ForEachChild( *m_pStream, rTag,
+                    ForEachChild( *m_pStream, *io_rpTag,
                                   [this]( std::unique_ptr< EbmlElement >& io_rpSimple )
                                   {
-                                    EbmlElement& rSimple = *io_rpSimple;
-                                    if( !Is< KaxTagSimple >( rSimple ) )
-                                      return;
-                                    std::string Name;
-                                    std::string Text;
-                                    bool bHaveName = false;
-                                    bool bHaveText = false;
-                                    ForEachChild( *m_pStream, rSimple,
-                                                  [&]( std::unique_ptr< EbmlElement >& io_rpField )
-                                                  {
-                                                    EbmlElement& rField = *io_rpField;
-                                                    const bool bName = Is< KaxTagName >( rField );
-                                                    if( !bName && !Is< KaxTagString >( rField ) )
-                                                      return;
-                                                    rField.ReadData( m_pStream->I_O(), SCOPE_ALL_DATA );
-                                                    const std::string Value =
-                                                        static_cast< EbmlUnicodeString& >( rField ).GetValueUTF8();
-                                                    ( bName ? Name : Text ) = Value;
-                                                    ( bName ? bHaveName : bHaveText ) = true;
-                                                  } );
-                                    if( bHaveName && bHaveText )
-                                      m_Tags.emplace_back( std::move( Name ), std::move( Text ) );
+                                    if( Is< KaxTagSimple >( *io_rpSimple ) )
+                                      ReadSimpleTag( *io_rpSimple );
                                   } );
                   } );
+  }
+
+  void VMkvReader::ReadSimpleTag( EbmlElement& i_rSimpleTag )
+  {
+    std::optional< std::string > Name;
+    std::optional< std::string > Text;
+    ForEachChild( *m_pStream, i_rSimpleTag,
+                  [&]( std::unique_ptr< EbmlElement >& io_rpField )
+                  {
+                    if( Is< KaxTagName >( *io_rpField ) )
+                      Name = ReadText( *m_pStream, *io_rpField );
+                    else if( Is< KaxTagString >( *io_rpField ) )
+                      Text = ReadText( *m_pStream, *io_rpField );
+                  } );
+    if( Name && Text )
+      m_Tags.emplace_back( std::move( *Name ), std::move( *Text ) );
   }
 } // namespace MkvIO

@@ -130,7 +130,7 @@ namespace MkvIO
     m_pStream = std::make_unique< EbmlStream >( *m_pCallback );
 
     std::unique_ptr< EbmlElement > pHead( m_pStream->FindNextID( EBML_INFO( EbmlHead ), m_FileSize ) );
-    if( !pHead || !pHead->IsFiniteSize() || pHead->GetEndPosition() > m_FileSize )
+    if( !pHead || !Is< EbmlHead >( *pHead ) || !pHead->IsFiniteSize() || pHead->GetEndPosition() > m_FileSize )
     {
       MKV_LOG( ZOL::LogFailure, "EbmlHead missing." );
       return false;
@@ -140,7 +140,7 @@ namespace MkvIO
     const std::uint64_t Remaining = m_FileSize - pHead->GetEndPosition();
     std::unique_ptr< EbmlElement > pSegment( m_pStream->FindNextID( EBML_INFO( KaxSegment ), Remaining ) );
     // A live stream leaves the size unknown; such a file has no end to walk to.
-    if( !pSegment || !pSegment->IsFiniteSize() ||
+    if( !pSegment || !Is< KaxSegment >( *pSegment ) || !pSegment->IsFiniteSize() ||
         pSegment->GetSize() >= ( std::uint64_t( 1 ) << ( 7 * pSegment->GetSizeLength() ) ) - 1 )
     {
       MKV_LOG( ZOL::LogFailure, "KaxSegment missing or not a finite size." );

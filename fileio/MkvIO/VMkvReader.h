@@ -76,10 +76,12 @@ namespace MkvIO
     bool OpenSegment();
     bool WalkSegment();
     bool ReadInfo( libebml::EbmlElement& io_rInfo );
+    void ReadInfoValue( libebml::EbmlElement& io_rValue );
     bool ReadTracks( libebml::EbmlElement& io_rTracks );
     bool ReadVideoTrack( libmatroska::KaxTrackEntry& i_rEntry, const std::string& i_rCodecID );
     void ReadAudioTrack( libmatroska::KaxTrackEntry& i_rEntry, const std::string& i_rCodecID );
     void ReadTags( libebml::EbmlElement& i_rTags );
+    void ReadSimpleTag( libebml::EbmlElement& i_rSimpleTag );
     void ApplyTags();
     void ComputeFramePeriod();
     void KeepBlockGroups( libmatroska::KaxCluster& io_rCluster );
