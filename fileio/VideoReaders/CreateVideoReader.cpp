@@ -2,6 +2,7 @@
 
 #include "fileio/ImageSequenceIO/VImageSequenceReader.h"
 #include "fileio/LumekVideo/VReader.h"
+#include "fileio/MkvIO/VMkvReader.h"
 #include "fileio/MovIO/VMovReader.h"
 #include "fileio/RapidAVI/VRapidAVIReader.h"
 
@@ -27,6 +28,7 @@ namespace
       { ZOL::VideoContainer_AVI, &MakeReader< RapidAVI::VRapidAVIReader > },
       { ZOL::VideoContainer_IMAGES, &MakeReader< ImageSequenceIO::VImageSequenceReader > },
       { ZOL::VideoContainer_LVID, &MakeReader< LumekVideo::VReader > },
+      { ZOL::VideoContainer_MKV, &MakeReader< MkvIO::VMkvReader > },
       { ZOL::VideoContainer_MOV, &MakeReader< MovIO::VMovReader > },
       { ZOL::VideoContainer_MP4, &MakeReader< MovIO::VMovReader > },
   };
