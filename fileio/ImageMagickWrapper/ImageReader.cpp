@@ -42,7 +42,9 @@ namespace ImageMagickWrapper
     {
       int Severity = 0;
       char* pText = i_rWrapper.MagickGetException( i_pWand, &Severity );
-      LogFailure( i_rKind, __LINE__, "ImageMagick exception: %s", pText != nullptr ? pText : "" );
+      // Some failures of the coders leave no text behind; the line still says which library.
+      const bool bHasText = pText != nullptr && *pText != '\0';
+      LogFailure( i_rKind, __LINE__, "ImageMagick exception: %s", bHasText ? pText : "(no description)" );
       if( pText != nullptr )
         i_rWrapper.MagickRelinquishMemory( pText );
     }
