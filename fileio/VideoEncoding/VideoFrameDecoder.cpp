@@ -35,14 +35,22 @@ namespace VideoEncoding
     {
       const VHead Head( i_pData, i_Size );
       const std::uint8_t* pInData = Head.Bytes;
-      return LUMEK_ASSERT( std::memcmp( pInData, s_MagicPNG, sizeof( s_MagicPNG ) ) == 0 );
+      // A file can hold anything: a frame of the wrong kind is a missing frame, not the end
+      // of the program.
+      if( std::memcmp( pInData, s_MagicPNG, sizeof( s_MagicPNG ) ) == 0 )
+        return true;
+      LUMEK_LOG( "VideoEncoding", ZOL::LogFailure, "PNG frame does not start with the PNG signature." );
+      return false;
     }
 
     bool HasTIFFSignature( const std::uint8_t* i_pData, std::uint64_t i_Size )
     {
       const VHead Head( i_pData, i_Size );
       const std::uint8_t* pInData = Head.Bytes;
-      return LUMEK_ASSERT( std::memcmp( pInData, s_MagicTIFF, sizeof( s_MagicTIFF ) ) == 0 );
+      if( std::memcmp( pInData, s_MagicTIFF, sizeof( s_MagicTIFF ) ) == 0 )
+        return true;
+      LUMEK_LOG( "VideoEncoding", ZOL::LogFailure, "TIFF frame does not start with the little-endian TIFF mark." );
+      return false;
     }
 
     // No still-image format stored here expands more than this: deflate stops near 1032:1

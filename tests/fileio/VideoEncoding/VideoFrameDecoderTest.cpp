@@ -190,14 +190,14 @@ namespace
     }
   }
 
-  // No JPEG, PNG or TIFF reader is built into this program yet: their frames are missing, and
-  // the signatures are still checked for PNG and TIFF.
+  // Payloads that are no image of their kind are missing frames; PNG and TIFF signatures are
+  // checked before anything is allocated for them.
   struct VStillImage
   {
     const char* Name;
     EVideoPayload Payload;
     std::vector< std::uint8_t > Bytes;
-    const char* Assertion; // expected text of the failed check, or null
+    const char* Assertion; // expected log line of the failed signature check, or null
   };
 
   std::ostream& operator<<( std::ostream& o, const VStillImage& i_rCase )
@@ -212,7 +212,7 @@ namespace
   TEST_P( StillImages, AreMissingFramesWithTheirSignatureChecked )
   {
     const VStillImage& rCase = GetParam();
-    VLogCapture Log( "System" );
+    VLogCapture Log( "VideoEncoding" );
     auto pBuffer = Payload( rCase.Bytes );
     IVideoFrameInfo FrameInfo = Info( 8, 8, PixelFormat_R8G8B8 );
     EXPECT_FALSE( Decode( rCase.Payload, FrameInfo, pBuffer ) );
@@ -225,8 +225,8 @@ namespace
     }
   }
 
-  const char* const s_PNGCheck = "std::memcmp( pInData, s_MagicPNG, sizeof( s_MagicPNG ) ) == 0";
-  const char* const s_TIFFCheck = "std::memcmp( pInData, s_MagicTIFF, sizeof( s_MagicTIFF ) ) == 0";
+  const char* const s_PNGCheck = "2 PNG frame does not start with the PNG signature.";
+  const char* const s_TIFFCheck = "2 TIFF frame does not start with the little-endian TIFF mark.";
 
   const VStillImage s_StillImages[] = {
       { "JPEG", VideoPayload_ImageJPEG, { 0xFF, 0xD8, 0xFF, 0xE0, 0, 0x10 }, nullptr },
