@@ -43,6 +43,19 @@ namespace MkvIO
         std::memcpy( pBuffer->GetData(), rFrame.Buffer(), rFrame.Size() );
       o_rBuffer = std::move( pBuffer );
     }
+
+    // Whether a block holds several frames. libmatroska loses the frames it made when a lace
+    // turns out damaged, and the family never laces, so such blocks are not handed to it.
+    bool IsLaced( EbmlStream& io_rStream, const EbmlElement& i_rBlock )
+    {
+      binary Head[5] = {};
+      const std::uint64_t Size = std::min< std::uint64_t >( i_rBlock.GetSize(), sizeof( Head ) );
+      const std::uint64_t Read = io_rStream.I_O().read( Head, static_cast< std::size_t >( Size ) );
+      io_rStream.I_O().setFilePointer( static_cast< int64 >( DataStart( i_rBlock ) ) );
+      // The track number is a one- or two-byte number, then two bytes of time, then the flags.
+      const std::size_t FlagsAt = ( Head[0] & 0x80 ) ? 3 : 4;
+      return Read > FlagsAt && ( Head[FlagsAt] & 0x06 ) != 0;
+    }
   } // namespace
 
   VMkvReader::VMkvReader()
@@ -339,6 +352,12 @@ namespace MkvIO
                         return;
                       bBlockSeen = true;
                       auto& rBlock = static_cast< KaxBlock& >( *io_rpElement );
+                      if( IsLaced( *m_pStream, rBlock ) )
+                      {
+                        MKV_LOG( ZOL::LogWarning, "Laced block at %d skipped: frames of this family are never laced.",
+                                 rBlock.GetElementPosition() );
+                        return;
+                      }
                       rBlock.ReadData( m_pStream->I_O(), SCOPE_ALL_DATA );
                       if( rBlock.ValueIsSet() && rBlock.NumberFrames() != 0 )
                         TakeBlock( rBlock, o_rVideo, o_rAudio, i_bReadVideo, i_bReadAudio );
