@@ -4,6 +4,8 @@
 #include "MovTestSupport.h"
 
 #include "tests/support/FfmpegFixtures.h"
+#include "utils/MemoryStream.h"
+#include "videointerface/AttributeRecords.h"
 
 #include <gtest/gtest.h>
 
@@ -102,5 +104,43 @@ namespace
     }
     EXPECT_EQ( Compared, 10 );
     boost::filesystem::remove_all( Folder );
+  }
+
+  // A MOV that carries the attribute stores of a recording in its QMDT atom shows what a .lvid
+  // with those stores shows: pixel format, rate, display settings and the attributes' rows.
+  TEST( MovToolQmdt, BayerMovShowsLikeARecording )
+  {
+    ZOL::IVideoAttributes FrameStore;
+    ZOL::IVideoFrameInfo Info;
+    Info.ImageWidth = 16;
+    Info.ImageHeight = 8;
+    Info.PixelFormat = ZOL::PixelFormat_BayerGB8;
+    ASSERT_TRUE( ZOL::WriteVideoFrameInfo( FrameStore, Info ) );
+    ZOL::IVideoAttributes Attributes;
+    ZOL::IVideoTiming Timing;
+    Timing.FramePeriodInTicks = 1350000;
+    ASSERT_TRUE( ZOL::WriteVideoTiming( Attributes, Timing ) );
+    ZOL::IVideoSettings Settings;
+    Settings.Saturation = 1.5f;
+    Settings.GammaCorrection = 0.75f;
+    ASSERT_TRUE( ZOL::WriteVideoSettings( Attributes, "", Settings ) );
+    CoreLumekTypes::VLensDistortionCalibration Lens;
+    Lens.RadialDistortionParameters = { 0.125, -0.5 };
+    ASSERT_TRUE( ZOL::WriteLensDistortionCalibration( Attributes, "", Lens ) );
+    UtilsIO::VMemoryStream Stores;
+    ASSERT_TRUE( FrameStore.WriteTo( Stores ) && Attributes.WriteTo( Stores ) );
+    MovTest::VMovSpec Spec;
+    Spec.BytesPerPixelTimes2 = 2;
+    Spec.Qmdt = Stores.GetData();
+    const std::string Path = MovTest::WriteTempFile( "bayer.mov", MovTest::WriteMov( Spec ) );
+
+    int ExitCode = -1;
+    const std::string Json = Tool( "info " + LumekTest::ShellQuote( Path ) + " --compact", ExitCode );
+    ASSERT_EQ( ExitCode, 0 ) << Json;
+    for( const char* pText : { "\"video\":\"V: 16 x 8 / BayerGB8 / 100.00Hz / 6 frames (0 missing) / 0.06s\"",
+                               "[\"Saturation\",\"1.5\"]", "[\"GammaCorrection\",\"0.75\"]",
+                               "[\"LensDistortionCalibration.RadialDistortionParameters_0\",\"0.125\"]" } )
+      EXPECT_NE( Json.find( pText ), std::string::npos ) << pText << " in\n" << Json;
+    boost::filesystem::remove( Path );
   }
 } // namespace
