@@ -7,26 +7,9 @@ namespace ZOL
   namespace
   {
     constexpr IEnumRow s_PixelFormatRows[] = {
-        { PixelFormat_Unspecified, "Unspecified", "" },
-        { PixelFormat_Luminance8, "Luminance8", "" },
-        { PixelFormat_BayerRG8, "BayerRG8", "" },
-        { PixelFormat_BayerGB8, "BayerGB8", "" },
-        { PixelFormat_BayerGR8, "BayerGR8", "" },
-        { PixelFormat_BayerBG8, "BayerBG8", "" },
-        { PixelFormat_R5G6B5, "R5G6B5", "" },
-        { PixelFormat_R8G8B8, "R8G8B8", "" },
-        { PixelFormat_B8G8R8, "B8G8R8", "" },
-        { PixelFormat_R8G8B8u8, "R8G8B8u8", "" },
-        { PixelFormat_B8G8R8u8, "B8G8R8u8", "" },
-        { PixelFormat_U8Y8V8Y8, "U8Y8V8Y8", "" },
-        { PixelFormat_Y8U8Y8V8, "Y8U8Y8V8", "" },
-        { PixelFormat_U10Y10V10Y10, "U10Y10V10Y10", "" },
-        { PixelFormat_BayerGB7, "BayerGB7", "" },
-        { PixelFormat_BayerGB6, "BayerGB6", "" },
-        { PixelFormat_Luminance7, "Luminance7", "" },
-        { PixelFormat_Luminance6, "Luminance6", "" },
-        { PixelFormat_PlanarY8U8V8, "PlanarY8U8V8", "" },
-        { PixelFormat_PlanarR8G8B8, "PlanarR8G8B8", "" },
+#define LUMEK_PIXEL_FORMAT_ROW( NAME, VALUE ) { PixelFormat_##NAME, #NAME, "" },
+        LUMEK_PIXEL_FORMATS( LUMEK_PIXEL_FORMAT_ROW )
+#undef LUMEK_PIXEL_FORMAT_ROW
     };
 
     constexpr IEnumRow s_VideoPayloadRows[] = {

@@ -13,30 +13,39 @@
 
 namespace ZOL
 {
+  // Every pixel format with its number. A format added here does not build until it has its row
+  // in PixelFormatDescriptor.cpp.
+#define LUMEK_PIXEL_FORMATS( X )                                                                                       \
+  X( Unspecified, 0 )                                                                                                  \
+  X( Luminance8, 1 )                                                                                                   \
+  X( BayerRG8, 2 )                                                                                                     \
+  X( BayerGB8, 3 )                                                                                                     \
+  X( BayerGR8, 4 )                                                                                                     \
+  X( BayerBG8, 5 )                                                                                                     \
+  X( R5G6B5, 6 )                                                                                                       \
+  X( R8G8B8, 7 )                                                                                                       \
+  X( B8G8R8, 8 )                                                                                                       \
+  X( R8G8B8u8, 9 )                                                                                                     \
+  X( B8G8R8u8, 10 )                                                                                                    \
+  X( U8Y8V8Y8, 11 )                                                                                                    \
+  X( Y8U8Y8V8, 12 )                                                                                                    \
+  X( U10Y10V10Y10, 13 )                                                                                                \
+  X( BayerGB7, 14 )                                                                                                    \
+  X( BayerGB6, 15 )                                                                                                    \
+  X( Luminance7, 16 )                                                                                                  \
+  X( Luminance6, 17 )                                                                                                  \
+  X( PlanarY8U8V8, 18 )                                                                                                \
+  X( PlanarR8G8B8, 19 )
+
   enum EPixelFormat : std::uint32_t
   {
-    PixelFormat_Unspecified = 0,
-    PixelFormat_Luminance8 = 1,
-    PixelFormat_BayerRG8 = 2,
-    PixelFormat_BayerGB8 = 3,
-    PixelFormat_BayerGR8 = 4,
-    PixelFormat_BayerBG8 = 5,
-    PixelFormat_R5G6B5 = 6,
-    PixelFormat_R8G8B8 = 7,
-    PixelFormat_B8G8R8 = 8,
-    PixelFormat_R8G8B8u8 = 9,
-    PixelFormat_B8G8R8u8 = 10,
-    PixelFormat_U8Y8V8Y8 = 11,
-    PixelFormat_Y8U8Y8V8 = 12,
-    PixelFormat_U10Y10V10Y10 = 13,
-    PixelFormat_BayerGB7 = 14,
-    PixelFormat_BayerGB6 = 15,
-    PixelFormat_Luminance7 = 16,
-    PixelFormat_Luminance6 = 17,
-    PixelFormat_PlanarY8U8V8 = 18,
-    PixelFormat_PlanarR8G8B8 = 19,
+#define LUMEK_PIXEL_FORMAT_ENUMERATOR( NAME, VALUE ) PixelFormat_##NAME = VALUE,
+    LUMEK_PIXEL_FORMATS( LUMEK_PIXEL_FORMAT_ENUMERATOR )
+#undef LUMEK_PIXEL_FORMAT_ENUMERATOR
   };
-  constexpr std::uint32_t PixelFormatCount = 20;
+#define LUMEK_PIXEL_FORMAT_ONE( NAME, VALUE ) +1
+  constexpr std::uint32_t PixelFormatCount = 0 LUMEK_PIXEL_FORMATS( LUMEK_PIXEL_FORMAT_ONE );
+#undef LUMEK_PIXEL_FORMAT_ONE
 
   enum EVideoPayload : std::uint32_t
   {

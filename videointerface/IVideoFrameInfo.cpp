@@ -1,5 +1,7 @@
 #include "videointerface/IVideoFrameInfo.h"
 
+#include "videointerface/PixelFormatDescriptor.h"
+
 namespace ZOL
 {
   bool IVideoFrameInfo::operator==( const IVideoFrameInfo& i_rOther ) const
@@ -45,40 +47,8 @@ namespace ZOL
   {
     if( i_rInfo.ImageWidth <= 0 || i_rInfo.ImageHeight <= 0 )
       return 0;
-    const std::uint64_t W = static_cast< std::uint64_t >( i_rInfo.ImageWidth );
-    const std::uint64_t H = static_cast< std::uint64_t >( i_rInfo.ImageHeight );
-    const std::uint64_t Pixels = W * H;
-    switch( i_rInfo.PixelFormat )
-    {
-    case PixelFormat_Luminance8:
-    case PixelFormat_BayerRG8:
-    case PixelFormat_BayerGB8:
-    case PixelFormat_BayerGR8:
-    case PixelFormat_BayerBG8:
-      return Pixels;
-    case PixelFormat_R5G6B5:
-    case PixelFormat_U8Y8V8Y8:
-    case PixelFormat_Y8U8Y8V8:
-    case PixelFormat_PlanarY8U8V8:
-      return Pixels * 2;
-    case PixelFormat_R8G8B8:
-    case PixelFormat_B8G8R8:
-    case PixelFormat_PlanarR8G8B8:
-      return Pixels * 3;
-    case PixelFormat_R8G8B8u8:
-    case PixelFormat_B8G8R8u8:
-      return Pixels * 4;
-    case PixelFormat_U10Y10V10Y10:
-      return ( ( W + 47 ) / 48 ) * H * 128;
-    case PixelFormat_BayerGB7:
-    case PixelFormat_Luminance7:
-      return ( Pixels * 7 + 7 ) / 8; // ceiling of 0.875 a pixel
-    case PixelFormat_BayerGB6:
-    case PixelFormat_Luminance6:
-      return ( Pixels * 6 + 7 ) / 8; // ceiling of 0.75 a pixel
-    default:
-      return 0;
-    }
+    return PixelFormatFrameBytes( i_rInfo.PixelFormat, static_cast< std::uint64_t >( i_rInfo.ImageWidth ),
+                                  static_cast< std::uint64_t >( i_rInfo.ImageHeight ) );
   }
 
   std::uint32_t GetVideoFrameSizeInBytes( const IVideoFrameInfo& i_rInfo )

@@ -1,6 +1,7 @@
 #include "app/Window/VideoWindowLogic.h"
 
 #include "videointerface/IBuffer.h"
+#include "videointerface/PixelFormatDescriptor.h"
 
 #include <QFileInfo>
 #include <QSettings>
@@ -107,8 +108,7 @@ namespace LumekVideoViewer
   {
     if( i_Payload != ZOL::VideoPayload_Uncompressed )
       return false;
-    return ( i_PixelFormat >= ZOL::PixelFormat_BayerRG8 && i_PixelFormat <= ZOL::PixelFormat_BayerBG8 ) ||
-           i_PixelFormat == ZOL::PixelFormat_BayerGB7 || i_PixelFormat == ZOL::PixelFormat_BayerGB6;
+    return ZOL::IsBayerFormat( i_PixelFormat );
   }
 
   namespace

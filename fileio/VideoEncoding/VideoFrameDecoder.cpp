@@ -3,6 +3,7 @@
 #include "fileio/VideoEncoding/ImageDecoders.h"
 #include "services/DebugServices.h"
 #include "services/Log.h"
+#include "videointerface/PixelFormatDescriptor.h"
 
 #include <algorithm>
 #include <cstring>
@@ -82,22 +83,12 @@ namespace VideoEncoding
 
     EPixelFormat JPEGOutput( EPixelFormat F, bool i_bForceColour )
     {
-      // Indexed by the stored format: what the JPEG reader gives for it.
-      constexpr EPixelFormat s_Outputs[PixelFormatCount] = {
-          PixelFormat_R8G8B8u8,     PixelFormat_Luminance8,   PixelFormat_PlanarY8U8V8, PixelFormat_PlanarY8U8V8,
-          PixelFormat_PlanarY8U8V8, PixelFormat_PlanarY8U8V8, PixelFormat_R8G8B8u8,     PixelFormat_R8G8B8,
-          PixelFormat_B8G8R8,       PixelFormat_R8G8B8u8,     PixelFormat_B8G8R8u8,     PixelFormat_U8Y8V8Y8,
-          PixelFormat_Y8U8Y8V8,     PixelFormat_R8G8B8u8,     PixelFormat_PlanarY8U8V8, PixelFormat_PlanarY8U8V8,
-          PixelFormat_Luminance8,   PixelFormat_R8G8B8u8,     PixelFormat_R8G8B8u8,     PixelFormat_R8G8B8u8 };
-      if( i_bForceColour || F >= PixelFormatCount )
-        return PixelFormat_R8G8B8u8;
-      return s_Outputs[F];
+      return i_bForceColour ? PixelFormat_R8G8B8u8 : DescribePixelFormat( F ).JPEGOutput;
     }
 
     EPixelFormat StillImageOutput( EPixelFormat F, bool )
     {
-      const bool bLuminance = F == PixelFormat_Luminance8 || F == PixelFormat_Luminance7 || F == PixelFormat_Luminance6;
-      return bLuminance ? PixelFormat_Luminance8 : PixelFormat_R8G8B8;
+      return DescribePixelFormat( F ).Family == EPixelFamily::Luminance ? PixelFormat_Luminance8 : PixelFormat_R8G8B8;
     }
 
     EPixelFormat NoOutput( EPixelFormat, bool )

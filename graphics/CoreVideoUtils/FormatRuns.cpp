@@ -3,6 +3,7 @@
 #include "graphics/CoreVideoUtils/PixelKernels.h"
 
 #include <cstring>
+#include <iterator>
 
 namespace CoreVideoUtils
 {
@@ -312,52 +313,72 @@ namespace CoreVideoUtils
 
       using namespace ZOL;
 
-      // Indexed by the pixel format's value. Bayer formats have no runs: they go through the demosaic.
-      constexpr VSourceRuns s_Sources[PixelFormatCount] = {
-          /* Unspecified */ { nullptr, nullptr, nullptr },
-          /* Luminance8 */ { LuminanceToLuminance, LuminanceToRGB, nullptr },
-          /* BayerRG8 */ { nullptr, nullptr, nullptr },
-          /* BayerGB8 */ { nullptr, nullptr, nullptr },
-          /* BayerGR8 */ { nullptr, nullptr, nullptr },
-          /* BayerBG8 */ { nullptr, nullptr, nullptr },
-          /* R5G6B5 */ { R5G6B5ToLuminance, R5G6B5ToRGB, nullptr },
-          /* R8G8B8 */ { InterleavedToLuminance< 3 >, InterleavedToRGB< 3, false >, nullptr },
-          /* B8G8R8 */ { InterleavedToLuminance< 3 >, InterleavedToRGB< 3, true >, nullptr },
-          /* R8G8B8u8 */ { InterleavedToLuminance< 4 >, InterleavedToRGB< 4, false >, nullptr },
-          /* B8G8R8u8 */ { InterleavedToLuminance< 4 >, InterleavedToRGB< 4, true >, nullptr },
-          /* U8Y8V8Y8 */ { PackedYUVToLuminance< 1 >, PackedYUVToRGB< false >, PackedYUVToChroma< false > },
-          /* Y8U8Y8V8 */ { PackedYUVToLuminance< 0 >, PackedYUVToRGB< true >, PackedYUVToChroma< true > },
-          /* U10Y10V10Y10 */ { TenBitToLuminance, TenBitToRGB, TenBitToChroma },
-          /* BayerGB7 */ { nullptr, nullptr, nullptr },
-          /* BayerGB6 */ { nullptr, nullptr, nullptr },
-          /* Luminance7 */ { PackedToLuminance< 7 >, PackedToRGB< 7 >, nullptr },
-          /* Luminance6 */ { PackedToLuminance< 6 >, PackedToRGB< 6 >, nullptr },
-          /* PlanarY8U8V8 */ { nullptr, PlanarYUVToRGB, PlanarYUVToChroma },
-          /* PlanarR8G8B8 */ { PlanarRGBToLuminance, PlanarRGBToRGB, nullptr },
+      // One row a format, keyed by it. Bayer formats have no runs: they go through the demosaic.
+      struct VRunRow
+      {
+        EPixelFormat Format;
+        VSourceRuns Source;
+        VTargetRuns Target;
       };
 
-      constexpr VTargetRuns s_Targets[PixelFormatCount] = {
-          /* Unspecified */ { ERunForm::None, nullptr },
-          /* Luminance8 */ { ERunForm::Luminance, nullptr },
-          /* BayerRG8 */ { ERunForm::None, nullptr },
-          /* BayerGB8 */ { ERunForm::None, nullptr },
-          /* BayerGR8 */ { ERunForm::None, nullptr },
-          /* BayerBG8 */ { ERunForm::None, nullptr },
-          /* R5G6B5 */ { ERunForm::RGB, RGBToR5G6B5 },
-          /* R8G8B8 */ { ERunForm::RGB, nullptr },
-          /* B8G8R8 */ { ERunForm::RGB, RGBToInterleaved< 3, true > },
-          /* R8G8B8u8 */ { ERunForm::RGB, RGBToInterleaved< 4, false > },
-          /* B8G8R8u8 */ { ERunForm::RGB, RGBToInterleaved< 4, true > },
-          /* U8Y8V8Y8 */ { ERunForm::Chroma, nullptr },
-          /* Y8U8Y8V8 */ { ERunForm::Chroma, ChromaToYUYV },
-          /* U10Y10V10Y10 */ { ERunForm::Chroma, ChromaToTenBit },
-          /* BayerGB7 */ { ERunForm::None, nullptr },
-          /* BayerGB6 */ { ERunForm::None, nullptr },
-          /* Luminance7 */ { ERunForm::Luminance, LuminanceToPacked< 7 > },
-          /* Luminance6 */ { ERunForm::Luminance, LuminanceToPacked< 6 > },
-          /* PlanarY8U8V8 */ { ERunForm::Chroma, ChromaToPlanarYUV },
-          /* PlanarR8G8B8 */ { ERunForm::RGB, RGBToPlanarRGB },
+      constexpr VRunRow s_Rows[] = {
+          { PixelFormat_Unspecified, { nullptr, nullptr, nullptr }, { ERunForm::None, nullptr } },
+          { PixelFormat_Luminance8,
+            { LuminanceToLuminance, LuminanceToRGB, nullptr },
+            { ERunForm::Luminance, nullptr } },
+          { PixelFormat_BayerRG8, { nullptr, nullptr, nullptr }, { ERunForm::None, nullptr } },
+          { PixelFormat_BayerGB8, { nullptr, nullptr, nullptr }, { ERunForm::None, nullptr } },
+          { PixelFormat_BayerGR8, { nullptr, nullptr, nullptr }, { ERunForm::None, nullptr } },
+          { PixelFormat_BayerBG8, { nullptr, nullptr, nullptr }, { ERunForm::None, nullptr } },
+          { PixelFormat_R5G6B5, { R5G6B5ToLuminance, R5G6B5ToRGB, nullptr }, { ERunForm::RGB, RGBToR5G6B5 } },
+          { PixelFormat_R8G8B8,
+            { InterleavedToLuminance< 3 >, InterleavedToRGB< 3, false >, nullptr },
+            { ERunForm::RGB, nullptr } },
+          { PixelFormat_B8G8R8,
+            { InterleavedToLuminance< 3 >, InterleavedToRGB< 3, true >, nullptr },
+            { ERunForm::RGB, RGBToInterleaved< 3, true > } },
+          { PixelFormat_R8G8B8u8,
+            { InterleavedToLuminance< 4 >, InterleavedToRGB< 4, false >, nullptr },
+            { ERunForm::RGB, RGBToInterleaved< 4, false > } },
+          { PixelFormat_B8G8R8u8,
+            { InterleavedToLuminance< 4 >, InterleavedToRGB< 4, true >, nullptr },
+            { ERunForm::RGB, RGBToInterleaved< 4, true > } },
+          { PixelFormat_U8Y8V8Y8,
+            { PackedYUVToLuminance< 1 >, PackedYUVToRGB< false >, PackedYUVToChroma< false > },
+            { ERunForm::Chroma, nullptr } },
+          { PixelFormat_Y8U8Y8V8,
+            { PackedYUVToLuminance< 0 >, PackedYUVToRGB< true >, PackedYUVToChroma< true > },
+            { ERunForm::Chroma, ChromaToYUYV } },
+          { PixelFormat_U10Y10V10Y10,
+            { TenBitToLuminance, TenBitToRGB, TenBitToChroma },
+            { ERunForm::Chroma, ChromaToTenBit } },
+          { PixelFormat_BayerGB7, { nullptr, nullptr, nullptr }, { ERunForm::None, nullptr } },
+          { PixelFormat_BayerGB6, { nullptr, nullptr, nullptr }, { ERunForm::None, nullptr } },
+          { PixelFormat_Luminance7,
+            { PackedToLuminance< 7 >, PackedToRGB< 7 >, nullptr },
+            { ERunForm::Luminance, LuminanceToPacked< 7 > } },
+          { PixelFormat_Luminance6,
+            { PackedToLuminance< 6 >, PackedToRGB< 6 >, nullptr },
+            { ERunForm::Luminance, LuminanceToPacked< 6 > } },
+          { PixelFormat_PlanarY8U8V8,
+            { nullptr, PlanarYUVToRGB, PlanarYUVToChroma },
+            { ERunForm::Chroma, ChromaToPlanarYUV } },
+          { PixelFormat_PlanarR8G8B8,
+            { PlanarRGBToLuminance, PlanarRGBToRGB, nullptr },
+            { ERunForm::RGB, RGBToPlanarRGB } },
       };
+
+      // Rows stand at their format's number, so that the look-up is an index.
+      constexpr bool HasOneRowEach()
+      {
+        if( std::size( s_Rows ) != PixelFormatCount )
+          return false;
+        for( std::uint32_t i = 0; i < PixelFormatCount; ++i )
+          if( s_Rows[i].Format != i )
+            return false;
+        return true;
+      }
+      static_assert( HasOneRowEach(), "every pixel format needs exactly one run row, in the enumeration's order" );
 
       constexpr VSourceRuns s_NoSource{ nullptr, nullptr, nullptr };
       constexpr VTargetRuns s_NoTarget{ ERunForm::None, nullptr };
@@ -365,12 +386,12 @@ namespace CoreVideoUtils
 
     const VSourceRuns& SourceRuns( ZOL::EPixelFormat i_Format )
     {
-      return i_Format < PixelFormatCount ? s_Sources[i_Format] : s_NoSource;
+      return i_Format < PixelFormatCount ? s_Rows[i_Format].Source : s_NoSource;
     }
 
     const VTargetRuns& TargetRuns( ZOL::EPixelFormat i_Format )
     {
-      return i_Format < PixelFormatCount ? s_Targets[i_Format] : s_NoTarget;
+      return i_Format < PixelFormatCount ? s_Rows[i_Format].Target : s_NoTarget;
     }
 
     void RGBToChroma( const std::uint8_t* i_pRGB, std::uint32_t i_Count, unsigned i_Parity, std::uint8_t* o_pRun )

@@ -5,6 +5,7 @@
 #include "services/DebugServices.h"
 #include "services/Log.h"
 #include "videointerface/BufferAllocators.h"
+#include "videointerface/PixelFormatDescriptor.h"
 
 #include <algorithm>
 #include <cstring>
@@ -22,11 +23,6 @@ namespace CoreVideoUtils
     bool IsOneOf( EPixelFormat i_Format, std::initializer_list< EPixelFormat > i_Formats )
     {
       return std::find( i_Formats.begin(), i_Formats.end(), i_Format ) != i_Formats.end();
-    }
-
-    bool IsRGBFamily( EPixelFormat i_Format ) // the targets a Bayer frame is colour corrected in
-    {
-      return i_Format >= PixelFormat_R8G8B8 && i_Format <= PixelFormat_B8G8R8u8;
     }
 
     // 10-bit YUV pairs a pixel's chroma with its neighbour's, so a frame needs whole pairs.
@@ -51,12 +47,6 @@ namespace CoreVideoUtils
     Info.ImageHeight = i_Height;
     Info.PixelFormat = i_Format;
     return ZOL::GetVideoFrameSizeInBytes64( Info );
-  }
-
-  bool IsBayerFormat( ZOL::EPixelFormat i_Format )
-  {
-    return ( i_Format >= PixelFormat_BayerRG8 && i_Format <= PixelFormat_BayerBG8 ) ||
-           i_Format == PixelFormat_BayerGB7 || i_Format == PixelFormat_BayerGB6;
   }
 
   VPixelFormatConverter::VPixelFormatConverter( std::shared_ptr< ZOL::IBufferAllocator > i_pAllocator,
@@ -120,39 +110,35 @@ namespace CoreVideoUtils
                                             std::uint8_t* o_pTarget, std::uint64_t i_TargetSize )
   {
     const std::uint64_t Pixels = static_cast< std::uint64_t >( i_Width ) * i_Height;
-    const unsigned PackedBits = i_SourceFormat == PixelFormat_BayerGB7 ? 7 : 6;
-    if( IsBayerFormat( i_TargetFormat ) )
+    const VPixelFormatDescriptor& rSource = DescribePixelFormat( i_SourceFormat );
+    const VPixelFormatDescriptor& rTarget = DescribePixelFormat( i_TargetFormat );
+    const bool bSourcePacked = rSource.Packing == EPixelPacking::PackedBits;
+    if( rTarget.Family == EPixelFamily::Bayer )
     {
-      // Between Bayer formats only the packing of BayerGB8 changes; the mosaic never moves.
-      if( i_TargetFormat == PixelFormat_BayerGB8 &&
-          IsOneOf( i_SourceFormat, { PixelFormat_BayerGB7, PixelFormat_BayerGB6 } ) )
-      {
-        Kernels::UnpackSamples( i_pSource, i_SourceSize, PackedBits, 0, Pixels, o_pTarget );
-        return true;
-      }
-      if( i_SourceFormat == PixelFormat_BayerGB8 &&
-          IsOneOf( i_TargetFormat, { PixelFormat_BayerGB7, PixelFormat_BayerGB6 } ) )
-      {
-        Kernels::PackSamples( i_pSource, i_TargetFormat == PixelFormat_BayerGB7 ? 7 : 6, 0, Pixels, o_pTarget,
-                              i_TargetSize );
-        return true;
-      }
-      return false;
+      // Between Bayer formats only the packing changes; the mosaic never moves.
+      const bool bTargetPacked = rTarget.Packing == EPixelPacking::PackedBits;
+      if( rSource.Phase != rTarget.Phase || bSourcePacked == bTargetPacked )
+        return false;
+      if( bSourcePacked )
+        Kernels::UnpackSamples( i_pSource, i_SourceSize, rSource.BitsPerSample, 0, Pixels, o_pTarget );
+      else
+        Kernels::PackSamples( i_pSource, rTarget.BitsPerSample, 0, Pixels, o_pTarget, i_TargetSize );
+      return true;
     }
     if( !IsOneOf( i_TargetFormat, { PixelFormat_Luminance8, PixelFormat_R8G8B8, PixelFormat_B8G8R8,
                                     PixelFormat_R8G8B8u8, PixelFormat_B8G8R8u8, PixelFormat_U8Y8V8Y8,
                                     PixelFormat_Y8U8Y8V8, PixelFormat_PlanarY8U8V8, PixelFormat_PlanarR8G8B8 } ) )
       return false;
-    if( IsOneOf( i_SourceFormat, { PixelFormat_BayerGB7, PixelFormat_BayerGB6 } ) )
+    if( bSourcePacked )
     {
       std::shared_ptr< ZOL::IBuffer > pBayer = Allocate( Pixels );
       if( !pBayer )
         return false;
-      Kernels::UnpackSamples( i_pSource, i_SourceSize, PackedBits, 0, Pixels, pBayer->GetData() );
-      return Demosaic( i_Width, i_Height, Kernels::BayerStartKind( PixelFormat_BayerGB8 ), pBayer->GetData(),
-                       i_TargetFormat, o_pTarget, i_TargetSize );
+      Kernels::UnpackSamples( i_pSource, i_SourceSize, rSource.BitsPerSample, 0, Pixels, pBayer->GetData() );
+      return Demosaic( i_Width, i_Height, BayerStartKind( i_SourceFormat ), pBayer->GetData(), i_TargetFormat,
+                       o_pTarget, i_TargetSize );
     }
-    return Demosaic( i_Width, i_Height, Kernels::BayerStartKind( i_SourceFormat ), i_pSource, i_TargetFormat, o_pTarget,
+    return Demosaic( i_Width, i_Height, BayerStartKind( i_SourceFormat ), i_pSource, i_TargetFormat, o_pTarget,
                      i_TargetSize );
   }
 
@@ -172,7 +158,7 @@ namespace CoreVideoUtils
     std::memset( pZero, 0, W );
 
     const VColourCorrector& rCorrector = *m_pColourCorrector;
-    const bool bCorrect = IsRGBFamily( i_TargetFormat ) && !rCorrector.IsIdentity();
+    const bool bCorrect = IsInterleavedRGB( i_TargetFormat ) && !rCorrector.IsIdentity();
     const std::uint8_t* pTable = rCorrector.GetGamma() != 1.0f ? rCorrector.GetTable().data() : nullptr;
     const Runs::VFrame Target = MakeFrame( o_pTarget, i_TargetSize, i_Width, i_Height );
     const Runs::VTargetRuns& rTargetRuns = Runs::TargetRuns( i_TargetFormat );

@@ -185,23 +185,6 @@ namespace CoreVideoUtils
       }
     } // namespace
 
-    int BayerStartKind( ZOL::EPixelFormat i_Format )
-    {
-      switch( i_Format )
-      {
-      case ZOL::PixelFormat_BayerRG8:
-        return 0;
-      case ZOL::PixelFormat_BayerGR8:
-        return 1;
-      case ZOL::PixelFormat_BayerBG8:
-        return 2;
-      case ZOL::PixelFormat_BayerGB8:
-        return 3;
-      default:
-        return -1;
-      }
-    }
-
     void DemosaicRow( const std::uint8_t* i_pNorth, const std::uint8_t* i_pRow, const std::uint8_t* i_pSouth,
                       std::uint32_t i_Width, unsigned i_StartKind, bool i_bSwapRB, std::uint8_t* o_pRGB,
                       EInstructionSet i_Set )

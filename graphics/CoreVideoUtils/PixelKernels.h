@@ -16,7 +16,6 @@ namespace CoreVideoUtils
   {
     // Site kind of the first pixel of the first row: 0 red, 1 green on a red row, 2 blue,
     // 3 green on a blue row; -1 for formats that are not 8-bit Bayer.
-    int BayerStartKind( ZOL::EPixelFormat i_Format );
 
     // Bilinear demosaic of one row into 3 bytes a pixel (R, G, B, or B, G, R with i_bSwapRB).
     // i_pNorth and i_pSouth are the rows above and below, all zero outside the image.

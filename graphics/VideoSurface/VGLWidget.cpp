@@ -10,6 +10,7 @@
 #include "graphics/VideoSurface/VOverlayText.h"
 #include "graphics/VideoSurface/VPixelFormatRouting.h"
 #include "graphics/VideoSurface/VVideoTexture.h"
+#include "videointerface/PixelFormatDescriptor.h"
 
 #include <QCoreApplication>
 #include <QMouseEvent>
@@ -192,7 +193,7 @@ namespace LumekVideoViewer
       ConvertThroughRGBA( Converter, *io_pBuffer, *pRGB );
     // Bayer frames take gamma and saturation a second time on top of the converter's; the
     // software picture is defined that way.
-    if( CoreVideoUtils::IsBayerFormat( m_PixelRecord.PixelFormat ) )
+    if( ZOL::IsBayerFormat( m_PixelRecord.PixelFormat ) )
     {
       m_pColourCorrector->Set( m_VideoSettings );
       m_pColourCorrector->Apply( m_PixelRecord.ImageWidth, m_PixelRecord.ImageHeight, ZOL::PixelFormat_R8G8B8,
@@ -331,7 +332,7 @@ namespace LumekVideoViewer
     int FirstRedX = 0;
     int FirstRedY = 0;
     if( m_ActiveProgram == VideoGraphics::Program_VideoBayer &&
-        VideoGraphics::FirstRedOffset( m_PixelRecord.PixelFormat, FirstRedX, FirstRedY ) )
+        ZOL::FirstRedOffset( m_PixelRecord.PixelFormat, FirstRedX, FirstRedY ) )
       rProgram.SetUniform( rProgram.UniformLocation( "u_FirstRed" ),
                            QVector2D( float( FirstRedX ), float( FirstRedY ) ) );
     if( m_ActiveProgram == VideoGraphics::Program_VideoBayer || m_ActiveProgram == VideoGraphics::Program_VideoYUV )

@@ -16,23 +16,23 @@ namespace VideoGraphics
     const char* const YUV = "Hardware YUV Decoder";
 
     const VPixelFormatRoute Routes[] = {
-        { PixelFormat_Luminance8, Program_VideoLuminance, Grey, GL_R8, 1, PixelFormat_Luminance8, false },
-        { PixelFormat_BayerRG8, Program_VideoBayer, Bayer, GL_R8, 1, PixelFormat_BayerRG8, false },
-        { PixelFormat_BayerGB8, Program_VideoBayer, Bayer, GL_R8, 1, PixelFormat_BayerGB8, false },
-        { PixelFormat_BayerGR8, Program_VideoBayer, Bayer, GL_R8, 1, PixelFormat_BayerGR8, false },
-        { PixelFormat_BayerBG8, Program_VideoBayer, Bayer, GL_R8, 1, PixelFormat_BayerBG8, false },
-        { PixelFormat_R5G6B5, Program_VideoRaw, RGB, GL_RGB565, 1, PixelFormat_R5G6B5, false },
-        { PixelFormat_R8G8B8, Program_VideoRaw, RGB, GL_RGB8, 1, PixelFormat_R8G8B8, false },
-        { PixelFormat_B8G8R8, Program_VideoRaw, RGB, GL_RGB8, 1, PixelFormat_B8G8R8, true },
-        { PixelFormat_R8G8B8u8, Program_VideoRaw, RGB, GL_RGBA8, 1, PixelFormat_R8G8B8u8, false },
-        { PixelFormat_B8G8R8u8, Program_VideoRaw, RGB, GL_RGBA8, 1, PixelFormat_B8G8R8u8, true },
-        { PixelFormat_U8Y8V8Y8, Program_VideoYUV, YUV, GL_RGBA8, 2, PixelFormat_U8Y8V8Y8, true },
-        { PixelFormat_Y8U8Y8V8, Program_VideoYUV, YUV, GL_RGBA8, 2, PixelFormat_Y8U8Y8V8, false },
-        { PixelFormat_U10Y10V10Y10, Program_VideoYUV, YUV, GL_RGBA8, 2, PixelFormat_U8Y8V8Y8, true },
-        { PixelFormat_BayerGB7, Program_VideoBayer, Bayer, GL_R8, 1, PixelFormat_BayerGB8, false },
-        { PixelFormat_BayerGB6, Program_VideoBayer, Bayer, GL_R8, 1, PixelFormat_BayerGB8, false },
-        { PixelFormat_Luminance7, Program_VideoLuminance, Grey, GL_R8, 1, PixelFormat_Luminance8, false },
-        { PixelFormat_Luminance6, Program_VideoLuminance, Grey, GL_R8, 1, PixelFormat_Luminance8, false },
+        { PixelFormat_Luminance8, Program_VideoLuminance, Grey, GL_R8, 1, false },
+        { PixelFormat_BayerRG8, Program_VideoBayer, Bayer, GL_R8, 1, false },
+        { PixelFormat_BayerGB8, Program_VideoBayer, Bayer, GL_R8, 1, false },
+        { PixelFormat_BayerGR8, Program_VideoBayer, Bayer, GL_R8, 1, false },
+        { PixelFormat_BayerBG8, Program_VideoBayer, Bayer, GL_R8, 1, false },
+        { PixelFormat_R5G6B5, Program_VideoRaw, RGB, GL_RGB565, 1, false },
+        { PixelFormat_R8G8B8, Program_VideoRaw, RGB, GL_RGB8, 1, false },
+        { PixelFormat_B8G8R8, Program_VideoRaw, RGB, GL_RGB8, 1, true },
+        { PixelFormat_R8G8B8u8, Program_VideoRaw, RGB, GL_RGBA8, 1, false },
+        { PixelFormat_B8G8R8u8, Program_VideoRaw, RGB, GL_RGBA8, 1, true },
+        { PixelFormat_U8Y8V8Y8, Program_VideoYUV, YUV, GL_RGBA8, 2, true },
+        { PixelFormat_Y8U8Y8V8, Program_VideoYUV, YUV, GL_RGBA8, 2, false },
+        { PixelFormat_U10Y10V10Y10, Program_VideoYUV, YUV, GL_RGBA8, 2, true },
+        { PixelFormat_BayerGB7, Program_VideoBayer, Bayer, GL_R8, 1, false },
+        { PixelFormat_BayerGB6, Program_VideoBayer, Bayer, GL_R8, 1, false },
+        { PixelFormat_Luminance7, Program_VideoLuminance, Grey, GL_R8, 1, false },
+        { PixelFormat_Luminance6, Program_VideoLuminance, Grey, GL_R8, 1, false },
     };
   } // namespace
 
@@ -53,28 +53,5 @@ namespace VideoGraphics
   QSize TextureSize( const VPixelFormatRoute& i_rRoute, int i_Width, int i_Height )
   {
     return QSize( i_Width / i_rRoute.WidthDivisor, i_Height );
-  }
-
-  bool FirstRedOffset( std::uint32_t i_Format, int& o_rX, int& o_rY )
-  {
-    switch( i_Format )
-    {
-    case PixelFormat_BayerRG8:
-      o_rX = 0, o_rY = 0;
-      return true;
-    case PixelFormat_BayerGB8:
-    case PixelFormat_BayerGB7:
-    case PixelFormat_BayerGB6:
-      o_rX = 0, o_rY = 1;
-      return true;
-    case PixelFormat_BayerGR8:
-      o_rX = 1, o_rY = 0;
-      return true;
-    case PixelFormat_BayerBG8:
-      o_rX = 1, o_rY = 1;
-      return true;
-    default:
-      return false;
-    }
   }
 } // namespace VideoGraphics

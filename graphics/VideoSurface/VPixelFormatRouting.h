@@ -4,6 +4,7 @@
 // One row a format; formats without a row are never uploaded.
 
 #include "videointerface/Enumerations.h"
+#include "videointerface/PixelFormatDescriptor.h"
 
 #include <QSize>
 #include <qopengl.h>
@@ -33,10 +34,11 @@ namespace VideoGraphics
     GLenum InternalFormat;
     // 2 where a texel holds two pixels.
     int WidthDivisor;
-    // The format the bytes are converted to before upload; the format itself when they go as they are.
-    ZOL::EPixelFormat UploadFormat;
     // The byte order differs from the one the program reads naturally.
     bool Swizzle;
+
+    // The format the bytes are converted to before upload; the format itself when they go as they are.
+    ZOL::EPixelFormat UploadFormat() const { return ZOL::DescribePixelFormat( Format ).ShaderFormat; }
   };
 
   // The row of a format, or nullptr for the formats that never go to the card as they are.
@@ -44,7 +46,4 @@ namespace VideoGraphics
 
   // Texture size of a frame of that route: the width halved, rounded down, where texels pair pixels.
   QSize TextureSize( const VPixelFormatRoute& i_rRoute, int i_Width, int i_Height );
-
-  // The offset that brings a red site to an even column and row, for the Bayer program.
-  bool FirstRedOffset( std::uint32_t i_Format, int& o_rX, int& o_rY );
 } // namespace VideoGraphics

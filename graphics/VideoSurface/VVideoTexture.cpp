@@ -73,8 +73,8 @@ namespace VideoGraphics
       return;
     m_UploadedFormat = Format;
     if( pRoute != nullptr )
-      Upload( i_rContext, i_Format, Size, pRoute->InternalFormat, pRoute->UploadFormat != pRoute->Format,
-              pRoute->UploadFormat );
+      Upload( i_rContext, i_Format, Size, pRoute->InternalFormat, pRoute->UploadFormat() != pRoute->Format,
+              pRoute->UploadFormat() );
   }
 
   bool VVideoTexture::EnsureStorage( const QSize& i_rSize, GLenum i_InternalFormat )

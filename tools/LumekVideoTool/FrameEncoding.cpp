@@ -1,6 +1,7 @@
 #include "tools/LumekVideoTool/FrameEncoding.h"
 
 #include "videointerface/IVideoFrameInfo.h"
+#include "videointerface/PixelFormatDescriptor.h"
 
 #include <algorithm>
 
@@ -132,22 +133,7 @@ namespace LumekVideoTool
   int BayerChannelAt( ZOL::EPixelFormat i_Format, int i_X, int i_Y )
   {
     // Site kinds: 0 red, 1 green on a red row, 3 green on a blue row, 2 blue.
-    int Start = 0;
-    switch( i_Format )
-    {
-    case ZOL::PixelFormat_BayerRG8:
-      Start = 0;
-      break;
-    case ZOL::PixelFormat_BayerGR8:
-      Start = 1;
-      break;
-    case ZOL::PixelFormat_BayerBG8:
-      Start = 2;
-      break;
-    default: // BayerGB8 and its packed forms
-      Start = 3;
-      break;
-    }
+    const int Start = std::max( ZOL::BayerStartKind( i_Format ), 0 );
     const int Kind = ( Start ^ ( ( i_Y & 1 ) ? 3 : 0 ) ) ^ ( i_X & 1 );
     static const int s_Channel[4] = { 0, 1, 2, 1 };
     return s_Channel[Kind];

@@ -27,9 +27,9 @@ namespace
 
   TEST( PixelFormatRouting, PackedFormatsWidenBeforeUploadAndYUVPairsPixels )
   {
-    EXPECT_EQ( FindPixelFormatRoute( ZOL::PixelFormat_BayerGB7 )->UploadFormat, ZOL::PixelFormat_BayerGB8 );
-    EXPECT_EQ( FindPixelFormatRoute( ZOL::PixelFormat_Luminance6 )->UploadFormat, ZOL::PixelFormat_Luminance8 );
-    EXPECT_EQ( FindPixelFormatRoute( ZOL::PixelFormat_U10Y10V10Y10 )->UploadFormat, ZOL::PixelFormat_U8Y8V8Y8 );
+    EXPECT_EQ( FindPixelFormatRoute( ZOL::PixelFormat_BayerGB7 )->UploadFormat(), ZOL::PixelFormat_BayerGB8 );
+    EXPECT_EQ( FindPixelFormatRoute( ZOL::PixelFormat_Luminance6 )->UploadFormat(), ZOL::PixelFormat_Luminance8 );
+    EXPECT_EQ( FindPixelFormatRoute( ZOL::PixelFormat_U10Y10V10Y10 )->UploadFormat(), ZOL::PixelFormat_U8Y8V8Y8 );
     // An odd width loses its last pixel to the halving.
     EXPECT_EQ( TextureSize( *FindPixelFormatRoute( ZOL::PixelFormat_U8Y8V8Y8 ), 33, 7 ), QSize( 16, 7 ) );
     EXPECT_EQ( TextureSize( *FindPixelFormatRoute( ZOL::PixelFormat_BayerRG8 ), 33, 7 ), QSize( 33, 7 ) );
