@@ -7,6 +7,7 @@
 #include "fileio/LumekVideo/LvidFormat.h"
 #include "fileio/LumekVideo/VReaderCapabilities.h"
 #include "videointerface/IVideoReader.h"
+#include "videointerface/VideoReaderBase.h"
 
 #include <cstdint>
 #include <map>
@@ -15,7 +16,7 @@
 
 namespace LumekVideo
 {
-  class VReader : public ZOL::IVideoReader, public ZOL::IFrameIndexQueries
+  class VReader : public ZOL::VVideoReaderBase, public ZOL::IFrameIndexQueries
   {
   public:
     VReader();
@@ -24,10 +25,10 @@ namespace LumekVideo
     VReader& operator=( const VReader& ) = delete;
 
     const ZOL::IVideoReaderCapabilities& GetCapabilities() const override { return m_Capabilities; }
-    bool Open( const std::string& i_rFileName ) override;
+    using ZOL::VVideoReaderBase::Open;
     // Reads a recording from a stream that is already open, starting at its position 0. The
     // reader keeps the stream until Close. This is how recordings in memory are read.
-    bool Open( const std::shared_ptr< ZOL::IInputStreamSeekable >& i_pStream );
+    [[nodiscard]] bool Open( const std::shared_ptr< ZOL::IInputStreamSeekable >& i_pStream );
     bool SetBufferAllocators( const std::shared_ptr< ZOL::IBufferAllocator >& i_pVideo,
                               const std::shared_ptr< ZOL::IBufferAllocator >& i_pAudio,
                               const std::shared_ptr< ZOL::IBufferAllocator >& i_pSpare ) override;
@@ -54,8 +55,14 @@ namespace LumekVideo
     // Frame number to the position of its record, as the index gives it.
     const std::map< std::uint64_t, std::uint64_t >& GetFrameIndex() const { return m_Index; }
 
+  protected:
+    bool OpenReader( const std::string& i_rFileName ) override;
+    void Reset() override;
+    // A cut-off index keeps the frames it names before the cut, and the stream to read them.
+    bool KeepsWhatAFailedOpenRead() const override { return m_bIndexReached; }
+
   private:
-    void Reset();
+    bool OpenStream( const std::shared_ptr< ZOL::IInputStreamSeekable >& i_pStream );
     bool ReadDescription();
     bool ReadIndex();
     bool ReadAudio( ZOL::IAudioBuffers& o_rAudio );
@@ -78,5 +85,6 @@ namespace LumekVideo
     // Every count, size and offset in the file is checked against this before it is trusted.
     std::uint64_t m_FileSize = 0;
     std::uint64_t m_VideoFrameSize = 0;
+    bool m_bIndexReached = false;
   };
 } // namespace LumekVideo
