@@ -18,10 +18,10 @@ namespace ZOL
   public:
     virtual ~ISeekable() = default;
     // The size in bytes; the position stays where it was.
-    virtual bool GetSize( std::uint64_t& o_rSize ) = 0;
-    virtual bool GetPosition( std::uint64_t& o_rPosition ) = 0;
+    [[nodiscard]] virtual bool GetSize( std::uint64_t& o_rSize ) = 0;
+    [[nodiscard]] virtual bool GetPosition( std::uint64_t& o_rPosition ) = 0;
     // Absolute position.
-    virtual bool Seek( std::int64_t i_Position ) = 0;
+    [[nodiscard]] virtual bool Seek( std::int64_t i_Position ) = 0;
   };
 
   using IReadBlocks = std::vector< std::pair< void*, std::uint64_t > >;
@@ -32,10 +32,10 @@ namespace ZOL
   public:
     virtual ~IInputStream() = default;
     // Reads exactly i_Size bytes; false when fewer came.
-    virtual bool Read( void* o_pBuffer, std::uint64_t i_Size ) = 0;
+    [[nodiscard]] virtual bool Read( void* o_pBuffer, std::uint64_t i_Size ) = 0;
     // The end of the data was hit by a read.
     virtual bool IsAtEnd() = 0;
-    virtual bool ReadAll( const IReadBlocks& i_rBlocks );
+    [[nodiscard]] virtual bool ReadAll( const IReadBlocks& i_rBlocks );
     virtual bool IsReserved() { return false; }
   };
 
@@ -44,9 +44,9 @@ namespace ZOL
   public:
     virtual ~IOutputStream() = default;
     // Writes exactly i_Size bytes; false when fewer went out.
-    virtual bool Write( const void* i_pBuffer, std::uint64_t i_Size ) = 0;
-    virtual bool WriteAll( const IWriteBlocks& i_rBlocks );
-    virtual bool WriteBuffer( const IBufferConst& i_rBuffer );
+    [[nodiscard]] virtual bool Write( const void* i_pBuffer, std::uint64_t i_Size ) = 0;
+    [[nodiscard]] virtual bool WriteAll( const IWriteBlocks& i_rBlocks );
+    [[nodiscard]] virtual bool WriteBuffer( const IBufferConst& i_rBuffer );
   };
 
   class IInputStreamSeekable : public IInputStream, public virtual ISeekable
@@ -62,10 +62,10 @@ namespace ZOL
   };
 
   // Skips i_Bytes from the current position.
-  bool Skip( IInputStreamSeekable& i_rStream, std::int64_t i_Bytes );
+  [[nodiscard]] bool Skip( IInputStreamSeekable& i_rStream, std::int64_t i_Bytes );
 
   // Little-endian values on a stream.
-  template < typename T > bool ReadLE( IInputStream& i_rStream, T& o_rValue )
+  template < typename T > [[nodiscard]] bool ReadLE( IInputStream& i_rStream, T& o_rValue )
   {
     std::uint8_t Bytes[sizeof( T )];
     if( !i_rStream.Read( Bytes, sizeof( T ) ) )
@@ -85,7 +85,7 @@ namespace ZOL
     return true;
   }
 
-  template < typename T > bool WriteLE( IOutputStream& i_rStream, T i_Value )
+  template < typename T > [[nodiscard]] bool WriteLE( IOutputStream& i_rStream, T i_Value )
   {
     std::uint64_t Value = 0;
     if constexpr( sizeof( T ) == 4 && std::is_floating_point_v< T > )

@@ -39,12 +39,12 @@ namespace ZOL
 
     virtual const IVideoReaderCapabilities& GetCapabilities() const = 0;
     // Reads the file's description and index; false when the file is not usable.
-    virtual bool Open( const std::string& i_rFileName ) = 0;
+    [[nodiscard]] virtual bool Open( const std::string& i_rFileName ) = 0;
     // Writes the container's tree as text; readers without one answer false.
-    virtual bool DumpFileStructure( std::ostream& o_rStream ) { return false; }
-    virtual bool SetBufferAllocators( const std::shared_ptr< IBufferAllocator >& i_pVideo,
-                                      const std::shared_ptr< IBufferAllocator >& i_pAudio,
-                                      const std::shared_ptr< IBufferAllocator >& i_pSpare )
+    [[nodiscard]] virtual bool DumpFileStructure( std::ostream& o_rStream ) { return false; }
+    [[nodiscard]] virtual bool SetBufferAllocators( const std::shared_ptr< IBufferAllocator >& i_pVideo,
+                                                    const std::shared_ptr< IBufferAllocator >& i_pAudio,
+                                                    const std::shared_ptr< IBufferAllocator >& i_pSpare )
     {
       return false;
     }
@@ -61,10 +61,11 @@ namespace ZOL
     virtual bool HasFrame( std::uint64_t i_FrameIndex ) const = 0;
     // Reads one frame and fills the requested halves of the record. Built on ReadFrameData, so
     // a reader that overrides only that keeps these semantics.
-    virtual bool ReadFrame( std::uint64_t i_FrameIndex, IVideoFrame& o_rFrame, bool i_bReadVideo, bool i_bReadAudio );
+    [[nodiscard]] virtual bool ReadFrame( std::uint64_t i_FrameIndex, IVideoFrame& o_rFrame, bool i_bReadVideo,
+                                          bool i_bReadAudio );
     // The stored payload and audio blocks of one frame, without decoding.
-    virtual bool ReadFrameData( std::uint64_t i_FrameIndex, std::shared_ptr< IBuffer >& o_rVideo,
-                                IAudioBuffers& o_rAudio, bool i_bReadVideo, bool i_bReadAudio ) = 0;
+    [[nodiscard]] virtual bool ReadFrameData( std::uint64_t i_FrameIndex, std::shared_ptr< IBuffer >& o_rVideo,
+                                              IAudioBuffers& o_rAudio, bool i_bReadVideo, bool i_bReadAudio ) = 0;
     virtual void Close() = 0;
   };
 

@@ -88,7 +88,10 @@ namespace LumekVideoViewer
 
     const ZOL::EVideoPayload Payload = m_pReader->GetVideoPayload();
     ZOL::IVideoFrameInfo Info = m_pReader->GetVideoFrameInfo();
-    VideoEncoding::PixelFormatForPayloadFormat( Payload, Info.PixelFormat, Info.PixelFormat, false );
+    // A payload without a decoded form has nothing to give; the decoder would refuse it anyway,
+    // but only after the stored format had been taken for the decoded one.
+    if( !VideoEncoding::PixelFormatForPayloadFormat( Payload, Info.PixelFormat, Info.PixelFormat, false ) )
+      return false;
     const std::shared_ptr< ZOL::IBufferAllocator > pFirst = m_pFirstAllocator;
     const std::shared_ptr< ZOL::IBufferAllocator > pSecond = m_pSecondAllocator;
     const bool bDecoded = VideoEncoding::VideoFrameDecoder( Payload, Info, pBuffer, pFirst, pSecond, m_pH264Decoder );

@@ -28,15 +28,15 @@ namespace LumekVideoViewer
     VVideoSource& operator=( const VVideoSource& ) = delete;
 
     // Picks a reader by the path's name alone and opens it; false when no reader takes the file.
-    bool Open( const std::string& i_rPath );
+    [[nodiscard]] bool Open( const std::string& i_rPath );
     // The same with a reader the caller made, for containers not reached by name (tests).
-    bool Open( const std::string& i_rPath, std::shared_ptr< ZOL::IVideoReader > i_pReader );
+    [[nodiscard]] bool Open( const std::string& i_rPath, std::shared_ptr< ZOL::IVideoReader > i_pReader );
     bool Close();
     bool IsOpen() const { return m_pReader != nullptr; }
 
     // Reads and decodes one frame. The record gets the frame's description and buffer also when
     // decoding fails; false with no reader, or when the frame cannot be read or decoded.
-    bool GetFrame( std::uint64_t i_Index, ZOL::IVideoFrame& o_rFrame );
+    [[nodiscard]] bool GetFrame( std::uint64_t i_Index, ZOL::IVideoFrame& o_rFrame );
 
     // These need an open file.
     std::uint64_t GetFrameCount() const;

@@ -61,24 +61,28 @@ namespace LumekVideo
     m_Index.clear();
     m_FileSize = 0;
     m_VideoFrameSize = 0;
+    m_bIndexReached = false;
   }
 
-  bool VReader::Open( const std::string& i_rFileName )
+  bool VReader::OpenReader( const std::string& i_rFileName )
   {
-    Reset();
     auto pFile = std::make_shared< UtilsIO::VLargeFile >();
     if( !pFile->Open( i_rFileName, UtilsIO::OpenMode_Read ) )
       return false;
-    return Open( pFile );
+    return OpenStream( pFile );
   }
 
   bool VReader::Open( const std::shared_ptr< ZOL::IInputStreamSeekable >& i_pStream )
   {
-    Reset();
+    return OpenWith( [&] { return OpenStream( i_pStream ); } );
+  }
+
+  bool VReader::OpenStream( const std::shared_ptr< ZOL::IInputStreamSeekable >& i_pStream )
+  {
     if( !i_pStream )
       return false;
-    // The stream stays with the reader even when opening fails part way: the index entries read
-    // before a short read remain readable, as a capture cut off while writing its index is.
+    // The stream is the reader's from here: a failure in the index keeps it, so that the entries
+    // read before a short read remain readable, as a capture cut off while writing its index is.
     m_pStream = i_pStream;
     if( !m_pStream->GetSize( m_FileSize ) || !m_pStream->Seek( 0 ) )
       return false;
@@ -109,6 +113,7 @@ namespace LumekVideo
 
   bool VReader::ReadIndex()
   {
+    m_bIndexReached = true;
     const std::uint64_t IndexOffset = m_Header.IndexOffset;
     if( !FitsInFile( IndexOffset, IndexCountSize, m_FileSize ) ||
         !m_pStream->Seek( static_cast< std::int64_t >( IndexOffset ) ) )
@@ -212,13 +217,10 @@ namespace LumekVideo
         return false;
       o_rVideo = std::move( pVideo );
     }
-    else if( bFrameInFile )
+    else if( !bFrameInFile || !m_pStream->Seek( static_cast< std::int64_t >( FrameOffset + m_VideoFrameSize ) ) )
     {
-      m_pStream->Seek( static_cast< std::int64_t >( FrameOffset + m_VideoFrameSize ) );
-    }
-    else
-    {
-      // The audio would sit beyond the end of the file.
+      // The audio would sit beyond the end of the file, or a failed seek would start the audio
+      // read inside the video bytes.
       return false;
     }
 

@@ -16,8 +16,8 @@ namespace ZOL
   public:
     // i_PixelFormat is the wished output (U8Y8V8Y8 or Y8U8Y8V8); the decoder sets format,
     // width and height of the info to what it gives, and hands the frame to o_rOutput.
-    virtual bool Decode( const IBufferConst& i_rInput, EPixelFormat i_PixelFormat,
-                         std::shared_ptr< IBuffer >& o_rOutput, IVideoFrameInfo& io_VideoFrameInfo ) = 0;
+    [[nodiscard]] virtual bool Decode( const IBufferConst& i_rInput, EPixelFormat i_PixelFormat,
+                                       std::shared_ptr< IBuffer >& o_rOutput, IVideoFrameInfo& io_VideoFrameInfo ) = 0;
     virtual ~IH264Decoder() = default;
   };
 } // namespace ZOL

@@ -16,16 +16,16 @@ namespace VideoEncoding
   // decoded one (the same buffer for Uncompressed, which is never copied). io_VideoFrameInfo
   // describes the result; decoders may change its format and size. i_rH264Decoder may be null
   // for all payloads but VideoH264.
-  bool VideoFrameDecoder( ZOL::EVideoPayload i_Payload, ZOL::IVideoFrameInfo& io_VideoFrameInfo,
-                          std::shared_ptr< ZOL::IBuffer >& io_rBuffer,
-                          const std::shared_ptr< ZOL::IBufferAllocator >& i_rAllocator,
-                          const std::shared_ptr< ZOL::IBufferAllocator >& i_rTemporaryAllocator,
-                          const std::shared_ptr< ZOL::IH264Decoder >& i_rH264Decoder );
+  [[nodiscard]] bool VideoFrameDecoder( ZOL::EVideoPayload i_Payload, ZOL::IVideoFrameInfo& io_VideoFrameInfo,
+                                        std::shared_ptr< ZOL::IBuffer >& io_rBuffer,
+                                        const std::shared_ptr< ZOL::IBufferAllocator >& i_rAllocator,
+                                        const std::shared_ptr< ZOL::IBufferAllocator >& i_rTemporaryAllocator,
+                                        const std::shared_ptr< ZOL::IH264Decoder >& i_rH264Decoder );
 
   // The pixel format that decoded frames of a payload will have, given the format stored in
   // the file. False, with a log line and o_rPixelFormat untouched, for an unknown payload.
-  bool PixelFormatForPayloadFormat( ZOL::EVideoPayload i_Payload, ZOL::EPixelFormat i_PixelFormat,
-                                    ZOL::EPixelFormat& o_rPixelFormat, bool i_bForceColour );
+  [[nodiscard]] bool PixelFormatForPayloadFormat( ZOL::EVideoPayload i_Payload, ZOL::EPixelFormat i_PixelFormat,
+                                                  ZOL::EPixelFormat& o_rPixelFormat, bool i_bForceColour );
 
   // Bytes of a decoded frame of that description, truncated to 32 bits as the decoders take it.
   std::uint32_t FrameBufferSize( const ZOL::IVideoFrameInfo& i_rVideoFrameInfo );

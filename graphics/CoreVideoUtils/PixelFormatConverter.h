@@ -21,9 +21,9 @@ namespace CoreVideoUtils
     explicit VPixelFormatConverter( std::shared_ptr< ZOL::IBufferAllocator > i_pAllocator = nullptr,
                                     std::shared_ptr< VColourCorrector > i_pColourCorrector = nullptr );
 
-    bool Convert( const ZOL::IVideoFrameInfo& i_rVideoFrameInfo, const std::uint8_t* i_pSource,
-                  std::uint64_t i_SourceSize, ZOL::EPixelFormat i_TargetFormat, std::uint8_t* o_pTarget,
-                  std::uint64_t i_TargetSize ) override;
+    [[nodiscard]] bool Convert( const ZOL::IVideoFrameInfo& i_rVideoFrameInfo, const std::uint8_t* i_pSource,
+                                std::uint64_t i_SourceSize, ZOL::EPixelFormat i_TargetFormat, std::uint8_t* o_pTarget,
+                                std::uint64_t i_TargetSize ) override;
     void SetVideoSettings( const ZOL::IVideoSettings& i_rVideoSettings ) override;
     void SetLensDistortionCalibration( const CoreLumekTypes::VCameraHardware& i_rCameraHardware,
                                        const CoreLumekTypes::VLensDistortionCalibration& i_rCalibration ) override;
@@ -51,18 +51,19 @@ namespace CoreVideoUtils
   };
 
   // One conversion with a converter of its own: default settings, offsets zero.
-  bool ConvertFrame( std::int32_t i_Width, std::int32_t i_Height, ZOL::EPixelFormat i_SourceFormat,
-                     const std::uint8_t* i_pSource, std::uint64_t i_SourceSize, ZOL::EPixelFormat i_TargetFormat,
-                     std::uint8_t* o_pTarget, std::uint64_t i_TargetSize );
+  [[nodiscard]] bool ConvertFrame( std::int32_t i_Width, std::int32_t i_Height, ZOL::EPixelFormat i_SourceFormat,
+                                   const std::uint8_t* i_pSource, std::uint64_t i_SourceSize,
+                                   ZOL::EPixelFormat i_TargetFormat, std::uint8_t* o_pTarget,
+                                   std::uint64_t i_TargetSize );
 
   // 4:2:0 planes, as a video decoder gives them, to packed 4:2:2 (U8Y8V8Y8 or Y8U8Y8V8): each
   // chroma row serves two rows, without interpolation. Width and height must be even. The
   // output holds width x height x 2 bytes.
-  bool PlanarYUV420ToInterleaved( const std::uint8_t* i_pY, const std::uint8_t* i_pU, const std::uint8_t* i_pV,
-                                  std::uint8_t* o_pOutput, ZOL::EPixelFormat i_Format, std::int32_t i_Width,
-                                  std::int32_t i_Height, std::int32_t i_StrideY, std::int32_t i_StrideUV );
+  [[nodiscard]] bool PlanarYUV420ToInterleaved( const std::uint8_t* i_pY, const std::uint8_t* i_pU,
+                                                const std::uint8_t* i_pV, std::uint8_t* o_pOutput,
+                                                ZOL::EPixelFormat i_Format, std::int32_t i_Width, std::int32_t i_Height,
+                                                std::int32_t i_StrideY, std::int32_t i_StrideUV );
 
   // Bytes of a frame of a format, in 64 bits; 0 for an unknown format or an empty size.
   std::uint64_t FrameSizeInBytes( std::int32_t i_Width, std::int32_t i_Height, ZOL::EPixelFormat i_Format );
-  bool IsBayerFormat( ZOL::EPixelFormat i_Format );
 } // namespace CoreVideoUtils

@@ -27,8 +27,10 @@ TEST( SteadyPlayback, NoFrameSizedAllocationAfterWarmUp )
 
   const int Frames = 400;
   LumekTest::VAllocationWatch Watch;
+  int Read = 0;
   for( int i = 0; i < Frames; ++i )
-    Source.GetFrame( static_cast< std::uint64_t >( i % 40 ), Frame );
+    Read += Source.GetFrame( static_cast< std::uint64_t >( i % 40 ), Frame ) ? 1 : 0;
+  EXPECT_EQ( Read, Frames );
 
   // Frame buffers and their control blocks are recycled: playback takes nothing from the heap.
   EXPECT_EQ( Watch.Calls(), 0u ) << "allocations over " << Frames << " frames, the largest " << Watch.Largest();

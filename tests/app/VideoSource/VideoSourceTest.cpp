@@ -2,6 +2,8 @@
 
 #include "app/VideoSource/VVideoSource.h"
 #include "app/VideoSource/VideoSourceTexts.h"
+#include "fileio/LumekVideo/VReader.h"
+#include "services/ILogCategorised.h"
 
 using LumekVideoViewer::VVideoSource;
 
@@ -167,4 +169,31 @@ TEST( VideoSource, FallbackWithoutGaps )
   EXPECT_EQ( Source.FindFrameAtOrBefore( 0 ), std::nullopt );
   EXPECT_EQ( Source.FindFrameAtOrBefore( 99 ), std::optional< std::uint64_t >( 2 ) ); // past the end: the last
   EXPECT_EQ( Source.FindFrameAtOrAfter( 0 ), std::optional< std::uint64_t >( 1 ) );
+}
+
+namespace
+{
+  // A recording whose reader names a payload no decoder knows.
+  class VUnknownPayloadReader : public LumekVideo::VReader
+  {
+  public:
+    ZOL::EVideoPayload GetVideoPayload() const override { return static_cast< ZOL::EVideoPayload >( 99 ); }
+  };
+} // namespace
+
+TEST( VideoSource, APayloadWithoutADecodedFormatGivesNoFrame )
+{
+  VSourceRecording Recording;
+  Recording.Frames = { 0 };
+  VVideoSource Source;
+  ASSERT_TRUE( Source.Open( Recording.Write(), std::make_shared< VUnknownPayloadReader >() ) );
+  std::vector< std::string > Lines;
+  const int Sink = ZOL::GlobalLog().AddSink(
+      [&]( const ZOL::ILogRecord& i_rRecord ) { Lines.push_back( i_rRecord.Message ); }, ZOL::LogFailure );
+  ZOL::IVideoFrame Frame;
+  EXPECT_FALSE( Source.GetFrame( 0, Frame ) );
+  ZOL::GlobalLog().RemoveSink( Sink );
+  EXPECT_FALSE( Frame.Video );
+  ASSERT_FALSE( Lines.empty() );
+  EXPECT_EQ( Lines.front(), "Unsupported video payload format 'Unspecified'." );
 }

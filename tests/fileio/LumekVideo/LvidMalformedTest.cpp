@@ -308,3 +308,55 @@ namespace
       }
   }
 } // namespace
+
+namespace
+{
+  // Fails the n-th seek from the moment it is told to.
+  class VSeekFailingStream : public UtilsIO::VMemoryInputStream
+  {
+  public:
+    using UtilsIO::VMemoryInputStream::VMemoryInputStream;
+    bool Seek( std::int64_t i_Position ) override
+    {
+      return ++m_Seeks != m_FailingSeek && UtilsIO::VMemoryInputStream::Seek( i_Position );
+    }
+    void FailSeek( int i_Number )
+    {
+      m_Seeks = 0;
+      m_FailingSeek = i_Number;
+    }
+
+  private:
+    int m_Seeks = 0;
+    int m_FailingSeek = 0;
+  };
+
+  // Audio alone skips the video by a seek; reading on after a failed one would take the video's
+  // bytes for the audio's count and samples.
+  TEST( LvidReader, AudioAloneFailsWhenTheSeekPastTheVideoFails )
+  {
+    // The video itself starts like an audio block, so that reading on from the wrong place
+    // would seem to work.
+    VRecordingPlan Plan = BasePlan();
+    Plan.Records[0].Video = { 4, 0, 0, 0, 0xA1, 0xA2, 0xA3, 0xA4, 9, 9, 9, 9, 9, 9, 9 };
+    const VBytes Bytes = Assemble( Plan ).Bytes;
+    for( const bool bFail : { false, true } )
+    {
+      auto pStream = std::make_shared< VSeekFailingStream >( Bytes.data(), Bytes.size() );
+      LumekVideo::VReader Reader;
+      ASSERT_TRUE( Reader.Open( pStream ) );
+      // The first seek goes to the frame, the second past its video.
+      pStream->FailSeek( bFail ? 2 : 0 );
+      std::shared_ptr< ZOL::IBuffer > pVideo;
+      ZOL::IAudioBuffers Audio;
+      const bool bRead = Reader.ReadFrameData( 0, pVideo, Audio, false, true );
+      EXPECT_EQ( bRead, !bFail );
+      if( bRead )
+      {
+        ASSERT_EQ( Audio.size(), 1u );
+        EXPECT_EQ( VBytes( Audio[0]->GetData(), Audio[0]->GetData() + Audio[0]->GetSize() ),
+                   *Plan.Records[0].Audio );
+      }
+    }
+  }
+} // namespace
