@@ -4,7 +4,7 @@
 set -euo pipefail
 
 packages=(
-  build-essential cmake ninja-build pkg-config clang libclang-rt-14-dev
+  build-essential cmake ninja-build pkg-config clang clang-format libclang-rt-14-dev
   qtbase5-dev qtbase5-dev-tools libqt5opengl5-dev qtmultimedia5-dev libqt5svg5-dev
   qtdeclarative5-dev qtquickcontrols2-5-dev qml-module-qtquick2 qml-module-qtquick-controls2
   qml-module-qtquick-window2 qml-module-qtquick-layouts libqt5multimedia5-plugins

@@ -6,6 +6,9 @@ set -euo pipefail
 cd "$(dirname "$0")/.."
 
 ./scripts/install-deps.sh
+# The shape of the code before its behaviour: formatting, and dependencies that point one way.
+./scripts/check-format.sh
+./scripts/check-layers.sh
 ./scripts/build.sh
 
 # Tests write nothing into the home folder, and settings start empty.

@@ -1,6 +1,6 @@
 #include "utils/Streams.h"
 
-#include "videointerface/IBuffer.h"
+#include "utils/UtilsMemory/Buffers.h"
 
 namespace ZOL
 {
