@@ -216,7 +216,11 @@ namespace
     // The first frames fill the recyclers; the steady state is what is counted, in order and
     // without the return to the start.
     for( std::uint64_t i = 0; i < 8; ++i )
-      Source.GetFrame( i, Frame );
+      if( !Source.GetFrame( i, Frame ) )
+      {
+        io_rState.SkipWithError( "decode failed" );
+        return;
+      }
     std::uint64_t Index = 8;
     const std::uint64_t HeapCallsBefore = LumekTest::HeapCalls();
     for( auto _ : io_rState )
