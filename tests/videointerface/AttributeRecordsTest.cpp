@@ -1,5 +1,6 @@
 #include "videointerface/AttributeRecords.h"
 
+#include "tests/support/TestNames.h"
 #include "utils/MemoryStream.h"
 
 #include <gtest/gtest.h>
@@ -30,11 +31,6 @@ namespace
     Info.PixelFormat = i_Format;
     Info.PixelAspectRatio = 1.0;
     return Info;
-  }
-
-  template < typename T > std::string Name( const testing::TestParamInfo< T >& i_rInfo )
-  {
-    return i_rInfo.param.Name;
   }
 } // namespace
 
@@ -83,7 +79,7 @@ std::vector< VFrameCase > FrameCases()
   return Cases;
 }
 
-INSTANTIATE_TEST_SUITE_P( Records, FrameInfoRoundTripTest, testing::ValuesIn( FrameCases() ), Name< VFrameCase > );
+INSTANTIATE_TEST_SUITE_P( Records, FrameInfoRoundTripTest, testing::ValuesIn( FrameCases() ), LumekTest::VCaseName() );
 
 TEST( FrameInfo, NoVideoWritesOnlyPresentFalseAndReadsBackAsDefault )
 {
@@ -167,7 +163,7 @@ INSTANTIATE_TEST_SUITE_P(
                                   []( IVideoAttributes& s ) { s.Set( "VideoFrameInfo.ImageX", std::int32_t( 3 ) ); },
                                   false, 0 },
                      VOffsetCase{ "NeitherPresent", []( IVideoAttributes& ) {}, false, 0 } ),
-    Name< VOffsetCase > );
+    LumekTest::VCaseName() );
 
 class FrameRequiredKeyTest : public testing::TestWithParam< std::string >
 {
@@ -304,7 +300,7 @@ INSTANTIATE_TEST_SUITE_P(
                 s.Remove( std::string( "ConversionRecord.0." ) + pKey );
             },
             false } ),
-    Name< VDistortionCase > );
+    LumekTest::VCaseName() );
 
 // ---------------------------------------------------------------------------------------------
 // Audio, timing, settings, timecode.
@@ -448,11 +444,12 @@ class TimecodeKeyTest : public testing::TestWithParam< int >
 {
 };
 
+const char* const s_TimecodeKeys[] = { "Timecode.Standards", "Timecode.Hours",         "Timecode.Minutes",
+                                       "Timecode.Seconds",   "Timecode.Frames",        "Timecode.UserBits",
+                                       "Timecode.Days",      "Timecode.TickRemainder", "Timecode.SubFramePeriod" };
+
 TEST_P( TimecodeKeyTest, FirstMissingKeyStopsAndLeavesTheLaterFields )
 {
-  static const char* const s_Keys[] = { "Timecode.Standards", "Timecode.Hours",         "Timecode.Minutes",
-                                        "Timecode.Seconds",   "Timecode.Frames",        "Timecode.UserBits",
-                                        "Timecode.Days",      "Timecode.TickRemainder", "Timecode.SubFramePeriod" };
   ITimecode Written;
   Written.Standards = 2;
   Written.Hours = 1;
@@ -465,7 +462,7 @@ TEST_P( TimecodeKeyTest, FirstMissingKeyStopsAndLeavesTheLaterFields )
   Written.SubFramePeriod = 8;
   IVideoAttributes Store;
   WriteTimecode( Store, Written );
-  ASSERT_TRUE( Store.Remove( s_Keys[GetParam()] ) );
+  ASSERT_TRUE( Store.Remove( s_TimecodeKeys[GetParam()] ) );
 
   ITimecode Sentinel;
   Sentinel.Standards = 100;
@@ -486,10 +483,12 @@ TEST_P( TimecodeKeyTest, FirstMissingKeyStopsAndLeavesTheLaterFields )
                                        Read.SubFramePeriod };
   for( int i = 0; i < 9; ++i )
     EXPECT_EQ( i < GetParam() ? ( i == 0 ? 2u : static_cast< std::uint64_t >( i ) ) : 100u, ReadFields[i] )
-        << s_Keys[i];
+        << s_TimecodeKeys[i];
 }
 
-INSTANTIATE_TEST_SUITE_P( Keys, TimecodeKeyTest, testing::Range( 0, 9 ) );
+INSTANTIATE_TEST_SUITE_P( Keys, TimecodeKeyTest, testing::Range( 0, 9 ),
+                          []( const testing::TestParamInfo< int >& i_rInfo )
+                          { return LumekTest::TextCaseName( s_TimecodeKeys[i_rInfo.param] ); } );
 
 // ---------------------------------------------------------------------------------------------
 // Lens, camera and conversion records.
@@ -536,7 +535,7 @@ INSTANTIATE_TEST_SUITE_P(
                                 false, Lens( RadialModel_Lumek0Parameter, {}, 1, 2 ) },
                      VLensCase{ "BadModelReadsWithoutParameters", Lens( RadialModel_BadRadialModel, {}, 3, 4 ), false,
                                 Lens( RadialModel_BadRadialModel, {}, 3, 4 ) } ),
-    Name< VLensCase > );
+    LumekTest::VCaseName() );
 
 TEST( LensDistortion, ModelTextAndCentreAreRequired )
 {
@@ -583,11 +582,12 @@ class CameraChainTest : public testing::TestWithParam< int >
 {
 };
 
+const char* const s_Chain[] = { "CameraHardware.DeviceURN",           "CameraHardware.DisplayType",
+                                "CameraHardware.PixelAspectRatio",    "CameraHardware.SensorHeightInPixels",
+                                "CameraHardware.SensorWidthInPixels", "CameraHardware.Type" };
+
 TEST_P( CameraChainTest, FirstAbsentKeyStopsTheChainButSerialIsReadAnyway )
 {
-  static const char* const s_Chain[] = { "CameraHardware.DeviceURN",           "CameraHardware.DisplayType",
-                                         "CameraHardware.PixelAspectRatio",    "CameraHardware.SensorHeightInPixels",
-                                         "CameraHardware.SensorWidthInPixels", "CameraHardware.Type" };
   VCameraHardware Camera;
   Camera.DeviceURN = "urn";
   Camera.DisplayType = "display";
@@ -612,7 +612,9 @@ TEST_P( CameraChainTest, FirstAbsentKeyStopsTheChainButSerialIsReadAnyway )
     EXPECT_EQ( i < GetParam(), bRead[i] ) << s_Chain[i];
 }
 
-INSTANTIATE_TEST_SUITE_P( Keys, CameraChainTest, testing::Range( 0, 6 ) );
+INSTANTIATE_TEST_SUITE_P( Keys, CameraChainTest, testing::Range( 0, 6 ),
+                          []( const testing::TestParamInfo< int >& i_rInfo )
+                          { return LumekTest::TextCaseName( s_Chain[i_rInfo.param] ); } );
 
 TEST( CameraHardware, SerialNumberIsNotRequired )
 {
@@ -676,10 +678,4 @@ TEST( ConversionRecords, GapEndsTheListAndUnknownTextsKeepDefaults )
   ReadConversionRecords( Store, Read );
   ASSERT_EQ( 1u, Read.size() );
   EXPECT_EQ( VideoContainer_LVID, Read[0].Container );
-}
-
-TEST( ConversionRecords, PrefixNumbersFromZero )
-{
-  EXPECT_EQ( "ConversionRecord.0.", ConversionRecordPrefix( 0 ) );
-  EXPECT_EQ( "ConversionRecord.12.", ConversionRecordPrefix( 12 ) );
 }

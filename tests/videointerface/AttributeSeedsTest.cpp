@@ -2,6 +2,7 @@
 // files beside the fuzzer, and this test holds them to the writer: a change of the binary form
 // shows here as a changed golden file. Run with LUMEK_UPDATE_SEEDS=1 to write them afresh.
 
+#include "tests/support/TestNames.h"
 #include "utils/MemoryStream.h"
 #include "videointerface/AttributeRecords.h"
 
@@ -127,5 +128,4 @@ INSTANTIATE_TEST_SUITE_P( Seeds, AttributeSeedTest,
                           testing::Values( VSeedCase{ "recording", &RecordingStore },
                                            VSeedCase{ "history", &HistoryStore },
                                            VSeedCase{ "everytype", &EveryTypeStore } ),
-                          []( const testing::TestParamInfo< VSeedCase >& i_rInfo )
-                          { return std::string( i_rInfo.param.Name ); } );
+                          LumekTest::VCaseName() );

@@ -1,6 +1,7 @@
 #include "videointerface/IVideoAttributes.h"
 
 #include "tests/support/AllocationWatch.h"
+#include "tests/support/TestNames.h"
 #include "utils/MemoryStream.h"
 
 #include <gtest/gtest.h>
@@ -396,7 +397,7 @@ INSTANTIATE_TEST_SUITE_P(
         VValueTextCase{ "DoubleScientific", []( IVideoAttributes& s ) { s.Set( "K", 1e300 ); }, "1e+300" },
         VValueTextCase{ "StringUnchanged", []( IVideoAttributes& s ) { s.Set( "K", " Bayer GB8 " ); },
                         " Bayer GB8 " } ),
-    []( const testing::TestParamInfo< VValueTextCase >& i_rInfo ) { return std::string( i_rInfo.param.Name ); } );
+    LumekTest::VCaseName() );
 
 TEST( AttributeText, AbsentKeyGivesNoText )
 {
@@ -454,7 +455,7 @@ INSTANTIATE_TEST_SUITE_P(
         VParseCase{ "FloatEmptyKeepsOld", []( IVideoAttributes& s ) { s.Set( "K", 1.5f ); }, "", false, "1.5" },
         VParseCase{ "StringTakesAnything", []( IVideoAttributes& s ) { s.Set( "K", "a" ); }, "12 monkeys", true,
                     "12 monkeys" } ),
-    []( const testing::TestParamInfo< VParseCase >& i_rInfo ) { return std::string( i_rInfo.param.Name ); } );
+    LumekTest::VCaseName() );
 
 TEST( AttributeText, ChangingACopyLeavesTheOriginal )
 {
@@ -520,7 +521,7 @@ INSTANTIATE_TEST_SUITE_P(
         VEqualityCase{ "StringsWithEmbeddedZero", []( IVideoAttributes& s ) { s.Set( "K", std::string( "a\0b", 3 ) ); },
                        []( IVideoAttributes& s ) { s.Set( "K", std::string( "a\0c", 3 ) ); }, false },
         VEqualityCase{ "EmptyStores", []( IVideoAttributes& ) {}, []( IVideoAttributes& ) {}, true } ),
-    []( const testing::TestParamInfo< VEqualityCase >& i_rInfo ) { return std::string( i_rInfo.param.Name ); } );
+    LumekTest::VCaseName() );
 
 TEST( AttributeStore, ContainsAllOfIsOneSided )
 {
@@ -533,18 +534,4 @@ TEST( AttributeStore, ContainsAllOfIsOneSided )
   Small.Set( "B", "y" );
   EXPECT_FALSE( Big.ContainsAllOf( Small ) );
   EXPECT_TRUE( Big.ContainsAllOf( IVideoAttributes() ) );
-}
-
-TEST( AttributeStore, SetReplacesTypeAndRemoveReportsPresence )
-{
-  IVideoAttributes Store;
-  Store.Set( "K", 1 );
-  Store.Set( "K", "text" );
-  std::uint32_t Type = 0;
-  ASSERT_TRUE( Store.GetType( "K", Type ) );
-  EXPECT_EQ( ZOL::ValueType_String, Type );
-  EXPECT_EQ( 1u, Store.Size() );
-  EXPECT_TRUE( Store.Remove( "K" ) );
-  EXPECT_FALSE( Store.Remove( "K" ) );
-  EXPECT_FALSE( Store.GetType( "K", Type ) );
 }

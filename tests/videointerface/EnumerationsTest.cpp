@@ -2,6 +2,8 @@
 #include "videointerface/IVideoFrameInfo.h"
 #include "videointerface/IVideoReader.h"
 
+#include "tests/support/TestNames.h"
+
 #include <gtest/gtest.h>
 
 #include <cctype>
@@ -18,11 +20,6 @@ namespace
     const char* TableName;
     std::size_t Rows;
   };
-
-  std::string TableCaseName( const testing::TestParamInfo< VTableCase >& i_rInfo )
-  {
-    return i_rInfo.param.Name;
-  }
 } // namespace
 
 class EnumTableTest : public testing::TestWithParam< VTableCase >
@@ -88,7 +85,7 @@ INSTANTIATE_TEST_SUITE_P(
                      VTableCase{ "InterlacedFormat", &InterlacedFormatTable, "InterlacedFormat.Enum", 5 },
                      VTableCase{ "VideoContainer", &VideoContainerTable, "VideoContainer.Enum", 6 },
                      VTableCase{ "RadialModel", &RadialModelTable, "LensDistortionCalibration.ERadialModel", 4 } ),
-    TableCaseName );
+    LumekTest::VCaseName() );
 
 TEST( Enumerations, SampleFormatNumbersAreOutOfStepWithTheRows )
 {
@@ -116,30 +113,13 @@ TEST( Enumerations, FailedLookupLeavesTheValue )
   EXPECT_EQ( VideoContainer_MKV, Container );
 }
 
-TEST( Enumerations, TypedTextsAndFallbacks )
+TEST( Enumerations, TypedLookupsFallBackOutsideTheTable )
 {
-  EXPECT_STREQ( "BayerGB8", ToString( PixelFormat_BayerGB8 ) );
   EXPECT_STREQ( "Unspecified", ToString( static_cast< EPixelFormat >( 20 ) ) );
   EXPECT_FALSE( ToStringOptional( static_cast< EPixelFormat >( 20 ) ) );
   EXPECT_EQ( std::string( "Unspecified" ), ToStringOptional( PixelFormat_Unspecified ) );
   EXPECT_STREQ( "?", ToString( static_cast< EVideoPayload >( 6 ), "?" ) );
-  EXPECT_STREQ( "LosslessFLAC", ToString( AudioPayload_LosslessFLAC ) );
-  EXPECT_STREQ( "Lumek0Parameter", ToString( RadialModel_Lumek0Parameter ) );
-  EXPECT_STREQ( "Video compressed as H.264.", VideoPayloadTable().ToDescription( VideoPayload_VideoH264 ) );
-  EXPECT_STREQ( "32-bit unsigned integer sample (0 to 4294967296).",
-                AudioSampleFormatTable().ToDescription( AudioSampleFormat_UInt32 ) );
-}
-
-TEST( Enumerations, ContainerExtensionsAndModelSizes )
-{
-  const char* const Expected[] = { "mov", "mp4", "avi", "lvid", "mkv", "lumekimagesequence" };
-  for( std::uint32_t i = 0; i < 6; ++i )
-    EXPECT_STREQ( Expected[i], ContainerExtension( static_cast< EVideoContainer >( i ) ) );
   EXPECT_STREQ( "", ContainerExtension( static_cast< EVideoContainer >( 6 ) ) );
-  EXPECT_STREQ( "lumekimagesequence", ImageSequenceExtension );
-  EXPECT_EQ( 2, RadialModelParameterCount( RadialModel_Lumek2Parameter ) );
-  EXPECT_EQ( 3, RadialModelParameterCount( RadialModel_Lumek3Parameter ) );
-  EXPECT_EQ( 0, RadialModelParameterCount( RadialModel_Lumek0Parameter ) );
   EXPECT_EQ( -1, RadialModelParameterCount( RadialModel_BadRadialModel ) );
 }
 
@@ -175,7 +155,7 @@ INSTANTIATE_TEST_SUITE_P(
                      VResultCase{ "IpAddressChanged", 0x40003u, "IP address has changed" },
                      VResultCase{ "BundleAlreadyInstalled", 0x80040007u, "Bundle already installed" },
                      VResultCase{ "TopBitAlone", 0x7FFFFFFFu, "Unknown result code" } ),
-    []( const testing::TestParamInfo< VResultCase >& i_rInfo ) { return std::string( i_rInfo.param.Name ); } );
+    LumekTest::VCaseName() );
 
 // ---------------------------------------------------------------------------------------------
 // What the enumerations drive: frame sizes and the container chosen by a file name.
@@ -218,7 +198,7 @@ INSTANTIATE_TEST_SUITE_P(
                      VFrameSizeCase{ "UnknownFormat", static_cast< EPixelFormat >( 20 ), 100, 100, 0 },
                      VFrameSizeCase{ "NegativeWidth", PixelFormat_Luminance8, -2, 100, 0 },
                      VFrameSizeCase{ "Beyond32Bits", PixelFormat_R8G8B8u8, 65536, 65536, 1ull << 34 } ),
-    []( const testing::TestParamInfo< VFrameSizeCase >& i_rInfo ) { return std::string( i_rInfo.param.Name ); } );
+    LumekTest::VCaseName() );
 
 struct VContainerCase
 {
@@ -250,4 +230,4 @@ INSTANTIATE_TEST_SUITE_P(
                      VContainerCase{ "FrameNumberPlaceholder", "img_%FRAME_NUMBER%.jpg", VideoContainer_IMAGES },
                      VContainerCase{ "OtherExtension", "clip.mka", std::nullopt },
                      VContainerCase{ "LastExtensionCounts", "clip.lvid.bak", std::nullopt } ),
-    []( const testing::TestParamInfo< VContainerCase >& i_rInfo ) { return std::string( i_rInfo.param.Name ); } );
+    LumekTest::VCaseName() );

@@ -1,5 +1,6 @@
 #include "videointerface/ITimecode.h"
 
+#include "tests/support/TestNames.h"
 #include "videointerface/IVideoFrameInfo.h"
 
 #include <gtest/gtest.h>
@@ -189,8 +190,7 @@ INSTANTIATE_TEST_SUITE_P( Records, TimecodeValidTest,
                                            VValidCase{ "LastTick", Label( 1, 23, 59, 59, 23, 5630624 ), true },
                                            VValidCase{ "NoStandard", Label( 0xFFFFFFFFu, 0, 0, 0, 0 ), false },
                                            VValidCase{ "StandardSix", Label( 6, 0, 0, 0, 0 ), false } ),
-                          []( const testing::TestParamInfo< VValidCase >& i_rInfo )
-                          { return std::string( i_rInfo.param.Name ); } );
+                          LumekTest::VCaseName() );
 
 struct VTextCase
 {
@@ -246,7 +246,7 @@ INSTANTIATE_TEST_SUITE_P(
                    "00:00:00:00 (2)" },
         VTextCase{ "UnknownStyle", Label( 3, 0, 0, 0, 0, 2250000 ), 9, true, false, "00:00:00:00 [30 fps]" },
         VTextCase{ "InvalidIsEmpty", Label( 5, 0, 1, 0, 0 ), 4, true, false, "" } ),
-    []( const testing::TestParamInfo< VTextCase >& i_rInfo ) { return std::string( i_rInfo.param.Name ); } );
+    LumekTest::VCaseName() );
 
 TEST( TimecodeText, StandardTexts )
 {
@@ -320,7 +320,7 @@ INSTANTIATE_TEST_SUITE_P(
                         { 30, 1, 0 },
                         0xFFFFFFFFFFFFFFFFull,
                         "09:02:00:14+00 [30 fps]" } ),
-    []( const testing::TestParamInfo< VFrameTextCase >& i_rInfo ) { return std::string( i_rInfo.param.Name ); } );
+    LumekTest::VCaseName() );
 
 TEST( FrameTimecode, LargeIndicesStayConsistentWithStepping )
 {
