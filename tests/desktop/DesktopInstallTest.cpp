@@ -149,6 +149,12 @@ struct VValidator
   std::string Command; // run with the installed tree's share folder as $SHARE
 };
 
+// Test names and failure messages show the case's name, not its bytes.
+void PrintTo( const VValidator& i_rValidator, std::ostream* o_pOut )
+{
+  *o_pOut << i_rValidator.Name;
+}
+
 class InstalledFileValidator : public InstalledTree, public ::testing::WithParamInterface< VValidator >
 {
 };
@@ -189,6 +195,11 @@ struct VFileTypeCase
   bool bRecording; // a real recording, or a few bytes of text
   const char* Expected;
 };
+
+void PrintTo( const VFileTypeCase& i_rCase, std::ostream* o_pOut )
+{
+  *o_pOut << i_rCase.Name;
+}
 
 class InstalledFileType : public InstalledTree, public ::testing::WithParamInterface< VFileTypeCase >
 {

@@ -39,6 +39,12 @@ namespace
       { "StartingWithMissingFrames", ZOL::PixelFormat_R8G8B8, 48, 32, { 3, 4, 5 }, false, 16, 16, 11 },
   };
 
+  // Test names and failure messages show the case's name, not its bytes.
+  void PrintTo( const VThumbnailCase& i_rCase, std::ostream* o_pOut )
+  {
+    *o_pOut << i_rCase.Name;
+  }
+
   QImage LoadPNG( const std::string& i_rPath )
   {
     return QImage( QString::fromStdString( i_rPath ), "PNG" ).convertToFormat( QImage::Format_RGB888 );
@@ -149,6 +155,11 @@ namespace
     const char* Extension;
     std::vector< std::string > Codec;
   };
+
+  void PrintTo( const VContainerCase& i_rCase, std::ostream* o_pOut )
+  {
+    *o_pOut << i_rCase.Name;
+  }
 
   class ThumbnailOfContainer : public ::testing::TestWithParam< VContainerCase >
   {
