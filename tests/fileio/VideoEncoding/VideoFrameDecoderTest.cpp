@@ -1,6 +1,7 @@
 #include "fileio/VideoEncoding/VideoFrameDecoder.h"
 
-#include "services/Log.h"
+#include "tests/support/LogCapture.h"
+#include "tests/support/TestNames.h"
 #include "videointerface/BufferAllocators.h"
 
 #include <gtest/gtest.h>
@@ -13,28 +14,6 @@ namespace
 {
   using namespace ZOL;
   using VideoEncoding::VideoFrameDecoder;
-
-  class VLogCapture
-  {
-  public:
-    explicit VLogCapture( std::string i_Category ) : m_Category( std::move( i_Category ) )
-    {
-      m_Handle = GlobalLog().AddSink(
-          [this]( const ILogRecord& i_rRecord )
-          {
-            if( i_rRecord.Category == m_Category )
-              m_Lines.push_back( std::to_string( i_rRecord.Level ) + " " + i_rRecord.Message );
-          },
-          LogDetail );
-    }
-    ~VLogCapture() { GlobalLog().RemoveSink( m_Handle ); }
-    const std::vector< std::string >& Lines() const { return m_Lines; }
-
-  private:
-    std::string m_Category;
-    std::vector< std::string > m_Lines;
-    int m_Handle = 0;
-  };
 
   IVideoFrameInfo Info( std::int32_t i_Width, std::int32_t i_Height, EPixelFormat i_Format )
   {
@@ -97,14 +76,14 @@ namespace
     };
     for( const VCase& rCase : Cases )
     {
-      VLogCapture Log( "VideoEncoding" );
+      LumekTest::VLogCapture Log( "VideoEncoding" );
       auto pBuffer = Payload( std::vector< std::uint8_t >( rCase.Bytes ) );
       IVideoFrameInfo FrameInfo = rCase.FrameInfo;
       EXPECT_FALSE( Decode( VideoPayload_Uncompressed, FrameInfo, pBuffer ) ) << rCase.Bytes;
       EXPECT_EQ( Log.Lines().size(), 1u );
     }
     auto pBuffer = Payload( std::vector< std::uint8_t >( 35 ) );
-    VLogCapture Log( "VideoEncoding" );
+    LumekTest::VLogCapture Log( "VideoEncoding" );
     IVideoFrameInfo FrameInfo = Info( 4, 3, PixelFormat_R8G8B8 );
     Decode( VideoPayload_Uncompressed, FrameInfo, pBuffer );
     EXPECT_EQ( Log.Lines(),
@@ -122,7 +101,7 @@ namespace
 
   TEST_F( FrameDecoder, H264WithoutDecoderLogsEveryFrameAndKeepsTheBuffer )
   {
-    VLogCapture Log( "VideoEncoding" );
+    LumekTest::VLogCapture Log( "VideoEncoding" );
     auto pBuffer = Payload( { 0, 0, 0, 1, 0x65 } );
     IBuffer* pBefore = pBuffer.get();
     IVideoFrameInfo FrameInfo = Info( 16, 16, PixelFormat_U8Y8V8Y8 );
@@ -212,7 +191,7 @@ namespace
   TEST_P( StillImages, AreMissingFramesWithTheirSignatureChecked )
   {
     const VStillImage& rCase = GetParam();
-    VLogCapture Log( "VideoEncoding" );
+    LumekTest::VLogCapture Log( "VideoEncoding" );
     auto pBuffer = Payload( rCase.Bytes );
     IVideoFrameInfo FrameInfo = Info( 8, 8, PixelFormat_R8G8B8 );
     EXPECT_FALSE( Decode( rCase.Payload, FrameInfo, pBuffer ) );
@@ -242,6 +221,5 @@ namespace
       { "PayloadOutOfRange", static_cast< EVideoPayload >( 6 ), { 1, 2, 3 }, nullptr },
   };
 
-  INSTANTIATE_TEST_SUITE_P( Payloads, StillImages, ::testing::ValuesIn( s_StillImages ),
-                            []( const auto& i_rInfo ) { return std::string( i_rInfo.param.Name ); } );
+  INSTANTIATE_TEST_SUITE_P( Payloads, StillImages, ::testing::ValuesIn( s_StillImages ), LumekTest::VCaseName() );
 } // namespace
