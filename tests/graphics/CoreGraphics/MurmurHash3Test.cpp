@@ -1,4 +1,5 @@
 #include "graphics/CoreGraphics/MurmurHash3.h"
+#include "tests/support/TestNames.h"
 
 #include <gtest/gtest.h>
 
@@ -38,8 +39,7 @@ namespace
     EXPECT_EQ( CoreGraphics::MurmurHash3_32( rCase.Text, rCase.Seed ), rCase.Expected );
   }
 
-  INSTANTIATE_TEST_SUITE_P( Reference, MurmurHash3Test, ::testing::ValuesIn( HashCases ),
-                            []( const ::testing::TestParamInfo< VHashCase >& i_rInfo ) { return i_rInfo.param.Name; } );
+  INSTANTIATE_TEST_SUITE_P( Reference, MurmurHash3Test, ::testing::ValuesIn( HashCases ), LumekTest::VCaseName() );
 
   TEST( MurmurHash3, ReadsBlocksWithoutAlignment )
   {

@@ -4,8 +4,9 @@
 #include "graphics/CoreGraphics/VRenderContext.h"
 #include "graphics/CoreGraphics/VResources.h"
 #include "graphics/CoreGraphics/VShaderProgram.h"
-#include "services/Log.h"
 #include "tests/graphics/CoreGraphics/DisplayTestMain.h"
+#include "tests/support/LogCapture.h"
+#include "tests/support/TestNames.h"
 
 #include <QDir>
 #include <QFile>
@@ -28,34 +29,6 @@ namespace
   using CoreGraphics::VShader;
   using CoreGraphics::VShaderProgram;
 
-  // Collects what the "CoreGraphics" category logs while it lives.
-  class VLogCapture
-  {
-  public:
-    VLogCapture()
-    {
-      m_Handle = ZOL::GlobalLog().AddSink(
-          [this]( const ZOL::ILogRecord& i_rRecord )
-          {
-            if( i_rRecord.Category == "CoreGraphics" )
-              Messages.push_back( i_rRecord.Message );
-          },
-          ZOL::LogDetail );
-    }
-    ~VLogCapture() { ZOL::GlobalLog().RemoveSink( m_Handle ); }
-    bool Contains( const std::string& i_rText ) const
-    {
-      for( const std::string& rMessage : Messages )
-        if( rMessage.find( i_rText ) != std::string::npos )
-          return true;
-      return false;
-    }
-    std::vector< std::string > Messages;
-
-  private:
-    int m_Handle = 0;
-  };
-
   class ShaderResourcesTest : public ::testing::Test
   {
   protected:
@@ -77,24 +50,18 @@ namespace
     QOpenGLContext m_Context;
   };
 
-  const char* const VertexStages[] = { "ColoredLine",
-                                       "Simple",
-                                       "Simple3D",
-                                       "Simple3DModel",
-                                       "Simple3DModelColour",
-                                       "Simple3DModelWireframe",
-                                       "Simple3DPointSize",
-                                       "Simple3DUniformColour",
-                                       "Simple3DVertexColour",
-                                       "SimpleColour",
-                                       "Video" };
+  // clang-format off
+  const char* const VertexStages[] = { "ColoredLine", "Simple", "Simple3D", "Simple3DModel", "Simple3DModelColour",
+                                       "Simple3DModelWireframe", "Simple3DPointSize", "Simple3DUniformColour",
+                                       "Simple3DVertexColour", "SimpleColour", "Video" };
+  // clang-format on
   const char* const FragmentStages[] = { "Colour",         "ImageSet",      "SimpleLighting",
                                          "StippledLine",   "UniformColour", "VideoBayer",
                                          "VideoLuminance", "VideoRaw",      "VideoYUV" };
 
   TEST_F( ShaderResourcesTest, EveryStageOfTheResourcesCompiles )
   {
-    VLogCapture Log;
+    LumekTest::VLogCapture Log( "CoreGraphics" );
     VResources Resources( false, QDir::currentPath() );
     Resources.Load();
 
@@ -181,7 +148,7 @@ namespace
       File.write( "void main() { gl_FragColor = undeclared; }\n" );
     }
 
-    VLogCapture Log;
+    LumekTest::VLogCapture Log( "CoreGraphics" );
     VResources Resources( false, QDir::currentPath() );
     Resources.Load();
     Resources.AddShaderFile( "Broken", BrokenPath, VShader::Kind_Fragment );
@@ -236,7 +203,7 @@ namespace
     ASSERT_TRUE( DebugContext.makeCurrent( &m_Surface ) );
 
     {
-      VLogCapture Log;
+      LumekTest::VLogCapture Log( "CoreGraphics" );
       CoreGraphics::VRenderContext Context;
       Context.Initialise();
       EXPECT_TRUE( Log.Contains( "Debug OpenGL context requested" ) );
@@ -419,6 +386,5 @@ namespace
                                                VBlendCase{ "AdditiveAlpha", 2, 1.0f, 0.7f, 0.65f, 0.6f },
                                                VBlendCase{ "ConstantAlphaAdditive", 3, 0.25f, 0.45f, 0.525f, 0.6f },
                                                VBlendCase{ "Premultiplied", 4, 1.0f, 1.1f, 0.7f, 0.3f } ),
-                            []( const ::testing::TestParamInfo< VBlendCase >& i_rInfo )
-                            { return i_rInfo.param.Name; } );
+                            LumekTest::VCaseName() );
 } // namespace
