@@ -1,5 +1,6 @@
 #include "ConversionTestSupport.h"
 #include "graphics/CoreVideoUtils/DisplayConversion.h"
+#include "tests/support/TestNames.h"
 
 #include <gtest/gtest.h>
 
@@ -84,8 +85,7 @@ namespace
       { "GammaAloneOnFourBytePixels", 1.0f, 0.5f, PixelFormat_B8G8R8u8, { 16, 32, 255, 9 }, { 1, 4, 254, 9 } },
   };
 
-  INSTANTIATE_TEST_SUITE_P( Rules, Corrections, ::testing::ValuesIn( s_Corrections ),
-                            []( const auto& i_rInfo ) { return std::string( i_rInfo.param.Name ); } );
+  INSTANTIATE_TEST_SUITE_P( Rules, Corrections, ::testing::ValuesIn( s_Corrections ), LumekTest::VCaseName() );
 
   TEST( ColourCorrector, OnlyTheRGBFamilyIsCorrected )
   {

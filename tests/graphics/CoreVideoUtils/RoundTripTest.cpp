@@ -3,6 +3,7 @@
 
 #include "ConversionTestSupport.h"
 #include "graphics/CoreVideoUtils/PixelKernels.h"
+#include "tests/support/TestNames.h"
 
 #include <gtest/gtest.h>
 
@@ -39,14 +40,12 @@ namespace
       { "BayerGB8_via_BayerGB6", PixelFormat_BayerGB8, PixelFormat_BayerGB6, { 0xFC }, 1 },
   };
 
-  class RoundTrips : public ::testing::TestWithParam< std::tuple< VRoundTrip, std::pair< int, int > > >
+  class RoundTrips : public ::testing::TestWithParam< VRoundTrip >
   {
   };
 
-  TEST_P( RoundTrips, LoseOnlyTheNarrowFormatsBits )
+  void CheckRoundTrip( const VRoundTrip& Trip, int W, int H )
   {
-    const auto& [Trip, Size] = GetParam();
-    const auto [W, H] = Size;
     const Bytes Source = RandomBytes( CoreVideoUtils::FrameSizeInBytes( W, H, Trip.From ), W * 7 + H );
     const Bytes Via = MustConvert( Source, W, H, Trip.From, Trip.Via );
     ASSERT_FALSE( Via.empty() );
@@ -58,21 +57,19 @@ namespace
     EXPECT_EQ( Back, Expected );
   }
 
-  std::string RoundTripName( const ::testing::TestParamInfo< RoundTrips::ParamType >& i_rInfo )
+  TEST_P( RoundTrips, LoseOnlyTheNarrowFormatsBits )
   {
-    const auto& [Trip, Size] = i_rInfo.param;
-    return std::string( Trip.Name ) + "_" + std::to_string( Size.first ) + "x" + std::to_string( Size.second );
+    // Widths around the 48-pixel rows of the 10-bit format and an odd run longer than the
+    // converter's 4608-pixel runs.
+    for( const auto& [W, H] : { std::make_pair( 2, 1 ), std::make_pair( 47, 2 ), std::make_pair( 48, 3 ),
+                                std::make_pair( 98, 2 ), std::make_pair( 4610, 2 ), std::make_pair( 7, 5 ) } )
+    {
+      SCOPED_TRACE( std::to_string( W ) + "x" + std::to_string( H ) );
+      CheckRoundTrip( GetParam(), W, H );
+    }
   }
 
-  INSTANTIATE_TEST_SUITE_P( Pairs, RoundTrips,
-                            ::testing::Combine( ::testing::ValuesIn( s_RoundTrips ),
-                                                // Widths around the 48-pixel rows of the 10-bit format and an odd run
-                                                // longer than the converter's 4608-pixel runs.
-                                                ::testing::Values( std::make_pair( 2, 1 ), std::make_pair( 47, 2 ),
-                                                                   std::make_pair( 48, 3 ), std::make_pair( 98, 2 ),
-                                                                   std::make_pair( 4610, 2 ),
-                                                                   std::make_pair( 7, 5 ) ) ),
-                            RoundTripName );
+  INSTANTIATE_TEST_SUITE_P( Pairs, RoundTrips, ::testing::ValuesIn( s_RoundTrips ), LumekTest::VCaseName() );
 
   // Samples read one bit at a time, most significant first: the second method for the packed forms.
   std::uint8_t SampleByBits( const Bytes& i_rStream, unsigned i_Bits, std::uint64_t i_Index )
@@ -86,14 +83,12 @@ namespace
     return static_cast< std::uint8_t >( Value << ( 8 - i_Bits ) );
   }
 
-  class PackedSamples : public ::testing::TestWithParam< std::tuple< unsigned, int, int > >
+  class PackedSamples : public ::testing::TestWithParam< unsigned >
   {
   };
 
-  // Any start and length, including ones that begin and end inside a byte.
-  TEST_P( PackedSamples, UnpackMatchesBitByBitAndPackLeavesOtherBitsAlone )
+  void CheckPackedRun( unsigned Bits, int First, int Count )
   {
-    const auto [Bits, First, Count] = GetParam();
     const std::uint64_t StreamBytes = ( ( First + Count ) * Bits + 7 ) / 8;
     const Bytes Stream = RandomBytes( StreamBytes, Bits * 1000 + First + Count );
     Bytes Unpacked( Count );
@@ -118,7 +113,18 @@ namespace
       ASSERT_EQ( SampleByBits( Packed, Bits, First + i ), Values[i] & ( 0xFF << ( 8 - Bits ) ) ) << "sample " << i;
   }
 
-  INSTANTIATE_TEST_SUITE_P( Runs, PackedSamples,
-                            ::testing::Combine( ::testing::Values( 6u, 7u ), ::testing::Values( 0, 1, 5, 8, 13 ),
-                                                ::testing::Values( 1, 7, 8, 9, 31, 32, 33, 100, 1001 ) ) );
+  // Any start and length, including ones that begin and end inside a byte.
+  TEST_P( PackedSamples, UnpackMatchesBitByBitAndPackLeavesOtherBitsAlone )
+  {
+    for( int First : { 0, 1, 5, 8, 13 } )
+      for( int Count : { 1, 7, 8, 9, 31, 32, 33, 100, 1001 } )
+      {
+        SCOPED_TRACE( "first " + std::to_string( First ) + ", count " + std::to_string( Count ) );
+        CheckPackedRun( GetParam(), First, Count );
+      }
+  }
+
+  INSTANTIATE_TEST_SUITE_P( Runs, PackedSamples, ::testing::Values( 6u, 7u ),
+                            []( const ::testing::TestParamInfo< unsigned >& i_rInfo )
+                            { return std::to_string( i_rInfo.param ) + "Bits"; } );
 } // namespace
