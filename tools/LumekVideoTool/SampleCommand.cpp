@@ -1,3 +1,4 @@
+#include "tools/LumekVideoTool/MkvSample.h"
 #include "tools/LumekVideoTool/SampleScene.h"
 #include "tools/LumekVideoTool/ToolCommon.h"
 
@@ -39,7 +40,12 @@ namespace LumekVideoTool
     }
 
     std::string Error;
-    if( !WriteSampleRecording( ( *Variables )["output"].as< std::string >(), Sample, Error ) )
+    const std::string Output = ( *Variables )["output"].as< std::string >();
+    // Matroska holds no Bayer frames: its sample is YUV 4:2:2 unless a format was asked for.
+    if( IsMkvPath( Output ) && ( *Variables )["format"].defaulted() )
+      Sample.Format = ZOL::PixelFormat_U8Y8V8Y8;
+    if( IsMkvPath( Output ) ? !WriteSampleMkv( Output, Sample, Error )
+                            : !WriteSampleRecording( Output, Sample, Error ) )
     {
       o_rErr << "lumekvideotool make-sample: " << Error << std::endl;
       return Exit_CannotOpen;
