@@ -128,8 +128,8 @@ namespace RapidAVI
       m_AudioFrameInfo = StoredAudioFrameInfo;
 
     // Missing keys keep what strh gave.
-    ZOL::ReadVideoTiming( m_Attributes, m_Timing );
-    if( m_Timing == ZOL::IVideoTiming() && m_FrameRate > 0.0 )
+    const bool bStoredTiming = ZOL::ReadVideoTiming( m_Attributes, m_Timing );
+    if( !bStoredTiming && m_Timing == ZOL::IVideoTiming() && m_FrameRate > 0.0 )
     {
       // Only the main header spoke of the rate.
       const double Period = std::floor( ZOL::DefaultTicksPerSecond / m_FrameRate );
@@ -137,14 +137,18 @@ namespace RapidAVI
         m_Timing.FramePeriodInTicks = static_cast< std::uint32_t >( Period );
     }
 
-    // AVI has no timecode of its own: without the keys the standard stays unset.
+    // AVI has no timecode of its own: without the keys the standard stays unset. A store cut
+    // short keeps the fields read before the first missing key.
     ZOL::ITimecode StoredTimecode;
-    ZOL::ReadTimecode( m_Attributes, StoredTimecode );
-    StoredTimecode.TickRemainder = ScaleTimecodeTicks( StoredTimecode.TickRemainder );
-    StoredTimecode.SubFramePeriod = ScaleTimecodeTicks( StoredTimecode.SubFramePeriod );
+    if( ZOL::ReadTimecode( m_Attributes, StoredTimecode ) || StoredTimecode.Standards != ZOL::ITimecode().Standards )
+    {
+      StoredTimecode.TickRemainder = ScaleTimecodeTicks( StoredTimecode.TickRemainder );
+      StoredTimecode.SubFramePeriod = ScaleTimecodeTicks( StoredTimecode.SubFramePeriod );
+    }
     m_Timecode = StoredTimecode;
 
-    ZOL::ReadVideoSettings( m_Attributes, "", m_Settings );
+    if( !ZOL::ReadVideoSettings( m_Attributes, "", m_Settings ) )
+      LUMEK_LOG( "RapidAVI", ZOL::LogDetail, "AVI file stores no complete display settings; defaults fill the gaps." );
   }
 
   bool VRapidAVIReader::ReadFrameData( std::uint64_t i_FrameIndex, std::shared_ptr< ZOL::IBuffer >& o_rVideo,

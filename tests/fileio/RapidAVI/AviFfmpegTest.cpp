@@ -137,7 +137,7 @@ namespace
         "uyvy422",
         2,
         false,
-        1.0 },
+        2.5 },
   };
 
   class AviFfmpegVideo : public ::testing::TestWithParam< VVideoCase >
@@ -150,8 +150,8 @@ TEST_P( AviFfmpegVideo, MatchesFfprobeAndFfmpegDecode )
   const VVideoCase& rCase = GetParam();
   if( !LumekTest::HaveFfmpeg() )
     GTEST_SKIP() << "no ffmpeg";
-  const std::string Path =
-      LumekTest::FfmpegFixture( std::string( rCase.Name ) + ".avi", Concat( VideoInput(), rCase.Encode ) );
+  const std::string Path = LumekTest::FfmpegFixture(
+      std::string( rCase.Name ) + ".avi", Concat( VideoInput(), Concat( rCase.Encode, { "-frames:v", "5" } ) ) );
   ASSERT_FALSE( Path.empty() );
   auto pReader = OpenFile( Path );
   ASSERT_TRUE( pReader );
