@@ -262,6 +262,8 @@ namespace
           HeapAfterWarmUp = LiveHeap();
       }
     const std::size_t HeapAtEnd = LiveHeap();
+    RecordProperty( "HeapAfterWarmUp", static_cast< int >( HeapAfterWarmUp ) );
+    RecordProperty( "HeapAfterTwoPasses", static_cast< int >( HeapAtEnd ) );
     // The first read of a frame drops what opening kept of its blocks, so the heap may shrink.
     EXPECT_LT( static_cast< double >( HeapAtEnd ), static_cast< double >( HeapAfterWarmUp ) + 16 * 1024 )
         << "after warm-up " << HeapAfterWarmUp << ", at end " << HeapAtEnd;
