@@ -97,9 +97,8 @@ namespace ImageSequenceIO
     m_bOneFileExists = false;
   }
 
-  bool VImageSequenceReader::Open( const std::string& i_rFileName )
+  bool VImageSequenceReader::OpenReader( const std::string& i_rFileName )
   {
-    Reset();
     const fs::path Path( i_rFileName );
     const std::string Folder = Path.has_parent_path() ? Path.parent_path().string() : std::string( "." );
     const std::string Name = Path.filename().string();
@@ -117,10 +116,13 @@ namespace ImageSequenceIO
 
   bool VImageSequenceReader::Open( const std::string& i_rFolder, ZOL::IInputStream& i_rDescriptor )
   {
-    Reset();
-    // A damaged descriptor keeps what it gave before the damage; the pattern decides.
-    ReadDescriptor( i_rDescriptor, m_FrameKeys, m_Attributes );
-    return ApplyDescriptor( i_rFolder );
+    return OpenWith(
+        [&]
+        {
+          // A damaged descriptor keeps what it gave before the damage; the pattern decides.
+          ReadDescriptor( i_rDescriptor, m_FrameKeys, m_Attributes );
+          return ApplyDescriptor( i_rFolder );
+        } );
   }
 
   bool VImageSequenceReader::OpenDescriptorFile( const std::string& i_rFolder, const std::string& i_rFileName )

@@ -9,6 +9,7 @@
 #include "fileio/ImageSequenceIO/SequenceNames.h"
 #include "fileio/ImageSequenceIO/VReaderCapabilities.h"
 #include "videointerface/IVideoReader.h"
+#include "videointerface/VideoReaderBase.h"
 
 #include <cstdint>
 #include <memory>
@@ -22,7 +23,7 @@ namespace ImageSequenceIO
   // number in the file name of frame 0.
   extern const char* const FirstFileNumberKey; // "ImageSequenceInfo.FirstFileNumber"
 
-  class VImageSequenceReader : public ZOL::IVideoReader, public ZOL::IFrameIndexQueries
+  class VImageSequenceReader : public ZOL::VVideoReaderBase, public ZOL::IFrameIndexQueries
   {
   public:
     VImageSequenceReader();
@@ -32,10 +33,10 @@ namespace ImageSequenceIO
     const ZOL::IVideoReaderCapabilities& GetCapabilities() const override { return m_Capabilities; }
     // A descriptor, a pattern holding placeholders, a path without extension, or one image
     // file of a numbered run.
-    bool Open( const std::string& i_rFileName ) override;
+    using ZOL::VVideoReaderBase::Open;
     // A descriptor given as a stream, for files in i_rFolder. This is how descriptors in memory
     // are read.
-    bool Open( const std::string& i_rFolder, ZOL::IInputStream& i_rDescriptor );
+    [[nodiscard]] bool Open( const std::string& i_rFolder, ZOL::IInputStream& i_rDescriptor );
     const ZOL::IVideoAttributes& GetAttributes() const override { return m_Attributes; }
     const ZOL::IVideoTiming& GetVideoTiming() const override { return m_Timing; }
     const ZOL::ITimecode& GetTimecode() const override { return m_Timecode; }
@@ -65,8 +66,11 @@ namespace ImageSequenceIO
     // The descriptor the sequence was opened through; empty for a numbered run without one.
     const std::string& GetDescriptorPath() const { return m_DescriptorPath; }
 
+  protected:
+    bool OpenReader( const std::string& i_rFileName ) override;
+    void Reset() override;
+
   private:
-    void Reset();
     bool OpenDescriptorFile( const std::string& i_rFolder, const std::string& i_rFileName );
     bool ApplyDescriptor( const std::string& i_rFolder );
     bool OpenNumberedImage( const std::string& i_rFolder, const std::string& i_rFileName );

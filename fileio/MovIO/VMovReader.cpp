@@ -51,24 +51,20 @@ namespace MovIO
     m_CachedAudioChunk = NoIndex;
   }
 
-  bool VMovReader::Open( const std::string& i_rFileName )
+  bool VMovReader::OpenReader( const std::string& i_rFileName )
   {
-    Reset();
     m_pReader = std::make_shared< VMovPrimitiveReader >( i_rFileName );
-    if( OpenInternal() )
-      return true;
-    Reset();
-    return false;
+    return OpenInternal();
   }
 
   bool VMovReader::Open( const std::shared_ptr< ZOL::IInputStreamSeekable >& i_pStream )
   {
-    Reset();
-    m_pReader = std::make_shared< VMovPrimitiveReader >( i_pStream );
-    if( OpenInternal() )
-      return true;
-    Reset();
-    return false;
+    return OpenWith(
+        [&]
+        {
+          m_pReader = std::make_shared< VMovPrimitiveReader >( i_pStream );
+          return OpenInternal();
+        } );
   }
 
   bool VMovReader::OpenInternal()

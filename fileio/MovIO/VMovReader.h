@@ -10,6 +10,7 @@
 #include "fileio/MovIO/VMovPrimitiveReader.h"
 #include "fileio/MovIO/VReaderCapabilities.h"
 #include "videointerface/IVideoReader.h"
+#include "videointerface/VideoReaderBase.h"
 
 #include <cstdint>
 #include <memory>
@@ -25,7 +26,7 @@ namespace MovIO
     TrackKind_Timecode,
   };
 
-  class VMovReader : public ZOL::IVideoReader, public ZOL::IFrameIndexQueries
+  class VMovReader : public ZOL::VVideoReaderBase, public ZOL::IFrameIndexQueries
   {
   public:
     VMovReader();
@@ -34,9 +35,9 @@ namespace MovIO
     VMovReader& operator=( const VMovReader& ) = delete;
 
     const ZOL::IVideoReaderCapabilities& GetCapabilities() const override { return m_Capabilities; }
-    bool Open( const std::string& i_rFileName ) override;
+    using ZOL::VVideoReaderBase::Open;
     // Reads a file that is already open (one held in memory), from its position 0.
-    bool Open( const std::shared_ptr< ZOL::IInputStreamSeekable >& i_pStream );
+    [[nodiscard]] bool Open( const std::shared_ptr< ZOL::IInputStreamSeekable >& i_pStream );
     bool DumpFileStructure( std::ostream& o_rStream ) override;
     bool SetBufferAllocators( const std::shared_ptr< ZOL::IBufferAllocator >& i_pVideo,
                               const std::shared_ptr< ZOL::IBufferAllocator >& i_pAudio,
@@ -66,6 +67,10 @@ namespace MovIO
     const std::vector< VMovFrame >& GetFrameTable() const { return m_Frames; }
     const VMovTrack& GetTrack( ETrackKind i_Kind ) const { return TrackOf( i_Kind ); }
 
+  protected:
+    bool OpenReader( const std::string& i_rFileName ) override;
+    void Reset() override;
+
   private:
     struct VTimecodeDescription
     {
@@ -82,8 +87,7 @@ namespace MovIO
       const VMovAtom* pTimecode = nullptr;
     };
 
-    void Reset();
-    bool OpenInternal();
+    [[nodiscard]] bool OpenInternal();
     [[nodiscard]] bool SelectTracks( const VMovAtom& i_rMoov, VTraks& o_rTraks );
     [[nodiscard]] bool ReadVideoTrack( const VMovAtom& i_rTrak );
     [[nodiscard]] bool ReadAudioTrack( const VMovAtom& i_rTrak );
@@ -131,8 +135,6 @@ namespace MovIO
 
     VReaderCapabilities m_Capabilities;
     std::shared_ptr< VMovPrimitiveReader > m_pReader;
-    // Set only by the stream form of Open; the file form opens its own.
-    std::shared_ptr< ZOL::IInputStreamSeekable > m_pSourceStream;
     ZOL::EAudioPayload m_AudioPayload = ZOL::AudioPayload_None;
     ZOL::EVideoPayload m_VideoPayload = ZOL::VideoPayload_None;
     ZOL::IAudioFrameInfo m_AudioFrameInfo;
