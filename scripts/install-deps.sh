@@ -14,7 +14,7 @@ packages=(
   librapidxml-dev
   libgtest-dev libgmock-dev libbenchmark-dev
   xvfb xauth libgl1-mesa-dri libglx-mesa0 mesa-utils
-  ffmpeg python3 imagemagick
+  ffmpeg python3 imagemagick gcovr
   desktop-file-utils appstream libxml2-utils shared-mime-info xdg-utils dpkg-dev libglib2.0-bin man-db
 )
 
