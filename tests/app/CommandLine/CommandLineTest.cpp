@@ -1,4 +1,5 @@
 #include "app/CommandLine/CommandLine.h"
+#include "tests/support/TestNames.h"
 
 #include <gtest/gtest.h>
 
@@ -75,6 +76,7 @@ TEST( CommandLine, EmptyServerIsAccepted )
 
 struct VBadCommandLine
 {
+  const char* Name;
   std::vector< std::string > Arguments;
   std::string Reason;
 };
@@ -92,13 +94,18 @@ TEST_P( CommandLineErrors, TwoLinesAndExitCode255 )
 
 INSTANTIATE_TEST_SUITE_P(
     Cases, CommandLineErrors,
-    testing::Values(
-        VBadCommandLine{ { "--help" }, "unrecognised option '--help'" },
-        VBadCommandLine{ { "--bogus" }, "unrecognised option '--bogus'" },
-        VBadCommandLine{ { "a.lvid", "b.lvid" }, "option '--input-file' cannot be specified more than once" },
-        VBadCommandLine{ { "--version-server" }, "the required argument for option '--version-server' is missing" },
-        VBadCommandLine{ { "--version-server=a", "--version-server=b" },
-                         "option '--version-server' cannot be specified more than once" } ) );
+    testing::Values( VBadCommandLine{ "HelpIsNotAnOption", { "--help" }, "unrecognised option '--help'" },
+                     VBadCommandLine{ "UnknownOption", { "--bogus" }, "unrecognised option '--bogus'" },
+                     VBadCommandLine{ "TwoFiles",
+                                      { "a.lvid", "b.lvid" },
+                                      "option '--input-file' cannot be specified more than once" },
+                     VBadCommandLine{ "ServerWithoutAddress",
+                                      { "--version-server" },
+                                      "the required argument for option '--version-server' is missing" },
+                     VBadCommandLine{ "TwoServers",
+                                      { "--version-server=a", "--version-server=b" },
+                                      "option '--version-server' cannot be specified more than once" } ),
+    LumekTest::VCaseName() );
 
 TEST( CommandLine, TheProgramItselfAnswersOnStandardError )
 {

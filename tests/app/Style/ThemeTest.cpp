@@ -2,6 +2,7 @@
 #include "services/Theme/IApplicationStyling.h"
 #include "services/Theme/StyleSheetText.h"
 #include "services/Theme/ThemeStart.h"
+#include "tests/support/TestNames.h"
 
 #include <QApplication>
 #include <QQmlComponent>
@@ -68,6 +69,7 @@ namespace
 
   struct VPaletteCase
   {
+    const char* Name;
     QPalette::ColorGroup Group;
     QPalette::ColorRole Role;
     const char* Expected;
@@ -85,14 +87,16 @@ namespace
     EXPECT_EQ( QApplication::palette().color( rCase.Group, rCase.Role ).name(), rCase.Expected );
   }
 
-  INSTANTIATE_TEST_SUITE_P( Theme, Palette,
-                            testing::Values( VPaletteCase{ QPalette::Active, QPalette::Window, "#303030" },
-                                             VPaletteCase{ QPalette::Inactive, QPalette::Highlight, "#c89810" },
-                                             VPaletteCase{ QPalette::Inactive, QPalette::BrightText, "#e76500" },
-                                             VPaletteCase{ QPalette::Disabled, QPalette::WindowText, "#999999" },
-                                             VPaletteCase{ QPalette::Disabled, QPalette::Button, "#3d3d3d" },
-                                             VPaletteCase{ QPalette::Disabled, QPalette::Highlight, "#2e78fc" },
-                                             VPaletteCase{ QPalette::Disabled, QPalette::Text, "#ffffff" } ) );
+  INSTANTIATE_TEST_SUITE_P(
+      Theme, Palette,
+      testing::Values( VPaletteCase{ "ActiveWindow", QPalette::Active, QPalette::Window, "#303030" },
+                       VPaletteCase{ "InactiveHighlight", QPalette::Inactive, QPalette::Highlight, "#c89810" },
+                       VPaletteCase{ "InactiveBrightText", QPalette::Inactive, QPalette::BrightText, "#e76500" },
+                       VPaletteCase{ "DisabledWindowText", QPalette::Disabled, QPalette::WindowText, "#999999" },
+                       VPaletteCase{ "DisabledButton", QPalette::Disabled, QPalette::Button, "#3d3d3d" },
+                       VPaletteCase{ "DisabledHighlight", QPalette::Disabled, QPalette::Highlight, "#2e78fc" },
+                       VPaletteCase{ "DisabledText", QPalette::Disabled, QPalette::Text, "#ffffff" } ),
+      LumekTest::VCaseName() );
 
   TEST( Palette, RolesWithoutAValueKeepTheDefault )
   {

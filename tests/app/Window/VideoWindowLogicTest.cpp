@@ -3,6 +3,7 @@
 #include "app/Window/VideoWindowLogic.h"
 
 #include "services/IApplicationVersion.h"
+#include "tests/support/TestNames.h"
 #include "videointerface/BufferAllocators.h"
 #include "videointerface/IBuffer.h"
 
@@ -125,7 +126,7 @@ INSTANTIATE_TEST_SUITE_P( GappyFile, FrameChoice,
                                            VChoiceCase{ "AfterLastPresent", 7, false, 5, true },
                                            VChoiceCase{ "PastTheEndWhilePlaying", 11, true, 5, false },
                                            VChoiceCase{ "Negative", -1, false, -1, false } ),
-                          []( const testing::TestParamInfo< VChoiceCase >& i_rInfo ) { return i_rInfo.param.Name; } );
+                          LumekTest::VCaseName() );
 
 TEST( FrameChoiceEdges, NothingBeforeAMissingFirstFrame )
 {
