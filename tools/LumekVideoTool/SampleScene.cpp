@@ -150,6 +150,58 @@ namespace LumekVideoTool
     return Bytes;
   }
 
+  ZOL::IVideoTiming SampleTiming( double i_FramesPerSecond )
+  {
+    ZOL::IVideoTiming Timing;
+    Timing.FramePeriodInTicks =
+        static_cast< std::uint32_t >( std::lround( Timing.TicksPerSecond / i_FramesPerSecond ) );
+    return Timing;
+  }
+
+  ZOL::ITimecode SampleTimecode()
+  {
+    ZOL::ITimecode Timecode;
+    Timecode.Standards = ZOL::TimecodeStandard_25;
+    Timecode.Hours = 10;
+    return Timecode;
+  }
+
+  bool IsSampleFrameLeftOut( int i_Frame, int i_Frames )
+  {
+    const int FirstMissing = i_Frames >= 4 ? i_Frames / 2 : -10;
+    return i_Frame == FirstMissing || i_Frame == FirstMissing + 1;
+  }
+
+  ZOL::IVideoAttributes SampleAttributes( const VSampleOptions& i_rOptions )
+  {
+    ZOL::IVideoAttributes Attributes;
+    ZOL::WriteVideoTiming( Attributes, SampleTiming( i_rOptions.FramesPerSecond ) );
+    ZOL::WriteVideoSettings( Attributes, "", ZOL::IVideoSettings() );
+
+    ZOL::WriteTimecode( Attributes, SampleTimecode() );
+
+    CoreLumekTypes::VCameraHardware Camera;
+    Camera.DeviceURN = "urn:lumek:camera:demo-0001";
+    Camera.SerialNumber = "LV-DEMO-0001";
+    Camera.Type = "Demo";
+    Camera.DisplayType = "Lumek Demo Camera";
+    Camera.SensorWidthInPixels = static_cast< std::uint32_t >( i_rOptions.Width );
+    Camera.SensorHeightInPixels = static_cast< std::uint32_t >( i_rOptions.Height );
+    ZOL::WriteCameraHardware( Attributes, Camera );
+
+    // A mild barrel distortion about the sensor's centre: a few pixels at the corners.
+    CoreLumekTypes::VLensDistortionCalibration Lens;
+    Lens.RadialModel = ZOL::RadialModel_Lumek3Parameter;
+    const double HalfDiagonalSquared =
+        ( i_rOptions.Width * i_rOptions.Width + i_rOptions.Height * i_rOptions.Height ) / 4.0;
+    Lens.RadialDistortionParameters = { -0.02 / HalfDiagonalSquared, 0.0, 0.0 };
+    Lens.RadialDistortionCentre_X = i_rOptions.Width / 2.0;
+    Lens.RadialDistortionCentre_Y = i_rOptions.Height / 2.0;
+    ZOL::WriteLensDistortionCalibration( Attributes, "", Lens );
+    Attributes.Set( "Recording.Description", "LumekVideoViewer demonstration recording" );
+    return Attributes;
+  }
+
   bool WriteSampleRecording( const std::string& i_rPath, const VSampleOptions& i_rOptions, std::string& o_rError )
   {
     if( i_rOptions.Width <= 0 || i_rOptions.Height <= 0 || i_rOptions.Frames <= 0 ||
@@ -174,37 +226,7 @@ namespace LumekVideoTool
       Audio.Channels = 2;
     }
 
-    ZOL::IVideoAttributes Attributes;
-    ZOL::IVideoTiming Timing;
-    Timing.FramePeriodInTicks =
-        static_cast< std::uint32_t >( std::lround( Timing.TicksPerSecond / i_rOptions.FramesPerSecond ) );
-    ZOL::WriteVideoTiming( Attributes, Timing );
-    ZOL::WriteVideoSettings( Attributes, "", ZOL::IVideoSettings() );
-
-    ZOL::ITimecode Timecode;
-    Timecode.Standards = ZOL::TimecodeStandard_25;
-    Timecode.Hours = 10;
-    ZOL::WriteTimecode( Attributes, Timecode );
-
-    CoreLumekTypes::VCameraHardware Camera;
-    Camera.DeviceURN = "urn:lumek:camera:demo-0001";
-    Camera.SerialNumber = "LV-DEMO-0001";
-    Camera.Type = "Demo";
-    Camera.DisplayType = "Lumek Demo Camera";
-    Camera.SensorWidthInPixels = static_cast< std::uint32_t >( i_rOptions.Width );
-    Camera.SensorHeightInPixels = static_cast< std::uint32_t >( i_rOptions.Height );
-    ZOL::WriteCameraHardware( Attributes, Camera );
-
-    // A mild barrel distortion about the sensor's centre: a few pixels at the corners.
-    CoreLumekTypes::VLensDistortionCalibration Lens;
-    Lens.RadialModel = ZOL::RadialModel_Lumek3Parameter;
-    const double HalfDiagonalSquared =
-        ( i_rOptions.Width * i_rOptions.Width + i_rOptions.Height * i_rOptions.Height ) / 4.0;
-    Lens.RadialDistortionParameters = { -0.02 / HalfDiagonalSquared, 0.0, 0.0 };
-    Lens.RadialDistortionCentre_X = i_rOptions.Width / 2.0;
-    Lens.RadialDistortionCentre_Y = i_rOptions.Height / 2.0;
-    ZOL::WriteLensDistortionCalibration( Attributes, "", Lens );
-    Attributes.Set( "Recording.Description", "LumekVideoViewer demonstration recording" );
+    const ZOL::IVideoAttributes Attributes = SampleAttributes( i_rOptions );
 
     LumekVideo::VWriter Writer;
     if( !Writer.Create( i_rPath, Video, Audio, Attributes ) )
@@ -213,12 +235,10 @@ namespace LumekVideoTool
       return false;
     }
 
-    // Two frames in the middle are left out of the index, as a capture that lost them would be.
-    const int FirstMissing = i_rOptions.Frames >= 4 ? i_rOptions.Frames / 2 : -10;
     VRGBImage Image( i_rOptions.Width, i_rOptions.Height );
     for( int Frame = 0; Frame < i_rOptions.Frames; ++Frame )
     {
-      if( Frame == FirstMissing || Frame == FirstMissing + 1 )
+      if( IsSampleFrameLeftOut( Frame, i_rOptions.Frames ) )
         continue;
       RenderSampleScene( Frame, i_rOptions.FramesPerSecond, Image );
       const std::vector< std::uint8_t > Bytes = EncodeFrame( Image, i_rOptions.Format );

@@ -1,6 +1,9 @@
 #pragma once
 
 #include "tools/LumekVideoTool/FrameEncoding.h"
+#include "videointerface/ITimecode.h"
+#include "videointerface/IVideoAttributes.h"
+#include "videointerface/IVideoFrameInfo.h"
 
 #include <cstdint>
 #include <string>
@@ -25,7 +28,20 @@ namespace LumekVideoTool
     double FramesPerSecond = 100.0;
     ZOL::EPixelFormat Format = ZOL::PixelFormat_BayerGB8;
     bool bAudio = true;
+    // How the frames of an image sequence are stored: PNG or JPEG.
+    ZOL::EVideoPayload ImagePayload = ZOL::VideoPayload_ImagePNG;
   };
+
+  // The frame period of the rate in ticks of the default clock.
+  ZOL::IVideoTiming SampleTiming( double i_FramesPerSecond );
+  // The start timecode of every sample: 10:00:00:00 at 25 frames a second.
+  ZOL::ITimecode SampleTimecode();
+  // What a sample recording says about itself: timing, settings, the start timecode, camera
+  // hardware, a lens calibration and a description.
+  ZOL::IVideoAttributes SampleAttributes( const VSampleOptions& i_rOptions );
+  // Whether frame i_Frame of i_Frames is one of the two in the middle that a sample leaves out,
+  // as a capture that lost them would.
+  bool IsSampleFrameLeftOut( int i_Frame, int i_Frames );
 
   // Writes a whole demonstration recording: timing, a start timecode, camera hardware, a lens
   // calibration, the tone, and two frames in the middle left out of the index so that missing

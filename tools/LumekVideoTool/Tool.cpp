@@ -26,10 +26,14 @@ namespace LumekVideoTool
         { "bench", "FILE [--frames N] [--software] [--compact | --pretty]",
           "reads and decodes frames as playback does; speed as JSON", &RunBench },
         { "make-sample",
-          "OUTPUT.lvid [--width W] [--height H] [--frames N] [--fps F] [--format NAME]\n"
-          "[--audio | --no-audio]",
+          "OUTPUT.lvid|.mkv|.lumekimagesequence [--width W] [--height H]\n"
+          "[--frames N] [--fps F] [--format NAME] [--audio | --no-audio]\n"
+          "[--frame-format png|jpeg]",
           "writes a synthetic recording (default BayerGB8 1280x720,\n"
-          "300 frames at 100 fps, with a stereo test tone)",
+          "300 frames at 100 fps, with a stereo test tone); the name\n"
+          "picks the container: .mkv holds U8Y8V8Y8 by default, and\n"
+          ".lumekimagesequence a descriptor with one PNG (or JPEG)\n"
+          "picture a frame beside it, without sound",
           &RunMakeSample },
         { "thumbnail", "INPUT OUTPUT.png [--size N]",
           "a PNG preview for file managers: the first frame that reads, as\n"
