@@ -90,8 +90,8 @@ namespace LumekVideoTest
   VBytes SerialiseStore( const ZOL::IVideoAttributes& i_rStore )
   {
     UtilsIO::VMemoryStream Stream;
-    i_rStore.WriteTo( Stream );
-    return Stream.GetData();
+    // No bytes at all when the store cannot be written: every block built from them fails to read.
+    return i_rStore.WriteTo( Stream ) ? Stream.GetData() : VBytes();
   }
 
   VBytes DescriptionBlock( const ZOL::IVideoFrameInfo& i_rVideo, const ZOL::IAudioFrameInfo& i_rAudio )
