@@ -1,5 +1,6 @@
 // The dialog that shows a server's message: its parts, its links and its button.
 
+#include "tests/support/TestNames.h"
 #include "versioncheck/VersionCheck/VVersionCheckMessageBox.h"
 
 #include <gtest/gtest.h>
@@ -70,7 +71,7 @@ namespace
                             testing::Values( IBoxCase{ "Message", false, false },
                                              IBoxCase{ "WithCheckBox", true, false },
                                              IBoxCase{ "Error", false, true } ),
-                            []( const testing::TestParamInfo< IBoxCase >& i_rInfo ) { return i_rInfo.param.Name; } );
+                            LumekTest::VCaseName() );
 
   TEST( MessageBoxLinks, OpenInTheSystemBrowserAndTheDialogStays )
   {

@@ -4,6 +4,8 @@
 
 #include "versioncheck/VersionReply/VersionReply.h"
 #include "services/ILogCategorised.h"
+#include "tests/support/LogCapture.h"
+#include "tests/support/TestNames.h"
 #include "versioncheck/VersionReply/DefaultServer.h"
 #include "versioncheck/VersionReply/HtmlReply.h"
 #include "versioncheck/VersionReply/SystemText.h"
@@ -38,6 +40,7 @@ namespace
                           std::move( i_Product ), std::move( i_Whitelist ) };
   }
 
+  // clang-format off
   const IReplyCase ReplyCases[] = {
       { "OptionalMessageInPage",
         "<html><body><p>Version 1.11 is out.</p>\n<!--\n{ \"CheckVersion\": \"1.0\", \"MessageType\": \"OPTIONAL\","
@@ -54,33 +57,19 @@ namespace
         Reply( "", "NONE", "", "", { "x", "y" } ), "" },
       { "FirstCommentOnly", "<!--{\"Id\":\"first\"}--><!--{\"Id\":\"second\"}-->", true,
         Reply( "", "NONE", "first", "" ), "" },
-      { "NoComment",
-        "<html><body>Nothing to see</body></html>",
-        false,
-        {},
+      { "NoComment", "<html><body>Nothing to see</body></html>", false, {},
         "Error parsing JSON data: expected value on line 1" },
       { "UnclosedComment", "<!--{\"Id\":\"x\"}", false, {}, "Error parsing JSON data: expected value on line 1" },
-      { "CommentEndBeforeStart",
-        "-->{\"Id\":\"x\"}<!--",
-        false,
-        {},
+      { "CommentEndBeforeStart", "-->{\"Id\":\"x\"}<!--", false, {},
         "Error parsing JSON data: expected value on line 1" },
-      { "TrailingCommaOnLineThree",
-        "<!--{\n\"CheckVersion\": \"1.0\",\n}-->",
-        false,
-        {},
+      { "TrailingCommaOnLineThree", "<!--{\n\"CheckVersion\": \"1.0\",\n}-->", false, {},
         "Error parsing JSON data: expected key string on line 3" },
-      { "GarbageAfterDocument",
-        "<!--{\"Id\":\"x\"} and more-->",
-        false,
-        {},
+      { "GarbageAfterDocument", "<!--{\"Id\":\"x\"} and more-->", false, {},
         "Error parsing JSON data: garbage after data on line 1" },
-      { "NestedTooDeep",
-        "<!--" + std::string( 100000, '[' ) + "-->",
-        false,
-        {},
+      { "NestedTooDeep", "<!--" + std::string( 100000, '[' ) + "-->", false, {},
         "Error parsing JSON data: nesting too deep on line 1" },
   };
+  // clang-format on
 
   class VersionReplyParse : public testing::TestWithParam< IReplyCase >
   {
@@ -104,8 +93,7 @@ namespace
     EXPECT_EQ( Result.Whitelist, rCase.Expected.Whitelist );
   }
 
-  INSTANTIATE_TEST_SUITE_P( Golden, VersionReplyParse, testing::ValuesIn( ReplyCases ),
-                            []( const testing::TestParamInfo< IReplyCase >& i_rInfo ) { return i_rInfo.param.Name; } );
+  INSTANTIATE_TEST_SUITE_P( Golden, VersionReplyParse, testing::ValuesIn( ReplyCases ), LumekTest::VCaseName() );
 
   TEST( VersionReplyParse, DepthAtTheLimitStillParses )
   {
@@ -117,28 +105,6 @@ namespace
     ASSERT_TRUE( VersionCheck::ParseVersionReply( "<!--" + Json + "-->", Result, Error ) ) << Error;
     EXPECT_EQ( Result.Id, "deep" );
   }
-
-  // Collects what the page reading writes to the log.
-  class VLogCapture
-  {
-  public:
-    VLogCapture()
-        : m_Handle( ZOL::GlobalLog().AddSink(
-              [this]( const ZOL::ILogRecord& i_rRecord )
-              {
-                if( i_rRecord.Category == "CheckVersion" )
-                  m_Records.push_back( i_rRecord );
-              },
-              ZOL::LogDetail ) )
-    {
-    }
-    ~VLogCapture() { ZOL::GlobalLog().RemoveSink( m_Handle ); }
-    const std::vector< ZOL::ILogRecord >& Records() const { return m_Records; }
-
-  private:
-    std::vector< ZOL::ILogRecord > m_Records;
-    int m_Handle;
-  };
 
   struct IHtmlLevelCase
   {
@@ -152,14 +118,14 @@ namespace
 
   TEST_P( HtmlReply, LogsBodyTextAtTheTypesLevel )
   {
-    VLogCapture Capture;
+    LumekTest::VLogCapture Capture( "CheckVersion" );
     ASSERT_TRUE( VersionCheck::ReadHtmlReply(
         "<HTML><HEAD><TITLE>t</TITLE></HEAD><BODY><P>New release</P><P>Please update &amp; restart</P></BODY></HTML>",
         GetParam().MessageType ) );
-    ASSERT_EQ( Capture.Records().size(), 2u );
-    EXPECT_EQ( Capture.Records()[0].Message, "New release" );
-    EXPECT_EQ( Capture.Records()[1].Message, "Please update & restart" );
-    for( const auto& rRecord : Capture.Records() )
+    ASSERT_EQ( Capture.Records.size(), 2u );
+    EXPECT_EQ( Capture.Records[0].Message, "New release" );
+    EXPECT_EQ( Capture.Records[1].Message, "Please update & restart" );
+    for( const auto& rRecord : Capture.Records )
       EXPECT_EQ( rRecord.Level, GetParam().Level );
   }
 
@@ -187,11 +153,11 @@ namespace
 
   TEST_P( HtmlReplyFailure, LogsOneFailureLine )
   {
-    VLogCapture Capture;
+    LumekTest::VLogCapture Capture( "CheckVersion" );
     EXPECT_FALSE( VersionCheck::ReadHtmlReply( GetParam().Body, "NONE" ) );
-    ASSERT_EQ( Capture.Records().size(), 1u );
-    EXPECT_EQ( Capture.Records()[0].Message, "Could not parse VersionCheck reply." );
-    EXPECT_EQ( Capture.Records()[0].Level, ZOL::LogFailure );
+    ASSERT_EQ( Capture.Records.size(), 1u );
+    EXPECT_EQ( Capture.Records[0].Message, "Could not parse VersionCheck reply." );
+    EXPECT_EQ( Capture.Records[0].Level, ZOL::LogFailure );
   }
 
   INSTANTIATE_TEST_SUITE_P( Cases, HtmlReplyFailure,
@@ -208,8 +174,7 @@ namespace
                                                                Text += "<a>";
                                                              return Text;
                                                            }() } ),
-                            []( const testing::TestParamInfo< IBadPageCase >& i_rInfo )
-                            { return i_rInfo.param.Name; } );
+                            LumekTest::VCaseName() );
 
   struct ISystemCase
   {
@@ -246,7 +211,7 @@ namespace
           ISystemCase{ "NameWhenNoPrettyName", "ID=debian\nNAME=\"Debian GNU/Linux\"\n", "Debian+GNU/Linux+64Bit" },
           ISystemCase{ "PrefixIsNotKey", "XPRETTY_NAME=no\nNAME=yes\n", "yes+64Bit" },
           ISystemCase{ "Nothing", "", "Linux+64Bit" } ),
-      []( const testing::TestParamInfo< ISystemCase >& i_rInfo ) { return i_rInfo.param.Name; } );
+      LumekTest::VCaseName() );
 
   TEST( SystemText, OfThisMachineHasNoBlanks )
   {
@@ -275,9 +240,13 @@ namespace
     EXPECT_EQ( Address.back(), '/' ) << Address;
   }
 
+  const char* const s_AddressNames[] = { "DefaultVersionServer", "BuiltInVersionServer", "SupportPage" };
+
   INSTANTIATE_TEST_SUITE_P( All, BuiltInAddress,
                             testing::Values( VersionCheck::DefaultVersionServer, VersionCheck::BuiltInVersionServer,
-                                             VersionCheck::SupportPage ) );
+                                             VersionCheck::SupportPage ),
+                            []( const testing::TestParamInfo< const char* >& i_rInfo )
+                            { return std::string( s_AddressNames[i_rInfo.index] ); } );
 
   TEST( BuiltInAddress, CommandLineDefaultIsHttps )
   {
