@@ -1,4 +1,6 @@
 #include "services/Log.h"
+#include "tests/support/LogCapture.h"
+#include "tests/support/TestNames.h"
 
 #include <gtest/gtest.h>
 
@@ -19,28 +21,6 @@ namespace
     return io_rStream << "<" << i_rValue.Value << ">";
   }
 
-  // Listens at one level, with standard error quiet, for the life of a test.
-  class VLogCapture
-  {
-  public:
-    explicit VLogCapture( int i_Level )
-    {
-      m_StandardErrorLevel = ZOL::GlobalLog().GetStandardErrorLevel();
-      ZOL::GlobalLog().SetStandardErrorLevel( 0 );
-      m_Sink = ZOL::GlobalLog().AddSink( [this]( const ZOL::ILogRecord& i_rRecord ) { Records.push_back( i_rRecord ); },
-                                         i_Level );
-    }
-    ~VLogCapture()
-    {
-      ZOL::GlobalLog().RemoveSink( m_Sink );
-      ZOL::GlobalLog().SetStandardErrorLevel( m_StandardErrorLevel );
-    }
-    std::vector< ZOL::ILogRecord > Records;
-
-  private:
-    int m_Sink = 0;
-    int m_StandardErrorLevel = 0;
-  };
 } // namespace
 
 class LogLevelTest : public testing::TestWithParam< int >
@@ -50,7 +30,7 @@ class LogLevelTest : public testing::TestWithParam< int >
 TEST_P( LogLevelTest, FormatsOnlyWhatTheLevelLetsThrough )
 {
   const int Listening = GetParam();
-  VLogCapture Capture( Listening );
+  LumekTest::VLogCapture Capture( "", Listening );
   for( int Level = ZOL::LogFailure; Level <= ZOL::LogDetail; ++Level )
   {
     s_Formatted = 0;
@@ -67,11 +47,25 @@ TEST_P( LogLevelTest, FormatsOnlyWhatTheLevelLetsThrough )
   }
 }
 
-INSTANTIATE_TEST_SUITE_P( Levels, LogLevelTest, testing::Values( 2, 3, 4, 6 ) );
+INSTANTIATE_TEST_SUITE_P( Levels, LogLevelTest, testing::Values( 2, 3, 4, 6 ),
+                          []( const testing::TestParamInfo< int >& i_rInfo )
+                          { return "ListeningAt" + std::to_string( i_rInfo.param ); } );
+
+TEST( Log, StandardErrorLineWithoutAnySink )
+{
+  const int StandardErrorLevel = ZOL::GlobalLog().GetStandardErrorLevel();
+  ZOL::GlobalLog().SetStandardErrorLevel( ZOL::LogWarning );
+  testing::internal::CaptureStderr();
+  LUMEK_LOG( "LogTest", ZOL::LogWarning, "Bad atom size %d", 7 );
+  LUMEK_LOG( "LogTest", ZOL::LogInfo, "not shown" );
+  const std::string Text = testing::internal::GetCapturedStderr();
+  ZOL::GlobalLog().SetStandardErrorLevel( StandardErrorLevel );
+  EXPECT_EQ( "[LogTest:3] Bad atom size 7\n", Text );
+}
 
 TEST( Log, RecordCarriesCategorySourceAndLine )
 {
-  VLogCapture Capture( ZOL::LogDetail );
+  LumekTest::VLogCapture Capture( "", ZOL::LogDetail );
   const int Line = __LINE__ + 1;
   LUMEK_LOG( "MovIO", ZOL::LogWarning, "Bad atom size %d at %d", 7, 1024 );
   ASSERT_EQ( 1u, Capture.Records.size() );
@@ -84,7 +78,7 @@ TEST( Log, RecordCarriesCategorySourceAndLine )
 
 TEST( Log, ValuesPrintByTheirOwnType )
 {
-  VLogCapture Capture( ZOL::LogDetail );
+  LumekTest::VLogCapture Capture( "", ZOL::LogDetail );
   LUMEK_LOG( "LogTest", ZOL::LogInfo, "%s|%s|%d|%s", 42, 2.5, std::string( "text" ), std::uint64_t( 1 ) << 40 );
   ASSERT_EQ( 1u, Capture.Records.size() );
   EXPECT_EQ( "42|2.5|text|1099511627776", Capture.Records[0].Message );
@@ -103,7 +97,7 @@ class LogBadFormatTest : public testing::TestWithParam< VBadFormatCase >
 
 TEST_P( LogBadFormatTest, UnformattableMessageIsLoggedRawAsAFailure )
 {
-  VLogCapture Capture( ZOL::LogDetail );
+  LumekTest::VLogCapture Capture( "", ZOL::LogDetail );
   LUMEK_LOG( "LogTest", GetParam().Level, GetParam().Format, 1 );
   ASSERT_EQ( 1u, Capture.Records.size() );
   EXPECT_EQ( std::string( "Cannot Format Log Message \"" ) + GetParam().Format + "\"", Capture.Records[0].Message );
@@ -116,5 +110,4 @@ INSTANTIATE_TEST_SUITE_P( Formats, LogBadFormatTest,
                                            VBadFormatCase{ "TooManyArguments", "no placeholder", ZOL::LogDetail },
                                            VBadFormatCase{ "BrokenDirective", "%1% then %", ZOL::LogWarning },
                                            VBadFormatCase{ "PercentSignsInRawText", "100%% %q %", ZOL::LogFailure } ),
-                          []( const testing::TestParamInfo< VBadFormatCase >& i_rInfo )
-                          { return std::string( i_rInfo.param.Name ); } );
+                          LumekTest::VCaseName() );
