@@ -1,5 +1,6 @@
 #include "utils/UtilsFileSystem/FileIO.h"
 
+#include "tests/support/TestNames.h"
 #include "tests/utils/FileTestSupport.h"
 
 #include <gtest/gtest.h>
@@ -50,8 +51,7 @@ namespace
                                              VErrorCase{ "PermissionDenied", EACCES, ZOL::Result_NotPermitted },
                                              VErrorCase{ "InputOutput", EIO, ZOL::Result_FileIOFailure },
                                              VErrorCase{ "NoSpace", ENOSPC, ZOL::Result_FileIOFailure } ),
-                            []( const testing::TestParamInfo< VErrorCase >& i_rInfo )
-                            { return std::string( i_rInfo.param.Name ); } );
+                            LumekTest::VCaseName() );
 
   TEST( OpenStreams, AMissingFileAndAFolderHaveTheirCodes )
   {
@@ -186,8 +186,7 @@ namespace
   INSTANTIATE_TEST_SUITE_P( Both, ReplaceTest,
                             testing::Values( VReplaceCase{ "Renames", &ReplaceFile },
                                              VReplaceCase{ "Atomic", &ReplaceFileAtomic } ),
-                            []( const testing::TestParamInfo< VReplaceCase >& i_rInfo )
-                            { return std::string( i_rInfo.param.Name ); } );
+                            LumekTest::VCaseName() );
 
   TEST( CopyAndMove, NeverReplaceUnlessAsked )
   {

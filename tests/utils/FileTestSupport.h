@@ -3,6 +3,7 @@
 // Files and log lines for the file function tests.
 
 #include "services/ILogCategorised.h"
+#include "tests/support/LogCapture.h"
 
 #include <boost/filesystem.hpp>
 
@@ -55,38 +56,10 @@ namespace LumekTest
     return std::string( std::istreambuf_iterator< char >( File ), std::istreambuf_iterator< char >() );
   }
 
-  // Every message of one category up to a level, with standard error quiet, for the life of a test.
-  class VSystemLogCapture
+  // What the "System" category logs up to a level, for the life of a test.
+  class VSystemLogCapture : public VLogCapture
   {
   public:
-    explicit VSystemLogCapture( int i_Level = ZOL::LogDetail )
-    {
-      m_StandardErrorLevel = ZOL::GlobalLog().GetStandardErrorLevel();
-      ZOL::GlobalLog().SetStandardErrorLevel( 0 );
-      m_Sink = ZOL::GlobalLog().AddSink(
-          [this]( const ZOL::ILogRecord& i_rRecord )
-          {
-            if( i_rRecord.Category == "System" )
-              Messages.push_back( i_rRecord.Message );
-          },
-          i_Level );
-    }
-    ~VSystemLogCapture()
-    {
-      ZOL::GlobalLog().RemoveSink( m_Sink );
-      ZOL::GlobalLog().SetStandardErrorLevel( m_StandardErrorLevel );
-    }
-    bool Has( const std::string& i_rMessage ) const
-    {
-      for( const std::string& rMessage : Messages )
-        if( rMessage == i_rMessage )
-          return true;
-      return false;
-    }
-    std::vector< std::string > Messages;
-
-  private:
-    int m_Sink = 0;
-    int m_StandardErrorLevel = 0;
+    explicit VSystemLogCapture( int i_Level = ZOL::LogDetail ) : VLogCapture( "System", i_Level ) {}
   };
 } // namespace LumekTest

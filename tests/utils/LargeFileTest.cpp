@@ -1,3 +1,4 @@
+#include "tests/support/TestNames.h"
 #include "utils/UtilsIO/VLargeFile.h"
 #include "videointerface/IVideoAttributes.h"
 
@@ -254,5 +255,4 @@ INSTANTIATE_TEST_SUITE_P( Modes, LargeFileModeTest,
                                            VModeCase{ "Write", 3, "wb", true, true, true, true },
                                            VModeCase{ "Unknown", 4, "", false, false, false, false },
                                            VModeCase{ "Negative", -1, "", false, false, false, false } ),
-                          []( const testing::TestParamInfo< VModeCase >& i_rInfo )
-                          { return std::string( i_rInfo.param.Name ); } );
+                          LumekTest::VCaseName() );

@@ -1,4 +1,5 @@
 #include "utils/UtilsFileSystem/LongPath.h"
+#include "tests/support/TestNames.h"
 
 #include <gtest/gtest.h>
 
@@ -46,4 +47,4 @@ INSTANTIATE_TEST_SUITE_P(
                      VPathCase{ "Relative", "data/clip.lvid", "data\\clip.lvid" },
                      VPathCase{ "PosixAbsoluteIsNotAbsoluteHere", "/data/clip.lvid", "\\data\\clip.lvid" },
                      VPathCase{ "OneCharacter", "/", "\\" }, VPathCase{ "Empty", "", "" } ),
-    []( const testing::TestParamInfo< VPathCase >& i_rInfo ) { return std::string( i_rInfo.param.Name ); } );
+    LumekTest::VCaseName() );
