@@ -214,6 +214,14 @@ TEST( BufferAllocator, BuffersKeepTheirAllocatorAlive )
   EXPECT_TRUE( pWeak.expired() );
 }
 
+// Buffers hold their allocator, so one that is not owned by a shared pointer cannot hand any out.
+TEST( BufferAllocator, AnAllocatorNotOwnedBySharedPointerThrowsBadWeakPtr )
+{
+  VReaderBufferAllocator Allocator;
+  std::shared_ptr< IBuffer > pBuffer;
+  EXPECT_THROW( Allocator.Allocate( pBuffer, 8 ), std::bad_weak_ptr );
+}
+
 TEST( BufferAllocator, ImpossibleSizeGivesAnEmptyPointerAndALogLine )
 {
   LumekTest::VLogCapture Log( "", LogFailure );
