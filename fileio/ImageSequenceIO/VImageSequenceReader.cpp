@@ -409,8 +409,8 @@ namespace ImageSequenceIO
     if( !i_bReadVideo )
       return true;
     ZOL::IVideoFrameInfo Info = m_VideoFrameInfo;
-    VideoEncoding::PixelFormatForPayloadFormat( m_Payload, Info.PixelFormat, Info.PixelFormat, false );
-    if( !VideoEncoding::VideoFrameDecoder( m_Payload, Info, pVideo, m_pAllocator, m_pAllocator, nullptr ) )
+    if( !VideoEncoding::PixelFormatForPayloadFormat( m_Payload, Info.PixelFormat, Info.PixelFormat, false ) ||
+        !VideoEncoding::VideoFrameDecoder( m_Payload, Info, pVideo, m_pAllocator, m_pAllocator, nullptr ) )
       return false;
     o_rFrame.VideoFrameInfo = Info;
     o_rFrame.Video = std::move( pVideo );
