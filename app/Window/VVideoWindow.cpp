@@ -276,7 +276,8 @@ namespace LumekVideoViewer
     const std::uint64_t FrameCount = m_VideoSource.IsOpen() ? m_VideoSource.GetFrameCount() : 0;
     const VFrameChoice Choice = ChooseFrame(
         i_FrameIndex, FrameCount, m_pPlayBackManager->IsPlaying(),
-        [this]( std::uint64_t i_Index, ZOL::IVideoFrame& o_rFrame ) { m_VideoSource.GetFrame( i_Index, o_rFrame ); },
+        [this]( std::uint64_t i_Index, ZOL::IVideoFrame& o_rFrame )
+        { return m_VideoSource.GetFrame( i_Index, o_rFrame ); },
         [this]( std::uint64_t i_Index ) { return m_VideoSource.FindFrameAtOrBefore( i_Index ); } );
     m_ShownFrameIndex = Choice.ShownIndex;
     const ZOL::IVideoFrameInfo Geometry =

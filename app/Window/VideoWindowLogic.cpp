@@ -48,6 +48,16 @@ namespace LumekVideoViewer
     return rInfo.ImageWidth == 0 || rInfo.ImageHeight == 0 || rInfo.PixelFormat == ZOL::PixelFormat_Unspecified;
   }
 
+  namespace
+  {
+    // A frame that failed to read or decode is shown as missing, whatever its record already held.
+    void ReadOrEmpty( const VFrameReader& i_rRead, std::uint64_t i_Index, ZOL::IVideoFrame& o_rFrame )
+    {
+      if( !i_rRead( i_Index, o_rFrame ) )
+        o_rFrame = ZOL::IVideoFrame();
+    }
+  } // namespace
+
   VFrameChoice ChooseFrame( int i_FrameIndex, std::uint64_t i_FrameCount, bool i_bPlaying, const VFrameReader& i_rRead,
                             const VEarlierFrameFinder& i_rFindEarlier )
   {
@@ -56,7 +66,7 @@ namespace LumekVideoViewer
       return Choice;
     std::uint64_t Index = static_cast< std::uint64_t >( i_FrameIndex );
     if( Index < i_FrameCount )
-      i_rRead( Index, Choice.Frame );
+      ReadOrEmpty( i_rRead, Index, Choice.Frame );
     Choice.bMissingWarning = IsEmptyFrame( Choice.Frame ) && !i_bPlaying;
     // The playback clock runs a few frames past the end before it notices; those are never read.
     if( IsEmptyFrame( Choice.Frame ) && Index >= i_FrameCount )
@@ -69,7 +79,7 @@ namespace LumekVideoViewer
         break;
       Index = *Earlier;
       Choice.Frame = ZOL::IVideoFrame();
-      i_rRead( Index, Choice.Frame );
+      ReadOrEmpty( i_rRead, Index, Choice.Frame );
     }
     if( !IsEmptyFrame( Choice.Frame ) )
       Choice.ShownIndex = static_cast< int >( Index );

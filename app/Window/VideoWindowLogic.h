@@ -58,7 +58,7 @@ namespace LumekVideoViewer
   // A frame counts as missing when it has no size or no pixel format.
   bool IsEmptyFrame( const ZOL::IVideoFrame& i_rFrame );
 
-  using VFrameReader = std::function< void( std::uint64_t i_Index, ZOL::IVideoFrame& o_rFrame ) >;
+  using VFrameReader = std::function< bool( std::uint64_t i_Index, ZOL::IVideoFrame& o_rFrame ) >;
   // The nearest stored frame at or below an index, from the file's index.
   using VEarlierFrameFinder = std::function< std::optional< std::uint64_t >( std::uint64_t i_Index ) >;
 

@@ -31,11 +31,11 @@ namespace
     {
       if( o_pReads )
         o_pReads->push_back( i_Index );
-      if( i_Present.count( i_Index ) == 0 )
-        return;
+      // A frame that fails still has its description filled in, as the video source leaves it.
       o_rFrame.VideoFrameInfo.ImageWidth = 8;
       o_rFrame.VideoFrameInfo.ImageHeight = 4;
       o_rFrame.VideoFrameInfo.PixelFormat = ZOL::PixelFormat_Luminance8;
+      return i_Present.count( i_Index ) == 1;
     };
   }
 } // namespace
