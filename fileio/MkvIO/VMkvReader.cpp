@@ -98,21 +98,24 @@ namespace MkvIO
     Reset();
   }
 
-  bool VMkvReader::Open( const std::string& i_rFileName )
+  bool VMkvReader::OpenReader( const std::string& i_rFileName )
   {
-    Reset();
     auto pCallback = std::make_unique< VMkvIOCallback >();
     if( !pCallback->Open( i_rFileName, false ) )
     {
       MKV_LOG( ZOL::LogFailure, "File could not be opened." );
       return false;
     }
-    return Open( std::move( pCallback ) );
+    return OpenCallback( std::move( pCallback ) );
   }
 
   bool VMkvReader::Open( std::unique_ptr< libebml::IOCallback > i_pCallback )
   {
-    Reset();
+    return OpenWith( [&] { return OpenCallback( std::move( i_pCallback ) ); } );
+  }
+
+  bool VMkvReader::OpenCallback( std::unique_ptr< libebml::IOCallback > i_pCallback )
+  {
     if( !i_pCallback )
       return false;
     m_pCallback = std::move( i_pCallback );
@@ -130,8 +133,6 @@ namespace MkvIO
     {
       MKV_LOG( ZOL::LogFailure, "Matroska parsing failed: %s", "unknown error" );
     }
-    if( !bOpened )
-      Reset();
     return bOpened;
   }
 

@@ -6,6 +6,7 @@
 
 #include "fileio/MkvIO/VReaderCapabilities.h"
 #include "videointerface/IVideoReader.h"
+#include "videointerface/VideoReaderBase.h"
 
 #include <cstdint>
 #include <memory>
@@ -29,7 +30,7 @@ namespace libmatroska
 
 namespace MkvIO
 {
-  class VMkvReader : public ZOL::IVideoReader, public ZOL::IFrameIndexQueries
+  class VMkvReader : public ZOL::VVideoReaderBase, public ZOL::IFrameIndexQueries
   {
   public:
     VMkvReader();
@@ -38,10 +39,10 @@ namespace MkvIO
     VMkvReader& operator=( const VMkvReader& ) = delete;
 
     const ZOL::IVideoReaderCapabilities& GetCapabilities() const override { return m_Capabilities; }
-    bool Open( const std::string& i_rFileName ) override;
+    using ZOL::VVideoReaderBase::Open;
     // Reads a file through a callback that is already open, from its position 0: how the fuzz
     // target reads files held in memory. The reader keeps the callback until Close.
-    bool Open( std::unique_ptr< libebml::IOCallback > i_pCallback );
+    [[nodiscard]] bool Open( std::unique_ptr< libebml::IOCallback > i_pCallback );
     const ZOL::IVideoAttributes& GetAttributes() const override { return m_ExternalAttributes; }
     const ZOL::IVideoTiming& GetVideoTiming() const override { return m_Timing; }
     const ZOL::ITimecode& GetTimecode() const override { return m_Timecode; }
@@ -72,7 +73,9 @@ namespace MkvIO
     std::uint64_t GetTimecodeScale() const { return m_TimecodeScale; }
 
   private:
-    void Reset();
+    bool OpenReader( const std::string& i_rFileName ) override;
+    void Reset() override;
+    bool OpenCallback( std::unique_ptr< libebml::IOCallback > i_pCallback );
     bool OpenSegment();
     bool WalkSegment();
     bool ReadInfo( libebml::EbmlElement& io_rInfo );

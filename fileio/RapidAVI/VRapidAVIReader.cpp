@@ -58,35 +58,27 @@ namespace RapidAVI
     m_AudioChunkOfFrame.clear();
   }
 
-  bool VRapidAVIReader::Open( const std::string& i_rFileName )
+  bool VRapidAVIReader::OpenReader( const std::string& i_rFileName )
   {
-    Reset();
     auto pFile = std::make_shared< UtilsIO::VLargeFile >();
     if( !pFile->Open( i_rFileName, UtilsIO::OpenMode_Read ) )
     {
       LUMEK_LOG( "RapidAVI", ZOL::LogFailure, "Could not open AVI file for reading." );
       return false;
     }
-    return Open( pFile );
+    return OpenStream( pFile );
   }
 
   bool VRapidAVIReader::Open( const std::shared_ptr< ZOL::IInputStreamSeekable >& i_pStream )
   {
-    Reset();
+    return OpenWith( [&] { return OpenStream( i_pStream ); } );
+  }
+
+  bool VRapidAVIReader::OpenStream( const std::shared_ptr< ZOL::IInputStreamSeekable >& i_pStream )
+  {
     if( !i_pStream )
       return false;
     m_pStream = i_pStream;
-    if( !OpenStream() )
-    {
-      // A refused file leaves nothing behind that a later read could trip over.
-      Reset();
-      return false;
-    }
-    return true;
-  }
-
-  bool VRapidAVIReader::OpenStream()
-  {
     if( !m_pStream->GetSize( m_FileSize ) ||
         m_FileSize > static_cast< std::uint64_t >( std::numeric_limits< std::int64_t >::max() ) ||
         !m_pStream->Seek( 0 ) )

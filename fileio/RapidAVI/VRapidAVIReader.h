@@ -13,6 +13,7 @@
 #include "fileio/VideoEncoding/IH264Decoder.h"
 #include "utils/Streams.h"
 #include "videointerface/IVideoReader.h"
+#include "videointerface/VideoReaderBase.h"
 
 #include <cstdint>
 #include <memory>
@@ -26,7 +27,7 @@ namespace RapidAVI
   // LIST, chunk.
   constexpr int MaxChunkDepth = 8;
 
-  class VRapidAVIReader : public ZOL::IVideoReader, public ZOL::IFrameIndexQueries
+  class VRapidAVIReader : public ZOL::VVideoReaderBase, public ZOL::IFrameIndexQueries
   {
   public:
     VRapidAVIReader();
@@ -35,9 +36,9 @@ namespace RapidAVI
     VRapidAVIReader& operator=( const VRapidAVIReader& ) = delete;
 
     const ZOL::IVideoReaderCapabilities& GetCapabilities() const override { return m_Capabilities; }
-    bool Open( const std::string& i_rFileName ) override;
+    using ZOL::VVideoReaderBase::Open;
     // Reads a file from a stream that is already open (memory, for tests and fuzzing).
-    bool Open( const std::shared_ptr< ZOL::IInputStreamSeekable >& i_pStream );
+    [[nodiscard]] bool Open( const std::shared_ptr< ZOL::IInputStreamSeekable >& i_pStream );
     bool DumpFileStructure( std::ostream& o_rStream ) override;
     const ZOL::IVideoAttributes& GetAttributes() const override { return m_Attributes; }
     const ZOL::IVideoTiming& GetVideoTiming() const override { return m_Timing; }
@@ -80,8 +81,9 @@ namespace RapidAVI
       StreamKind_Other = 2,
     };
 
-    void Reset();
-    bool OpenStream();
+    bool OpenReader( const std::string& i_rFileName ) override;
+    void Reset() override;
+    bool OpenStream( const std::shared_ptr< ZOL::IInputStreamSeekable >& i_pStream );
     bool BuildChunkTree( VRiffChunk& io_rParent, int i_Depth );
     bool ParseRiff( const VRiffChunk& i_rChunk, bool i_bGood, bool& o_rParseChildren );
     bool ParseList( const VRiffChunk& i_rChunk, bool i_bGood, bool& o_rParseChildren );
