@@ -37,7 +37,7 @@ namespace ZOL
     // The standard's frame period in ticks; 0 for an unknown standard.
     std::uint64_t GetTicksPerFrame() const;
     std::uint64_t GetTicksPerDay() const;
-    bool SetFromTicks( std::int64_t i_Ticks );
+    [[nodiscard]] bool SetFromTicks( std::int64_t i_Ticks );
     void AddTicks( std::int64_t i_Ticks );
     // HH:MM:SS:FF with the style's suffix; empty for an invalid record.
     std::string ToText( int i_Style, bool i_bWithStandard, bool i_bSubFrameMark ) const;

@@ -45,7 +45,7 @@ namespace ZOL
       virtual bool Equals( const IValue& i_rOther ) const = 0;
       virtual std::uint32_t GetType() const = 0;
       // The serial form, tag included.
-      virtual bool Write( IOutputStream& i_rStream ) const = 0;
+      [[nodiscard]] virtual bool Write( IOutputStream& i_rStream ) const = 0;
     };
 
     // Keys compare byte-wise; a shorter key sorts before a longer one with the same prefix.
@@ -86,7 +86,7 @@ namespace ZOL
     // The text the properties panel shows: numbers in the default stream form, bool as 0 or 1.
     bool GetValueAsString( const std::string& i_rKey, std::string& o_rText ) const;
     // Replaces the value of an existing key by the parsed text, in the key's existing type.
-    bool SetValueFromString( const std::string& i_rKey, const std::string& i_rText );
+    [[nodiscard]] bool SetValueFromString( const std::string& i_rKey, const std::string& i_rText );
     bool Remove( const std::string& i_rKey );
     void GetKeys( std::vector< std::string >& o_rKeys ) const;
     bool Has( const std::string& i_rKey ) const { return m_Values.count( i_rKey ) != 0; }
@@ -103,11 +103,11 @@ namespace ZOL
     void Merge( const IVideoAttributes& i_rOther );
 
     // The serial form: a count, then key length, key, tag and value for each entry in map order.
-    bool WriteTo( IOutputStream& i_rStream ) const;
+    [[nodiscard]] bool WriteTo( IOutputStream& i_rStream ) const;
     // Reads the serial form. On failure the entries read so far stay. Key and string lengths are
     // bounded by what the stream can still hold, so a damaged length never allocates more than
     // the stream's size.
-    bool ReadFrom( IInputStream& i_rStream );
+    [[nodiscard]] bool ReadFrom( IInputStream& i_rStream );
 
   private:
     Map m_Values;

@@ -62,7 +62,7 @@ namespace
   std::vector< std::uint8_t > SerialForm( const ZOL::IVideoAttributes& i_rStore )
   {
     UtilsIO::VMemoryStream Stream;
-    i_rStore.WriteTo( Stream );
+    benchmark::DoNotOptimize( i_rStore.WriteTo( Stream ) );
     return Stream.GetData();
   }
 
@@ -70,7 +70,7 @@ namespace
   {
     const ZOL::IVideoAttributes Store = RecordingAttributes();
     UtilsIO::VMemoryStream Stream;
-    Store.WriteTo( Stream );
+    benchmark::DoNotOptimize( Store.WriteTo( Stream ) );
     VHeapCounter Heap;
     for( auto _ : io_rState )
     {

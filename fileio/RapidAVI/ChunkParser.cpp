@@ -229,8 +229,9 @@ namespace RapidAVI
 
   void VRapidAVIReader::ParseMetadata()
   {
-    // Either store may be missing or damaged; what was read stays, the rest keeps defaults.
-    m_FrameStore.ReadFrom( *m_pStream );
-    m_Attributes.ReadFrom( *m_pStream );
+    // Either store may be missing or damaged; what was read stays, the rest keeps defaults. The
+    // file attributes follow the frame store, so they cannot be found behind a broken one.
+    if( m_FrameStore.ReadFrom( *m_pStream ) && !m_Attributes.ReadFrom( *m_pStream ) )
+      return;
   }
 } // namespace RapidAVI

@@ -143,8 +143,12 @@ namespace LumekVideoTool
 
     // Decoded payloads are stored in the format their decoder delivers.
     ZOL::IVideoFrameInfo OutputInfo = Source.GetVideoFrameInfo();
-    VideoEncoding::PixelFormatForPayloadFormat( Source.GetVideoPayload(), OutputInfo.PixelFormat,
-                                                OutputInfo.PixelFormat, false );
+    if( !VideoEncoding::PixelFormatForPayloadFormat( Source.GetVideoPayload(), OutputInfo.PixelFormat,
+                                                     OutputInfo.PixelFormat, false ) )
+    {
+      o_rErr << "lumekvideotool convert: " << Input << " has no video that can be decoded." << std::endl;
+      return Exit_CannotOpen;
+    }
     const std::uint64_t FrameCount = Source.GetFrameCount();
     for( auto Index = Source.FindFrameAtOrAfter( 0 ); Index; Index = Source.FindFrameAtOrAfter( *Index + 1 ) )
     {

@@ -96,8 +96,7 @@ namespace LumekVideoTool
     const std::uint64_t End = Count > UINT64_MAX - First ? UINT64_MAX : First + Count;
     for( std::uint64_t Index = First; Index < End; )
     {
-      // Gaps are reported as one range: a damaged index may name a frame in the
-      // billions.
+      // Gaps are reported as one range: a damaged index may name a frame in the billions.
       const auto Next = Source.FindFrameAtOrAfter( Index );
       const std::uint64_t Stop = Next ? std::min( *Next, End ) : End;
       if( Stop > Index )
@@ -159,13 +158,11 @@ namespace LumekVideoTool
     const auto Start = std::chrono::steady_clock::now();
     // Processor time too: it compares with "ffmpeg -benchmark" whatever else runs on the machine.
     const std::clock_t ProcessorStart = std::clock();
-    // A frame missing from the index is not a decoding failure: playback shows
-    // the one before.
+    // A frame missing from the index is not a decoding failure: playback shows the one before.
     for( auto Index = Source.FindFrameAtOrAfter( 0 ); Index && *Index < Frames;
          Index = Source.FindFrameAtOrAfter( *Index + 1 ) )
     {
-      // Frames are taken and dropped as playback takes and drops them, so buffers
-      // recycle.
+      // Frames are taken and dropped as playback takes and drops them, so buffers recycle.
       ZOL::IVideoFrame Frame;
       ++Read;
       if( !Source.GetFrame( *Index, Frame ) || ( bSoftware && !ToDisplayRGB( Source.GetVideoSettings(), Frame, RGB ) ) )

@@ -60,13 +60,15 @@ namespace
     }
     ZOL::IVideoFrame Frame;
     for( std::uint64_t i = 0; i < 100; ++i )
-      Source.GetFrame( i % 20, Frame );
+      if( !Source.GetFrame( i % 20, Frame ) )
+        io_rState.SkipWithError( "a frame of the recording did not read" );
     const double WarmResident = ResidentMiB();
 
     std::uint64_t Index = 0;
     for( auto _ : io_rState )
     {
-      Source.GetFrame( Index++ % 20, Frame );
+      if( !Source.GetFrame( Index++ % 20, Frame ) )
+        io_rState.SkipWithError( "a frame of the recording did not read" );
       benchmark::DoNotOptimize( Frame.Video->GetData() );
     }
     io_rState.SetItemsProcessed( io_rState.iterations() );

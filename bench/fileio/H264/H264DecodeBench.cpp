@@ -245,8 +245,8 @@ namespace
     VBytes Output( Width * Height * 2 );
     for( auto _ : io_rState )
     {
-      CoreVideoUtils::PlanarYUV420ToInterleaved( Y.data(), U.data(), V.data(), Output.data(), ZOL::PixelFormat_U8Y8V8Y8,
-                                                 Width, Height, Width, Width / 2 );
+      benchmark::DoNotOptimize( CoreVideoUtils::PlanarYUV420ToInterleaved(
+          Y.data(), U.data(), V.data(), Output.data(), ZOL::PixelFormat_U8Y8V8Y8, Width, Height, Width, Width / 2 ) );
       benchmark::DoNotOptimize( Output.data() );
     }
     io_rState.counters["frames/s"] =

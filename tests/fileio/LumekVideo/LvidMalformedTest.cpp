@@ -354,8 +354,7 @@ namespace
       if( bRead )
       {
         ASSERT_EQ( Audio.size(), 1u );
-        EXPECT_EQ( VBytes( Audio[0]->GetData(), Audio[0]->GetData() + Audio[0]->GetSize() ),
-                   *Plan.Records[0].Audio );
+        EXPECT_EQ( VBytes( Audio[0]->GetData(), Audio[0]->GetData() + Audio[0]->GetSize() ), *Plan.Records[0].Audio );
       }
     }
   }
