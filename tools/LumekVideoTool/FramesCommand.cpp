@@ -12,8 +12,8 @@
 #include <algorithm>
 #include <chrono>
 #include <climits>
-#include <ctime>
 #include <cstdio>
+#include <ctime>
 #include <fstream>
 
 namespace po = boost::program_options;
