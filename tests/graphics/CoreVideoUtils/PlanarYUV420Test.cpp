@@ -65,4 +65,32 @@ namespace
     EXPECT_TRUE( Log.Lines().empty() );
     EXPECT_EQ( Output, Bytes( 32, 0xCD ) );
   }
+
+  // Wide rows go 32 pixels at a time with a tail: every byte must still be where the pair rule
+  // puts it, in both layouts, with padded strides.
+  TEST( PlanarYUV420ToInterleaved, WideRowsFollowThePairRule )
+  {
+    const std::int32_t Width = 102, Height = 4, StrideY = 110, StrideUV = 60;
+    Bytes Y( StrideY * Height ), U( StrideUV * Height / 2 ), V( StrideUV * Height / 2 );
+    for( std::size_t i = 0; i < Y.size(); ++i )
+      Y[i] = static_cast< std::uint8_t >( i * 7 + 1 );
+    for( std::size_t i = 0; i < U.size(); ++i )
+      U[i] = static_cast< std::uint8_t >( i * 11 + 3 ), V[i] = static_cast< std::uint8_t >( i * 13 + 5 );
+    for( const EPixelFormat F : { PixelFormat_U8Y8V8Y8, PixelFormat_Y8U8Y8V8 } )
+    {
+      Bytes Output( Width * Height * 2 );
+      ASSERT_TRUE( CoreVideoUtils::PlanarYUV420ToInterleaved( Y.data(), U.data(), V.data(), Output.data(), F, Width,
+                                                              Height, StrideY, StrideUV ) );
+      for( std::int32_t y = 0; y < Height; ++y )
+        for( std::int32_t x = 0; x < Width; ++x )
+        {
+          const std::uint8_t* p = Output.data() + ( y * Width + x ) * 2;
+          const std::uint8_t Chroma = ( x % 2 == 0 ? U : V )[( y / 2 ) * StrideUV + x / 2];
+          const std::uint8_t Luma = Y[y * StrideY + x];
+          const bool bLumaFirst = F == PixelFormat_Y8U8Y8V8;
+          ASSERT_EQ( p[bLumaFirst ? 0 : 1], Luma ) << "x " << x << " y " << y;
+          ASSERT_EQ( p[bLumaFirst ? 1 : 0], Chroma ) << "x " << x << " y " << y;
+        }
+    }
+  }
 } // namespace
