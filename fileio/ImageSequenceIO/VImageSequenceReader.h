@@ -7,8 +7,8 @@
 
 #include "fileio/ImageSequenceIO/SequenceDescriptor.h"
 #include "fileio/ImageSequenceIO/SequenceNames.h"
-#include "fileio/ImageSequenceIO/VReaderCapabilities.h"
 #include "videointerface/IVideoReader.h"
+#include "videointerface/ReaderCapabilities.h"
 #include "videointerface/VideoReaderBase.h"
 
 #include <cstdint>
@@ -78,7 +78,12 @@ namespace ImageSequenceIO
     void ScanFolder( const std::string& i_rSubFolder );
     bool ReadSizeFromImage( const std::string& i_rPath );
 
-    VReaderCapabilities m_Capabilities;
+    // A sequence is still images without sound.
+    ZOL::VReaderCapabilities m_Capabilities{
+        {},
+        { ZOL::AudioPayload_None },
+        {},
+        { ZOL::VideoPayload_ImageJPEG, ZOL::VideoPayload_ImagePNG, ZOL::VideoPayload_ImageTIFF } };
     std::string m_Folder;
     std::shared_ptr< ZOL::IBufferAllocator > m_pAllocator;
     ZOL::EVideoPayload m_Payload = ZOL::VideoPayload_None;

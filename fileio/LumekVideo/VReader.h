@@ -5,8 +5,8 @@
 // of the file names. Frames missing from the index are the frames a capture lost.
 
 #include "fileio/LumekVideo/LvidFormat.h"
-#include "fileio/LumekVideo/VReaderCapabilities.h"
 #include "videointerface/IVideoReader.h"
+#include "videointerface/ReaderCapabilities.h"
 #include "videointerface/VideoReaderBase.h"
 
 #include <cstdint>
@@ -69,7 +69,16 @@ namespace LumekVideo
     // Moves the stream forward to the next multiple of the alignment.
     bool AlignStream();
 
-    VReaderCapabilities m_Capabilities;
+    // Frames of an .lvid recording are always raw, in any pixel format, with raw audio of any
+    // sample format or none.
+    ZOL::VReaderCapabilities m_Capabilities{ { ZOL::AudioSampleFormat_Unspecified, ZOL::AudioSampleFormat_Int8,
+                                               ZOL::AudioSampleFormat_Int16, ZOL::AudioSampleFormat_Int24,
+                                               ZOL::AudioSampleFormat_Int32, ZOL::AudioSampleFormat_UInt16,
+                                               ZOL::AudioSampleFormat_Float32, ZOL::AudioSampleFormat_UInt8,
+                                               ZOL::AudioSampleFormat_UInt24, ZOL::AudioSampleFormat_UInt32 },
+                                             { ZOL::AudioPayload_None, ZOL::AudioPayload_Uncompressed },
+                                             ZOL::VReaderCapabilities::EveryPixelFormat(),
+                                             { ZOL::VideoPayload_Uncompressed } };
     std::shared_ptr< ZOL::IInputStreamSeekable > m_pStream;
     std::shared_ptr< ZOL::IBufferAllocator > m_pVideoAllocator;
     std::shared_ptr< ZOL::IBufferAllocator > m_pAudioAllocator;

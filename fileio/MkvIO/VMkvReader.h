@@ -4,8 +4,8 @@
 // one audio track numbered 2, and one Cluster for each video frame. A frame is found by the
 // position of its Cluster; Cues and block timestamps are not looked at.
 
-#include "fileio/MkvIO/VReaderCapabilities.h"
 #include "videointerface/IVideoReader.h"
+#include "videointerface/ReaderCapabilities.h"
 #include "videointerface/VideoReaderBase.h"
 
 #include <cstdint>
@@ -93,7 +93,14 @@ namespace MkvIO
     bool ReadFrameBlocks( libmatroska::KaxCluster& io_rCluster, std::shared_ptr< ZOL::IBuffer >& o_rVideo,
                           std::shared_ptr< ZOL::IBuffer >& o_rAudio, bool i_bReadVideo, bool i_bReadAudio );
 
-    VReaderCapabilities m_Capabilities;
+    // What the codec table can yield.
+    ZOL::VReaderCapabilities m_Capabilities{ { ZOL::AudioSampleFormat_Int16, ZOL::AudioSampleFormat_Int24,
+                                               ZOL::AudioSampleFormat_Int32, ZOL::AudioSampleFormat_Float32 },
+                                             { ZOL::AudioPayload_None, ZOL::AudioPayload_Uncompressed },
+                                             { ZOL::PixelFormat_Luminance8, ZOL::PixelFormat_BayerGB8,
+                                               ZOL::PixelFormat_R8G8B8u8, ZOL::PixelFormat_U8Y8V8Y8,
+                                               ZOL::PixelFormat_Y8U8Y8V8 },
+                                             { ZOL::VideoPayload_Uncompressed, ZOL::VideoPayload_ImageJPEG } };
     std::unique_ptr< libebml::IOCallback > m_pCallback;
     std::unique_ptr< libebml::EbmlStream > m_pStream;
     std::unique_ptr< libmatroska::KaxSegment > m_pSegment;

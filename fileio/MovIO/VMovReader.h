@@ -8,8 +8,8 @@
 #include "fileio/MovIO/MovIOCommon.h"
 #include "fileio/MovIO/VMovAtom.h"
 #include "fileio/MovIO/VMovPrimitiveReader.h"
-#include "fileio/MovIO/VReaderCapabilities.h"
 #include "videointerface/IVideoReader.h"
+#include "videointerface/ReaderCapabilities.h"
 #include "videointerface/VideoReaderBase.h"
 
 #include <cstdint>
@@ -133,7 +133,16 @@ namespace MovIO
     [[nodiscard]] bool ReadAudio( const VMovFrame& i_rFrame, ZOL::IAudioBuffers& o_rAudio );
     [[nodiscard]] bool ReadVideo( const VMovFrame& i_rFrame, std::shared_ptr< ZOL::IBuffer >& o_rVideo );
 
-    VReaderCapabilities m_Capabilities;
+    // What the sample description tables can yield: raw RGB and YUV frames, JPEG, PNG, TIFF and
+    // H.264, with integer PCM audio.
+    ZOL::VReaderCapabilities m_Capabilities{
+        { ZOL::AudioSampleFormat_Int16, ZOL::AudioSampleFormat_Int24, ZOL::AudioSampleFormat_Int32,
+          ZOL::AudioSampleFormat_UInt8 },
+        { ZOL::AudioPayload_None, ZOL::AudioPayload_Uncompressed },
+        { ZOL::PixelFormat_R8G8B8, ZOL::PixelFormat_B8G8R8, ZOL::PixelFormat_R8G8B8u8, ZOL::PixelFormat_B8G8R8u8,
+          ZOL::PixelFormat_U8Y8V8Y8, ZOL::PixelFormat_Y8U8Y8V8, ZOL::PixelFormat_U10Y10V10Y10 },
+        { ZOL::VideoPayload_Uncompressed, ZOL::VideoPayload_ImageJPEG, ZOL::VideoPayload_ImagePNG,
+          ZOL::VideoPayload_ImageTIFF, ZOL::VideoPayload_VideoH264 } };
     std::shared_ptr< VMovPrimitiveReader > m_pReader;
     ZOL::EAudioPayload m_AudioPayload = ZOL::AudioPayload_None;
     ZOL::EVideoPayload m_VideoPayload = ZOL::VideoPayload_None;

@@ -9,10 +9,10 @@
 // (AviIndex.cpp), MJPEG frames (MJPEGFrames.cpp) and the rest here.
 
 #include "fileio/RapidAVI/RiffChunk.h"
-#include "fileio/RapidAVI/VReaderCapabilities.h"
 #include "fileio/VideoEncoding/IH264Decoder.h"
 #include "utils/Streams.h"
 #include "videointerface/IVideoReader.h"
+#include "videointerface/ReaderCapabilities.h"
 #include "videointerface/VideoReaderBase.h"
 
 #include <cstdint>
@@ -114,7 +114,15 @@ namespace RapidAVI
     bool ReadEntry( const VAviIndexEntry& i_rEntry, std::shared_ptr< ZOL::IBuffer >& o_rBuffer );
     bool ReadMJPEG( const VAviIndexEntry& i_rEntry, std::shared_ptr< ZOL::IBuffer >& o_rVideo );
 
-    VReaderCapabilities m_Capabilities;
+    // What the compression and audio format tables can yield.
+    ZOL::VReaderCapabilities m_Capabilities{
+        { ZOL::AudioSampleFormat_Int16, ZOL::AudioSampleFormat_Int24, ZOL::AudioSampleFormat_Int32,
+          ZOL::AudioSampleFormat_Float32, ZOL::AudioSampleFormat_UInt8 },
+        { ZOL::AudioPayload_None, ZOL::AudioPayload_Uncompressed },
+        { ZOL::PixelFormat_Luminance8, ZOL::PixelFormat_BayerRG8, ZOL::PixelFormat_BayerGB8, ZOL::PixelFormat_BayerGR8,
+          ZOL::PixelFormat_BayerBG8, ZOL::PixelFormat_B8G8R8, ZOL::PixelFormat_B8G8R8u8, ZOL::PixelFormat_U8Y8V8Y8,
+          ZOL::PixelFormat_Y8U8Y8V8 },
+        { ZOL::VideoPayload_Uncompressed, ZOL::VideoPayload_ImageJPEG, ZOL::VideoPayload_VideoH264 } };
     std::shared_ptr< ZOL::IInputStreamSeekable > m_pStream;
     std::shared_ptr< ZOL::IBufferAllocator > m_pAllocator;
     std::shared_ptr< ZOL::IH264Decoder > m_pH264Decoder;
