@@ -11,7 +11,8 @@ command -v ninja >/dev/null && generator=(-G Ninja)
 if [ ! -f "$build_dir/CMakeCache.txt" ]; then
   CC=clang CXX=clang++ cmake -S . -B "$build_dir" "${generator[@]}" -DCMAKE_BUILD_TYPE=RelWithDebInfo -DLUMEK_FUZZ=ON >/dev/null
 fi
-cmake --build "$build_dir" -j "$(nproc)" >/dev/null
+# Quiet when it works; the compiler's words when it does not.
+cmake --build "$build_dir" -j "$(nproc)" >"$build_dir/build.log" 2>&1 || { tail -60 "$build_dir/build.log"; exit 1; }
 
 shopt -s nullglob
 for fuzzer in "$build_dir"/fuzz/fuzz_*; do

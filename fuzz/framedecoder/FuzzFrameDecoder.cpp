@@ -60,8 +60,11 @@ extern "C" int LLVMFuzzerTestOneInput( const std::uint8_t* i_pData, std::size_t 
   if( i_Size > 7 )
     std::memcpy( pBuffer->GetData(), i_pData + 7, i_Size - 7 );
   ZOL::EPixelFormat Announced = ZOL::PixelFormat_Unspecified;
-  VideoEncoding::PixelFormatForPayloadFormat( Payload, Info.PixelFormat, Announced, ( i_pData[6] & 2 ) != 0 );
-  VideoEncoding::VideoFrameDecoder( Payload, Info, pBuffer, s_pAllocator, s_pAllocator,
-                                    bWithDecoder ? s_pDecoder : nullptr );
+  // Either may refuse the bytes; only how they answer matters here.
+  if( !VideoEncoding::PixelFormatForPayloadFormat( Payload, Info.PixelFormat, Announced, ( i_pData[6] & 2 ) != 0 ) )
+    return 0;
+  if( !VideoEncoding::VideoFrameDecoder( Payload, Info, pBuffer, s_pAllocator, s_pAllocator,
+                                         bWithDecoder ? s_pDecoder : nullptr ) )
+    return 0;
   return 0;
 }

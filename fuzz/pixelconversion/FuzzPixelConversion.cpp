@@ -37,6 +37,7 @@ extern "C" int LLVMFuzzerTestOneInput( const std::uint8_t* i_pData, std::size_t 
   std::vector< std::uint8_t > TargetFrame( TargetBytes + 1 );
   // The source is copied so that AddressSanitizer sees its exact end.
   const std::vector< std::uint8_t > SourceFrame( i_pData + HeaderBytes, i_pData + i_Size );
-  Converter.Convert( Info, SourceFrame.data(), SourceFrame.size(), Target, TargetFrame.data(), TargetBytes );
+  static_cast< void >(
+      Converter.Convert( Info, SourceFrame.data(), SourceFrame.size(), Target, TargetFrame.data(), TargetBytes ) );
   return 0;
 }
