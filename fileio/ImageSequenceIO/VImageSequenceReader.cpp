@@ -397,23 +397,7 @@ namespace ImageSequenceIO
   bool VImageSequenceReader::ReadFrame( std::uint64_t i_FrameIndex, ZOL::IVideoFrame& o_rFrame, bool i_bReadVideo,
                                         bool i_bReadAudio )
   {
-    std::shared_ptr< ZOL::IBuffer > pVideo;
-    ZOL::IAudioBuffers Audio;
-    if( !ReadFrameData( i_FrameIndex, pVideo, Audio, i_bReadVideo, i_bReadAudio ) )
-      return false;
-    if( i_bReadAudio )
-    {
-      o_rFrame.AudioFrameInfo = m_AudioFrameInfo;
-      o_rFrame.Audio.clear();
-    }
-    if( !i_bReadVideo )
-      return true;
-    ZOL::IVideoFrameInfo Info = m_VideoFrameInfo;
-    if( !VideoEncoding::PixelFormatForPayloadFormat( m_Payload, Info.PixelFormat, Info.PixelFormat, false ) ||
-        !VideoEncoding::VideoFrameDecoder( m_Payload, Info, pVideo, m_pAllocator, m_pAllocator, nullptr ) )
-      return false;
-    o_rFrame.VideoFrameInfo = Info;
-    o_rFrame.Video = std::move( pVideo );
-    return true;
+    return VideoEncoding::ReadDecodedFrame( *this, i_FrameIndex, o_rFrame, i_bReadVideo, i_bReadAudio, m_pAllocator,
+                                            m_pAllocator, nullptr );
   }
 } // namespace ImageSequenceIO

@@ -406,28 +406,7 @@ namespace MkvIO
   bool VMkvReader::ReadFrame( std::uint64_t i_FrameIndex, ZOL::IVideoFrame& o_rFrame, bool i_bReadVideo,
                               bool i_bReadAudio )
   {
-    std::shared_ptr< ZOL::IBuffer > pVideo;
-    ZOL::IAudioBuffers Audio;
-    if( !ReadFrameData( i_FrameIndex, pVideo, Audio, i_bReadVideo, i_bReadAudio ) )
-      return false;
-    ZOL::IVideoFrameInfo Info = m_VideoFrameInfo;
-    if( i_bReadVideo )
-    {
-      if( !VideoEncoding::PixelFormatForPayloadFormat( m_VideoPayload, Info.PixelFormat, Info.PixelFormat, false ) ||
-          !VideoEncoding::VideoFrameDecoder( m_VideoPayload, Info, pVideo, m_pDecodeAllocator, m_pTemporaryAllocator,
-                                             nullptr ) )
-        return false;
-    }
-    if( i_bReadAudio )
-    {
-      o_rFrame.AudioFrameInfo = m_AudioFrameInfo;
-      o_rFrame.Audio = std::move( Audio );
-    }
-    if( i_bReadVideo )
-    {
-      o_rFrame.VideoFrameInfo = Info;
-      o_rFrame.Video = std::move( pVideo );
-    }
-    return true;
+    return VideoEncoding::ReadDecodedFrame( *this, i_FrameIndex, o_rFrame, i_bReadVideo, i_bReadAudio,
+                                            m_pDecodeAllocator, m_pTemporaryAllocator, nullptr );
   }
 } // namespace MkvIO

@@ -201,28 +201,9 @@ namespace MovIO
   bool VMovReader::ReadFrame( std::uint64_t i_FrameIndex, ZOL::IVideoFrame& o_rFrame, bool i_bReadVideo,
                               bool i_bReadAudio )
   {
-    std::shared_ptr< ZOL::IBuffer > pVideo;
-    ZOL::IAudioBuffers Audio;
-    if( !ReadFrameData( i_FrameIndex, pVideo, Audio, i_bReadVideo, i_bReadAudio ) )
-      return false;
-    if( i_bReadAudio )
-    {
-      o_rFrame.AudioFrameInfo = m_AudioFrameInfo;
-      o_rFrame.Audio = std::move( Audio );
-    }
-    if( !i_bReadVideo )
-      return true;
-    ZOL::IVideoFrameInfo Info = m_VideoFrameInfo;
-    ZOL::EPixelFormat Decoded = Info.PixelFormat;
-    if( !VideoEncoding::PixelFormatForPayloadFormat( m_VideoPayload, Info.PixelFormat, Decoded, false ) )
-      return false;
-    Info.PixelFormat = Decoded;
-    // The reader has no H.264 decoder of its own: that lives with the video source, which
-    // keeps its reference pictures from frame to frame.
-    const bool bDecoded = VideoEncoding::VideoFrameDecoder( m_VideoPayload, Info, pVideo, m_pFrameAllocator,
-                                                            m_pCompressedAllocator, nullptr );
-    o_rFrame.VideoFrameInfo = Info;
-    o_rFrame.Video = std::move( pVideo );
-    return bDecoded;
+    // The reader has no H.264 decoder of its own: that lives with the video source, which keeps
+    // its reference pictures from frame to frame.
+    return VideoEncoding::ReadDecodedFrame( *this, i_FrameIndex, o_rFrame, i_bReadVideo, i_bReadAudio,
+                                            m_pFrameAllocator, m_pCompressedAllocator, nullptr );
   }
 } // namespace MovIO

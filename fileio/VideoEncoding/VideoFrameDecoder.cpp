@@ -196,4 +196,35 @@ namespace VideoEncoding
     io_rBuffer = std::move( pOutput );
     return bResult;
   }
+
+  bool ReadDecodedFrame( ZOL::IVideoReader& io_rReader, std::uint64_t i_FrameIndex, ZOL::IVideoFrame& o_rFrame,
+                         bool i_bReadVideo, bool i_bReadAudio,
+                         const std::shared_ptr< ZOL::IBufferAllocator >& i_rAllocator,
+                         const std::shared_ptr< ZOL::IBufferAllocator >& i_rTemporaryAllocator,
+                         const std::shared_ptr< ZOL::IH264Decoder >& i_rH264Decoder )
+  {
+    std::shared_ptr< ZOL::IBuffer > pVideo;
+    ZOL::IAudioBuffers Audio;
+    if( !io_rReader.ReadFrameData( i_FrameIndex, pVideo, Audio, i_bReadVideo, i_bReadAudio ) )
+      return false;
+    ZOL::IVideoFrameInfo Info = io_rReader.GetVideoFrameInfo();
+    if( i_bReadVideo )
+    {
+      const ZOL::EVideoPayload Payload = io_rReader.GetVideoPayload();
+      if( !PixelFormatForPayloadFormat( Payload, Info.PixelFormat, Info.PixelFormat, false ) ||
+          !VideoFrameDecoder( Payload, Info, pVideo, i_rAllocator, i_rTemporaryAllocator, i_rH264Decoder ) )
+        return false;
+    }
+    if( i_bReadAudio )
+    {
+      o_rFrame.AudioFrameInfo = io_rReader.GetAudioFrameInfo();
+      o_rFrame.Audio = std::move( Audio );
+    }
+    if( i_bReadVideo )
+    {
+      o_rFrame.VideoFrameInfo = Info;
+      o_rFrame.Video = std::move( pVideo );
+    }
+    return true;
+  }
 } // namespace VideoEncoding

@@ -6,6 +6,7 @@
 #include "fileio/VideoEncoding/IH264Decoder.h"
 #include "videointerface/IBuffer.h"
 #include "videointerface/IVideoFrameInfo.h"
+#include "videointerface/IVideoReader.h"
 
 #include <cstdint>
 #include <memory>
@@ -21,6 +22,14 @@ namespace VideoEncoding
                                         const std::shared_ptr< ZOL::IBufferAllocator >& i_rAllocator,
                                         const std::shared_ptr< ZOL::IBufferAllocator >& i_rTemporaryAllocator,
                                         const std::shared_ptr< ZOL::IH264Decoder >& i_rH264Decoder );
+
+  // A reader's ReadFrame with decoding: its stored payload and audio, then the payload turned
+  // into pixels. On failure the frame is left as it was.
+  [[nodiscard]] bool ReadDecodedFrame( ZOL::IVideoReader& io_rReader, std::uint64_t i_FrameIndex,
+                                       ZOL::IVideoFrame& o_rFrame, bool i_bReadVideo, bool i_bReadAudio,
+                                       const std::shared_ptr< ZOL::IBufferAllocator >& i_rAllocator,
+                                       const std::shared_ptr< ZOL::IBufferAllocator >& i_rTemporaryAllocator,
+                                       const std::shared_ptr< ZOL::IH264Decoder >& i_rH264Decoder );
 
   // The pixel format that decoded frames of a payload will have, given the format stored in
   // the file. False, with a log line and o_rPixelFormat untouched, for an unknown payload.
