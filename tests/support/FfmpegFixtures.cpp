@@ -125,4 +125,32 @@ namespace LumekTest
   {
     return RunCommand( "ffprobe -v error" + JoinQuoted( i_rArguments ) + " " + ShellQuote( i_rPath ) );
   }
+
+  void ExpectSameToolFrames( const std::string& i_rTool, const std::string& i_rFirst, const std::string& i_rSecond,
+                             int i_Count )
+  {
+    const fs::path Folder = fs::temp_directory_path() / ( "toolframes-" + std::to_string( ::getpid() ) );
+    const fs::path Folders[] = { Folder / "first", Folder / "second" };
+    const std::string* Inputs[] = { &i_rFirst, &i_rSecond };
+    for( int i = 0; i < 2; ++i )
+    {
+      fs::create_directories( Folders[i] );
+      int ExitCode = -1;
+      const std::string Out = RunCommand( i_rTool + " frames " + ShellQuote( *Inputs[i] ) + " " +
+                                              ShellQuote( Folders[i].string() ) + " 2>&1",
+                                          &ExitCode );
+      ASSERT_EQ( ExitCode, 0 ) << Out;
+    }
+    int Compared = 0;
+    for( fs::directory_iterator It( Folders[0] ), End; It != End; ++It, ++Compared )
+    {
+      const std::string Name = It->path().filename().string();
+      const std::string Same = RunCommand( "cmp -s " + ShellQuote( It->path().string() ) + " " +
+                                           ShellQuote( ( Folders[1] / Name ).string() ) + " && echo same" );
+      EXPECT_EQ( Same, "same\n" ) << Name;
+    }
+    EXPECT_EQ( Compared, i_Count );
+    std::error_code Error;
+    fs::remove_all( Folder, Error );
+  }
 } // namespace LumekTest

@@ -28,6 +28,11 @@ namespace LumekTest
   // Runs a command line through the shell and returns its standard output.
   std::string RunCommand( const std::string& i_rCommandLine, int* o_pExitCode = nullptr );
 
+  // Runs "TOOL frames" on both files and checks that they give the same pictures, byte for byte,
+  // and that there are i_Count of them.
+  void ExpectSameToolFrames( const std::string& i_rTool, const std::string& i_rFirst, const std::string& i_rSecond,
+                             int i_Count );
+
   // A word quoted for the shell.
   std::string ShellQuote( const std::string& i_rWord );
 } // namespace LumekTest

@@ -69,8 +69,7 @@ namespace
     ASSERT_FALSE( Path.empty() );
     const boost::filesystem::path Folder =
         boost::filesystem::temp_directory_path() / boost::filesystem::unique_path( "movtool-%%%%%%%%" );
-    boost::filesystem::create_directories( Folder / "mov" );
-    boost::filesystem::create_directories( Folder / "lvid" );
+    boost::filesystem::create_directories( Folder );
     const std::string Output = ( Folder / "converted.lvid" ).string();
     int ExitCode = -1;
     std::string Out =
@@ -84,25 +83,7 @@ namespace
       EXPECT_EQ( InfoOf( Output, f ), InfoOf( Path, f ) ) << "frame " << f;
 
     // The pictures, as the tool draws them from each file.
-    for( const char* pName : { "mov", "lvid" } )
-    {
-      const std::string Input = std::string( pName ) == "mov" ? Path : Output;
-      Out =
-          Tool( "frames " + LumekTest::ShellQuote( Input ) + " " + LumekTest::ShellQuote( ( Folder / pName ).string() ),
-                ExitCode );
-      ASSERT_EQ( ExitCode, 0 ) << Out;
-    }
-    int Compared = 0;
-    for( boost::filesystem::directory_iterator It( Folder / "mov" ), End; It != End; ++It, ++Compared )
-    {
-      const std::string Name = It->path().filename().string();
-      const std::string Same =
-          LumekTest::RunCommand( "cmp -s " + LumekTest::ShellQuote( It->path().string() ) + " " +
-                                     LumekTest::ShellQuote( ( Folder / "lvid" / Name ).string() ) + " && echo same",
-                                 &ExitCode );
-      EXPECT_EQ( Same, "same\n" ) << Name;
-    }
-    EXPECT_EQ( Compared, 10 );
+    LumekTest::ExpectSameToolFrames( LUMEK_TOOL_PATH, Path, Output, 10 );
     boost::filesystem::remove_all( Folder );
   }
 
