@@ -30,61 +30,53 @@ namespace
     return ExitCode == 0;
   }
 
-  std::string ReadText( const fs::path& i_rPath )
+  // Runs a shell command; its output, with the exit code checked to be 0.
+  std::string MustRun( const std::string& i_rCommand )
   {
-    std::ifstream File( i_rPath.string() );
-    std::stringstream Text;
-    Text << File.rdbuf();
-    return Text.str();
+    int ExitCode = -1;
+    const std::string Out = RunCommand( i_rCommand + " 2>&1", &ExitCode );
+    EXPECT_EQ( ExitCode, 0 ) << i_rCommand << "\n" << Out;
+    return Out;
   }
 
-  // A fresh `cmake --install` of the build into a folder of its own.
+  // One `cmake --install` of the build into a folder of its own, shared by the tests of a
+  // program run; the tests only read it and write beside it.
   class InstalledTree : public ::testing::Test
   {
   protected:
-    void SetUp() override
+    static void SetUpTestSuite()
     {
-      m_Root = fs::temp_directory_path() / fs::unique_path( "lumek-install-%%%%%%%%" );
-      fs::create_directories( m_Root );
-      int ExitCode = -1;
-      const std::string Out = RunCommand( "cmake --install " + ShellQuote( LUMEK_BUILD_DIR ) + " --prefix " +
-                                              ShellQuote( Prefix().string() ) + " 2>&1",
-                                          &ExitCode );
-      ASSERT_EQ( ExitCode, 0 ) << Out;
-    }
-    void TearDown() override
-    {
-      boost::system::error_code Error;
-      fs::remove_all( m_Root, Error );
-    }
-    fs::path Prefix() const { return m_Root / "prefix"; }
-    fs::path Share() const { return Prefix() / "share"; }
-    fs::path Scratch( const std::string& i_rName ) const { return m_Root / i_rName; }
-
-    std::set< std::string > InstalledFiles() const
-    {
-      std::set< std::string > Files;
+      s_Root = fs::temp_directory_path() / fs::unique_path( "lumek-install-%%%%%%%%" );
+      fs::create_directories( s_Root );
+      MustRun( "cmake --install " + ShellQuote( LUMEK_BUILD_DIR ) + " --prefix " + ShellQuote( Prefix().string() ) );
       for( fs::recursive_directory_iterator It( Prefix() ), End; It != End; ++It )
         if( !fs::is_directory( It->path() ) )
-          Files.insert( fs::relative( It->path(), Prefix() ).string() );
-      return Files;
+          s_Installed.insert( fs::relative( It->path(), Prefix() ).string() );
     }
+    static void TearDownTestSuite()
+    {
+      boost::system::error_code Error;
+      fs::remove_all( s_Root, Error );
+    }
+    static fs::path Prefix() { return s_Root / "prefix"; }
+    static fs::path Share() { return Prefix() / "share"; }
+    static fs::path Scratch( const std::string& i_rName ) { return s_Root / i_rName; }
 
     // A small .lvid recording written by the installed tool.
-    std::string WriteRecording( const std::string& i_rName ) const
+    static std::string WriteRecording( const std::string& i_rName )
     {
       const std::string Path = Scratch( i_rName ).string();
-      int ExitCode = -1;
-      const std::string Out = RunCommand( ShellQuote( ( Prefix() / "bin/lumekvideotool" ).string() ) + " make-sample " +
-                                              ShellQuote( Path ) + " --width 64 --height 48 --frames 2 --no-audio 2>&1",
-                                          &ExitCode );
-      EXPECT_EQ( ExitCode, 0 ) << Out;
+      MustRun( ShellQuote( ( Prefix() / "bin/lumekvideotool" ).string() ) + " make-sample " + ShellQuote( Path ) +
+               " --width 64 --height 48 --frames 2 --no-audio" );
       return Path;
     }
 
-  private:
-    fs::path m_Root;
+    static fs::path s_Root;
+    // What the install wrote, before the file type database is built inside it.
+    static std::set< std::string > s_Installed;
   };
+  fs::path InstalledTree::s_Root;
+  std::set< std::string > InstalledTree::s_Installed;
 } // namespace
 
 TEST_F( InstalledTree, HoldsExactlyTheProgramsAndTheDesktopFiles )
@@ -103,13 +95,15 @@ TEST_F( InstalledTree, HoldsExactlyTheProgramsAndTheDesktopFiles )
   for( int Size : s_IconSizes )
     Expected.insert( "share/icons/hicolor/" + std::to_string( Size ) + "x" + std::to_string( Size ) + "/apps/" +
                      s_AppId + ".png" );
-  EXPECT_EQ( InstalledFiles(), Expected );
+  EXPECT_EQ( s_Installed, Expected );
 
   for( int Size : s_IconSizes )
   {
-    const fs::path Icon = Share() / "icons/hicolor" / ( std::to_string( Size ) + "x" + std::to_string( Size ) ) /
-                          "apps" / ( s_AppId + ".png" );
-    const QImage Image( QString::fromStdString( Icon.string() ) );
+    const std::string Icon =
+        ( Prefix() / "share/icons/hicolor" / ( std::to_string( Size ) + "x" + std::to_string( Size ) ) / "apps" /
+          ( s_AppId + ".png" ) )
+            .string();
+    const QImage Image( QString::fromStdString( Icon ) );
     EXPECT_EQ( Image.size(), QSize( Size, Size ) ) << Icon;
     // A rendered icon, not an empty canvas: its middle is opaque.
     EXPECT_EQ( qAlpha( Image.pixel( Size / 2, Size / 2 ) ), 255 ) << Icon;
@@ -122,130 +116,91 @@ TEST_F( InstalledTree, ManPagesRenderAndCarryTheUsage )
 {
   if( !Have( "man" ) )
     GTEST_SKIP() << "man is not installed";
-  const fs::path Pages = Share() / "man/man1";
-  int ExitCode = -1;
-  const std::string Tool = RunCommand( "MANWIDTH=100 man --warnings -l " +
-                                           ShellQuote( ( Pages / "lumekvideotool.1.gz" ).string() ) + " 2>&1",
-                                       &ExitCode );
-  EXPECT_EQ( ExitCode, 0 ) << Tool;
+  const auto Render = []( const char* i_pPage )
+  { return MustRun( "MANWIDTH=100 man --warnings -l " + ShellQuote( ( Share() / "man/man1" / i_pPage ).string() ) ); };
+  const std::string Tool = Render( "lumekvideotool.1.gz" );
+  const std::string Viewer = Render( "lumekvideoviewer.1.gz" );
   // Every command of the usage text, option dashes and all, survives roff.
   for( const char* pText : { "thumbnail INPUT OUTPUT.png [--size N]", "info FILE [--frame N] [--compact | --pretty]",
                              "make-sample OUTPUT.lvid", "Exit codes:" } )
     EXPECT_NE( Tool.find( pText ), std::string::npos ) << pText << "\n" << Tool;
-  EXPECT_EQ( Tool.find( "warning" ), std::string::npos ) << Tool;
-
-  const std::string Viewer = RunCommand( "MANWIDTH=100 man --warnings -l " +
-                                             ShellQuote( ( Pages / "lumekvideoviewer.1.gz" ).string() ) + " 2>&1",
-                                         &ExitCode );
-  EXPECT_EQ( ExitCode, 0 ) << Viewer;
   EXPECT_NE( Viewer.find( "--version-server URL" ), std::string::npos ) << Viewer;
-  EXPECT_EQ( Viewer.find( "warning" ), std::string::npos ) << Viewer;
+  for( const std::string* pPage : { &Tool, &Viewer } )
+    EXPECT_EQ( pPage->find( "warning" ), std::string::npos ) << *pPage;
 }
 
-struct VValidator
+TEST_F( InstalledTree, DebianValidatorsAcceptTheDesktopFiles )
 {
-  const char* Name;
-  const char* Program;
-  std::string Command; // run with the installed tree's share folder as $SHARE
-};
-
-// Test names and failure messages show the case's name, not its bytes.
-void PrintTo( const VValidator& i_rValidator, std::ostream* o_pOut )
-{
-  *o_pOut << i_rValidator.Name;
+  const struct
+  {
+    const char* Program;
+    std::string Command; // run with the installed tree's share folder as $SHARE
+  } Validators[] = {
+      { "desktop-file-validate", "desktop-file-validate \"$SHARE/applications/" + s_AppId + ".desktop\"" },
+      { "appstreamcli", "appstreamcli validate --no-net --pedantic \"$SHARE/metainfo/" + s_AppId + ".metainfo.xml\"" },
+      { "xmllint", "xmllint --noout --relaxng " + ShellQuote( LUMEK_MIME_SCHEMA ) + " \"$SHARE/mime/packages/" +
+                       s_AppId + ".xml\"" },
+      { "update-mime-database", "XDG_DATA_DIRS=\"$SHARE\" update-mime-database \"$SHARE/mime\"" },
+  };
+  std::string Missing;
+  for( const auto& rValidator : Validators )
+  {
+    SCOPED_TRACE( rValidator.Program );
+    if( !Have( rValidator.Program ) )
+    {
+      Missing += std::string( " " ) + rValidator.Program;
+      continue;
+    }
+    const std::string Out = MustRun( "SHARE=" + ShellQuote( Share().string() ) + "; " + rValidator.Command );
+    // Some validators answer warnings and hints with exit code 0; they are faults here too.
+    const std::string Lower = boost::to_lower_copy( Out );
+    for( const char* pWord : { "error", "warning", "unknown", "invalid" } )
+      EXPECT_EQ( Lower.find( pWord ), std::string::npos ) << Out;
+  }
+  if( !Missing.empty() )
+    GTEST_SKIP() << "not installed (scripts/install-deps.sh installs them):" << Missing;
 }
 
-class InstalledFileValidator : public InstalledTree, public ::testing::WithParamInterface< VValidator >
+TEST_F( InstalledTree, FileTypesAreNamedByTheDatabase )
 {
-};
-
-TEST_P( InstalledFileValidator, Accepts )
-{
-  const VValidator& rValidator = GetParam();
-  if( !Have( rValidator.Program ) )
-    GTEST_SKIP() << rValidator.Program << " is not installed (scripts/install-deps.sh installs it)";
-  int ExitCode = -1;
-  const std::string Out =
-      RunCommand( "SHARE=" + ShellQuote( Share().string() ) + "; " + rValidator.Command + " 2>&1", &ExitCode );
-  EXPECT_EQ( ExitCode, 0 ) << Out;
-  // Some validators answer warnings and hints with exit code 0; they are faults here too.
-  const std::string Lower = boost::to_lower_copy( Out );
-  for( const char* pWord : { "error", "warning", "unknown", "invalid" } )
-    EXPECT_EQ( Lower.find( pWord ), std::string::npos ) << Out;
-}
-
-INSTANTIATE_TEST_SUITE_P(
-    Debian, InstalledFileValidator,
-    ::testing::Values( VValidator{ "DesktopEntry", "desktop-file-validate",
-                                   "desktop-file-validate \"$SHARE/applications/" + s_AppId + ".desktop\"" },
-                       VValidator{ "AppStream", "appstreamcli",
-                                   "appstreamcli validate --no-net --pedantic \"$SHARE/metainfo/" + s_AppId +
-                                       ".metainfo.xml\"" },
-                       VValidator{ "MimePackage", "xmllint",
-                                   "xmllint --noout --relaxng " + ShellQuote( LUMEK_MIME_SCHEMA ) +
-                                       " \"$SHARE/mime/packages/" + s_AppId + ".xml\"" },
-                       VValidator{ "MimeDatabase", "update-mime-database",
-                                   "XDG_DATA_DIRS=\"$SHARE\" update-mime-database \"$SHARE/mime\"" } ),
-    []( const ::testing::TestParamInfo< VValidator >& i_rInfo ) { return std::string( i_rInfo.param.Name ); } );
-
-struct VFileTypeCase
-{
-  const char* Name;
-  const char* FileName;
-  bool bRecording; // a real recording, or a few bytes of text
-  const char* Expected;
-};
-
-void PrintTo( const VFileTypeCase& i_rCase, std::ostream* o_pOut )
-{
-  *o_pOut << i_rCase.Name;
-}
-
-class InstalledFileType : public InstalledTree, public ::testing::WithParamInterface< VFileTypeCase >
-{
-};
-
-TEST_P( InstalledFileType, IsNamedByTheDatabase )
-{
-  const VFileTypeCase& rCase = GetParam();
   // xdg-mime asks GLib under GNOME; its generic path falls back to file(1), which knows no new types.
   if( !Have( "update-mime-database" ) || !Have( "xdg-mime" ) || !Have( "gio" ) )
     GTEST_SKIP() << "update-mime-database, xdg-mime and gio are needed (scripts/install-deps.sh installs them)";
-  int ExitCode = -1;
-  const std::string Update =
-      RunCommand( "update-mime-database " + ShellQuote( ( Share() / "mime" ).string() ) + " 2>&1", &ExitCode );
-  ASSERT_EQ( ExitCode, 0 ) << Update;
-
-  std::string Path = Scratch( rCase.FileName ).string();
-  if( rCase.bRecording )
-    fs::rename( WriteRecording( "made.lvid" ), Path );
-  else
-    std::ofstream( Path ) << "frames/take_%06d.png\n";
+  MustRun( "update-mime-database " + ShellQuote( ( Share() / "mime" ).string() ) );
   fs::create_directories( Scratch( "home" ) );
-  const std::string Type =
-      RunCommand( "XDG_CURRENT_DESKTOP=GNOME XDG_DATA_HOME=" + ShellQuote( Scratch( "home" ).string() ) +
-                      " XDG_DATA_DIRS=" + ShellQuote( Share().string() ) + " xdg-mime query filetype " +
-                      ShellQuote( Path ) + " 2>/dev/null",
-                  &ExitCode );
-  EXPECT_EQ( ExitCode, 0 );
-  EXPECT_EQ( boost::trim_copy( Type ), rCase.Expected );
+  const std::string Recording = WriteRecording( "made.lvid" );
+  const struct
+  {
+    const char* FileName;
+    bool bRecording; // a real recording, or a few bytes of text
+    const char* Expected;
+  } Cases[] = {
+      { "take.lvid", true, "video/x-lumek-lvid" },
+      // The contents name a recording whatever it is called.
+      { "take", true, "video/x-lumek-lvid" },
+      { "take.bin", true, "video/x-lumek-lvid" },
+      { "take.lumekimagesequence", false, "application/x-lumek-imagesequence" },
+  };
+  for( const auto& rCase : Cases )
+  {
+    SCOPED_TRACE( rCase.FileName );
+    const std::string Path = Scratch( rCase.FileName ).string();
+    if( rCase.bRecording )
+      fs::copy_file( Recording, Path, fs::copy_option::overwrite_if_exists );
+    else
+      std::ofstream( Path ) << "frames/take_%06d.png\n";
+    const std::string Type = MustRun(
+        "XDG_CURRENT_DESKTOP=GNOME XDG_DATA_HOME=" + ShellQuote( Scratch( "home" ).string() ) +
+        " XDG_DATA_DIRS=" + ShellQuote( Share().string() ) + " xdg-mime query filetype " + ShellQuote( Path ) );
+    EXPECT_EQ( boost::trim_copy( Type ), rCase.Expected );
+  }
 }
-
-INSTANTIATE_TEST_SUITE_P(
-    Files, InstalledFileType,
-    ::testing::Values( VFileTypeCase{ "Recording", "take.lvid", true, "video/x-lumek-lvid" },
-                       VFileTypeCase{ "RecordingWithoutExtension", "take", true, "video/x-lumek-lvid" },
-                       VFileTypeCase{ "RecordingWithAnotherExtension", "take.bin", true, "video/x-lumek-lvid" },
-                       VFileTypeCase{ "ImageSequence", "take.lumekimagesequence", false,
-                                      "application/x-lumek-imagesequence" } ),
-    []( const ::testing::TestParamInfo< VFileTypeCase >& i_rInfo ) { return std::string( i_rInfo.param.Name ); } );
 
 TEST_F( InstalledTree, ThumbnailerCommandRunsAsWritten )
 {
-  const std::string Entry = ReadText( Share() / "thumbnailers/lumekvideotool.thumbnailer" );
+  std::ifstream File( ( Share() / "thumbnailers/lumekvideotool.thumbnailer" ).string() );
   std::string Exec, MimeTypes;
-  std::istringstream Lines( Entry );
-  for( std::string Line; std::getline( Lines, Line ); )
+  for( std::string Line; std::getline( File, Line ); )
   {
     if( boost::starts_with( Line, "Exec=" ) )
       Exec = Line.substr( 5 );
@@ -253,34 +208,27 @@ TEST_F( InstalledTree, ThumbnailerCommandRunsAsWritten )
       MimeTypes = Line.substr( 9 );
   }
   EXPECT_EQ( Exec, "lumekvideotool thumbnail %i %o --size %s" );
-  EXPECT_NE( MimeTypes.find( "video/x-lumek-lvid;" ), std::string::npos ) << Entry;
+  EXPECT_NE( MimeTypes.find( "video/x-lumek-lvid;" ), std::string::npos ) << MimeTypes;
 
   // As a thumbnail manager runs it: the program from PATH, the fields replaced by quoted words.
-  const std::string Input = WriteRecording( "a take with spaces.lvid" );
   const std::string Output = Scratch( "thumb nail.png" ).string();
   std::string Command = Exec;
-  boost::replace_all( Command, "%i", ShellQuote( Input ) );
+  boost::replace_all( Command, "%i", ShellQuote( WriteRecording( "a take with spaces.lvid" ) ) );
   boost::replace_all( Command, "%o", ShellQuote( Output ) );
   boost::replace_all( Command, "%s", "32" );
-  int ExitCode = -1;
-  const std::string Out = RunCommand(
-      "PATH=" + ShellQuote( ( Prefix() / "bin" ).string() ) + ":/usr/bin:/bin " + Command + " 2>&1", &ExitCode );
-  ASSERT_EQ( ExitCode, 0 ) << Command << "\n" << Out;
+  MustRun( "PATH=" + ShellQuote( ( Prefix() / "bin" ).string() ) + ":/usr/bin:/bin " + Command );
   EXPECT_EQ( QImage( QString::fromStdString( Output ) ).size(), QSize( 32, 24 ) );
 }
 
-TEST( DebianPackage, ControlAndContents )
+// The package holds what the install tree holds, under /usr, and nothing to build against.
+TEST_F( InstalledTree, DebianPackageControlAndContents )
 {
   if( !Have( "dpkg-deb" ) || !Have( "cpack" ) )
     GTEST_SKIP() << "dpkg-deb and cpack are needed";
   const fs::path Folder = fs::temp_directory_path() / fs::unique_path( "lumek-deb-%%%%%%%%" );
   fs::create_directories( Folder );
-  int ExitCode = -1;
-  const std::string Build =
-      RunCommand( "cd " + ShellQuote( Folder.string() ) + " && cpack -G DEB --config " +
-                      ShellQuote( std::string( LUMEK_BUILD_DIR ) + "/CPackConfig.cmake" ) + " 2>&1",
-                  &ExitCode );
-  ASSERT_EQ( ExitCode, 0 ) << Build;
+  const std::string Build = MustRun( "cd " + ShellQuote( Folder.string() ) + " && cpack -G DEB --config " +
+                                     ShellQuote( std::string( LUMEK_BUILD_DIR ) + "/CPackConfig.cmake" ) );
   fs::path Deb;
   for( fs::directory_iterator It( Folder ), End; It != End; ++It )
     if( It->path().extension() == ".deb" )
@@ -302,23 +250,13 @@ TEST( DebianPackage, ControlAndContents )
   std::vector< std::string > Packages;
   boost::split( Packages, Depends, boost::is_any_of( "," ) );
   for( std::string& rPackage : Packages )
-  {
-    boost::trim( rPackage );
-    RunCommand( "dpkg-query -W " + ShellQuote( rPackage ) + " >/dev/null 2>&1", &ExitCode );
-    EXPECT_EQ( ExitCode, 0 ) << rPackage << " is not an installed package";
-  }
+    MustRun( "dpkg-query -W " + ShellQuote( boost::trim_copy( rPackage ) ) + " >/dev/null" );
 
   const std::string Contents = RunCommand( "dpkg-deb -c " + ShellQuote( Deb.string() ) );
-  for( const std::string& rPath :
-       { std::string( "./usr/bin/lumekvideoviewer" ), std::string( "./usr/bin/lumekvideotool" ),
-         "./usr/share/applications/" + s_AppId + ".desktop", "./usr/share/mime/packages/" + s_AppId + ".xml",
-         std::string( "./usr/share/thumbnailers/lumekvideotool.thumbnailer" ),
-         "./usr/share/metainfo/" + s_AppId + ".metainfo.xml",
-         "./usr/share/icons/hicolor/256x256/apps/" + s_AppId + ".png",
-         std::string( "./usr/share/man/man1/lumekvideotool.1.gz" ) } )
-    EXPECT_NE( Contents.find( rPath + "\n" ), std::string::npos ) << rPath << "\n" << Contents;
-  EXPECT_EQ( Contents.find( "./usr/lib" ), std::string::npos ) << Contents;
-  EXPECT_EQ( Contents.find( "./usr/include" ), std::string::npos ) << Contents;
+  for( const std::string& rPath : s_Installed )
+    EXPECT_NE( Contents.find( "./usr/" + rPath + "\n" ), std::string::npos ) << rPath << "\n" << Contents;
+  for( const char* pFolder : { "./usr/lib", "./usr/include" } )
+    EXPECT_EQ( Contents.find( pFolder ), std::string::npos ) << Contents;
 
   boost::system::error_code Error;
   fs::remove_all( Folder, Error );
