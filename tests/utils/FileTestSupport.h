@@ -1,8 +1,7 @@
 #pragma once
 
-// Files and log lines for the file function tests.
+// Files and log lines for the file layer's tests.
 
-#include "services/ILogCategorised.h"
 #include "tests/support/LogCapture.h"
 
 #include <boost/filesystem.hpp>
@@ -44,10 +43,14 @@ namespace LumekTest
     return Bytes;
   }
 
+  inline void WriteText( const std::string& i_rPath, const std::string& i_rText )
+  {
+    std::ofstream( i_rPath, std::ios::binary | std::ios::trunc ) << i_rText;
+  }
+
   inline void WriteBytes( const std::string& i_rPath, const std::vector< std::uint8_t >& i_rBytes )
   {
-    std::ofstream File( i_rPath, std::ios::binary | std::ios::trunc );
-    File.write( reinterpret_cast< const char* >( i_rBytes.data() ), static_cast< std::streamsize >( i_rBytes.size() ) );
+    WriteText( i_rPath, std::string( i_rBytes.begin(), i_rBytes.end() ) );
   }
 
   inline std::string ReadText( const std::string& i_rPath )
@@ -55,11 +58,4 @@ namespace LumekTest
     std::ifstream File( i_rPath, std::ios::binary );
     return std::string( std::istreambuf_iterator< char >( File ), std::istreambuf_iterator< char >() );
   }
-
-  // What the "System" category logs up to a level, for the life of a test.
-  class VSystemLogCapture : public VLogCapture
-  {
-  public:
-    explicit VSystemLogCapture( int i_Level = ZOL::LogDetail ) : VLogCapture( "System", i_Level ) {}
-  };
 } // namespace LumekTest

@@ -1,56 +1,18 @@
-#include "tests/support/TestNames.h"
 #include "utils/UtilsIO/VLargeFile.h"
+
+#include "tests/utils/FileTestSupport.h"
 #include "videointerface/IVideoAttributes.h"
 
 #include <gtest/gtest.h>
 
-#include <cstdio>
-#include <cstdlib>
 #include <fcntl.h>
-#include <string>
 #include <unistd.h>
 
+using LumekTest::WriteText;
 using UtilsIO::VLargeFile;
 
 namespace
 {
-  // A folder of its own for each test, removed afterwards.
-  class VScratch
-  {
-  public:
-    VScratch()
-    {
-      std::string Template = testing::TempDir() + "lumek-largefile-XXXXXX";
-      if( mkdtemp( &Template[0] ) != nullptr )
-        m_Folder = Template;
-    }
-    ~VScratch()
-    {
-      for( const std::string& rPath : m_Files )
-        std::remove( rPath.c_str() );
-      if( !m_Folder.empty() )
-        rmdir( m_Folder.c_str() );
-    }
-    std::string File( const std::string& i_rName )
-    {
-      m_Files.push_back( m_Folder + "/" + i_rName );
-      return m_Files.back();
-    }
-    bool Ok() const { return !m_Folder.empty(); }
-
-  private:
-    std::string m_Folder;
-    std::vector< std::string > m_Files;
-  };
-
-  void WriteFile( const std::string& i_rPath, const std::string& i_rContent )
-  {
-    std::FILE* pFile = std::fopen( i_rPath.c_str(), "wb" );
-    ASSERT_NE( nullptr, pFile );
-    std::fwrite( i_rContent.data(), 1, i_rContent.size(), pFile );
-    std::fclose( pFile );
-  }
-
   std::string ReadAt( VLargeFile& io_rFile, std::int64_t i_Position, std::size_t i_Size )
   {
     std::string Text( i_Size, '\0' );
@@ -60,16 +22,10 @@ namespace
   }
 } // namespace
 
-class LargeFileTest : public testing::Test
+TEST( LargeFile, PositionsBeyondFourGigabytesOnASparseFile )
 {
-protected:
-  void SetUp() override { ASSERT_TRUE( m_Scratch.Ok() ); }
-  VScratch m_Scratch;
-};
-
-TEST_F( LargeFileTest, PositionsBeyondFourGigabytesOnASparseFile )
-{
-  const std::string Path = m_Scratch.File( "sparse.bin" );
+  const LumekTest::VTemporaryFolder Folder;
+  const std::string Path = Folder.File( "sparse.bin" );
   constexpr std::int64_t Size = 5ll << 30;
   constexpr std::int64_t Marker = ( 4ll << 30 ) + 12345;
   {
@@ -83,13 +39,12 @@ TEST_F( LargeFileTest, PositionsBeyondFourGigabytesOnASparseFile )
   VLargeFile File;
   ASSERT_TRUE( File.Open( Path, UtilsIO::OpenMode_ReadWrite ) );
   EXPECT_EQ( static_cast< std::uint64_t >( Size ), File.GetCachedSize() );
-  std::uint64_t Reported = 0;
-  EXPECT_TRUE( File.GetSize( Reported ) );
-  EXPECT_EQ( static_cast< std::uint64_t >( Size ), Reported );
+  std::uint64_t Value = 0;
+  EXPECT_TRUE( File.GetSize( Value ) );
+  EXPECT_EQ( static_cast< std::uint64_t >( Size ), Value );
   EXPECT_EQ( "MARKER", ReadAt( File, Marker, 6 ) );
-  std::uint64_t Position = 0;
-  EXPECT_TRUE( File.GetPosition( Position ) );
-  EXPECT_EQ( static_cast< std::uint64_t >( Marker + 6 ), Position );
+  EXPECT_TRUE( File.GetPosition( Value ) );
+  EXPECT_EQ( static_cast< std::uint64_t >( Marker + 6 ), Value );
 
   // Write past 4 GB through the class and read it back through the C library.
   ASSERT_TRUE( File.Seek( Size - 3 ) );
@@ -98,20 +53,20 @@ TEST_F( LargeFileTest, PositionsBeyondFourGigabytesOnASparseFile )
   ASSERT_TRUE( ZOL::Skip( File, -3 ) );
   char End[3] = {};
   ASSERT_TRUE( File.Read( End, 3 ) );
-  EXPECT_EQ( std::string( "END" ), std::string( End, 3 ) );
+  EXPECT_EQ( "END", std::string( End, 3 ) );
   EXPECT_TRUE( File.Close() );
 
   const int Descriptor = open( Path.c_str(), O_RDONLY );
-  char Check[3] = {};
-  EXPECT_EQ( 3, pread( Descriptor, Check, 3, Size - 3 ) );
+  EXPECT_EQ( 3, pread( Descriptor, End, 3, Size - 3 ) );
   close( Descriptor );
-  EXPECT_EQ( std::string( "END" ), std::string( Check, 3 ) );
+  EXPECT_EQ( "END", std::string( End, 3 ) );
 }
 
-TEST_F( LargeFileTest, AFailedReadStaysFailedUntilASeek )
+TEST( LargeFile, AFailedReadStaysFailedUntilASeek )
 {
-  const std::string Path = m_Scratch.File( "ten.bin" );
-  WriteFile( Path, "0123456789" );
+  const LumekTest::VTemporaryFolder Folder;
+  const std::string Path = Folder.File( "ten.bin" );
+  WriteText( Path, "0123456789" );
   VLargeFile File;
   ASSERT_TRUE( File.Open( Path, UtilsIO::OpenMode_Read ) );
   char Buffer[16] = {};
@@ -136,31 +91,30 @@ TEST_F( LargeFileTest, AFailedReadStaysFailedUntilASeek )
   EXPECT_TRUE( File.IsGood() );
 }
 
-TEST_F( LargeFileTest, CachedSizeIsTheSizeAtOpen )
+TEST( LargeFile, CachedSizeIsTheSizeAtOpen )
 {
-  const std::string Path = m_Scratch.File( "growing.bin" );
-  WriteFile( Path, "abc" );
+  const LumekTest::VTemporaryFolder Folder;
+  const std::string Path = Folder.File( "growing.bin" );
+  WriteText( Path, "abc" );
   VLargeFile File;
   ASSERT_TRUE( File.Open( Path, UtilsIO::OpenMode_Read ) );
   ASSERT_TRUE( File.Seek( 1 ) );
+  std::ofstream( Path, std::ios::binary | std::ios::app ) << "defgh";
 
-  std::FILE* pWriter = std::fopen( Path.c_str(), "ab" );
-  ASSERT_NE( nullptr, pWriter );
-  std::fputs( "defgh", pWriter );
-  std::fclose( pWriter );
-
-  std::uint64_t Size = 0;
-  EXPECT_TRUE( File.GetSize( Size ) );
-  EXPECT_EQ( 8u, Size );
+  std::uint64_t Value = 0;
+  EXPECT_TRUE( File.GetSize( Value ) );
+  EXPECT_EQ( 8u, Value );
   EXPECT_EQ( 3u, File.GetCachedSize() );
-  std::uint64_t Position = 0;
-  EXPECT_TRUE( File.GetPosition( Position ) );
-  EXPECT_EQ( 1u, Position ) << "GetSize leaves the position";
+  EXPECT_TRUE( File.GetPosition( Value ) );
+  EXPECT_EQ( 1u, Value ) << "GetSize leaves the position";
 }
 
-TEST_F( LargeFileTest, AttributeStoreThroughAFile )
+// The attribute store's bounded reader, on a real file: a key that claims 4 GB of a file that
+// holds 3 bytes more fails as a short read would, without allocating the claim.
+TEST( LargeFile, AttributeStoreThroughAFileAndALyingLength )
 {
-  const std::string Path = m_Scratch.File( "store.bin" );
+  const LumekTest::VTemporaryFolder Folder;
+  const std::string Path = Folder.File( "store.bin" );
   ZOL::IVideoAttributes Store;
   Store.Set( "VideoFrameInfo.PixelFormat", "BayerGB8" );
   Store.Set( "TicksPerSecond", 135000000u );
@@ -168,7 +122,6 @@ TEST_F( LargeFileTest, AttributeStoreThroughAFile )
     VLargeFile File;
     ASSERT_TRUE( File.Open( Path, UtilsIO::OpenMode_Create ) );
     ASSERT_TRUE( Store.WriteTo( File ) );
-    // A second store whose only key claims 4 GB of a file that holds 3 bytes more.
     ASSERT_TRUE( ZOL::WriteLE( File, 1u ) && ZOL::WriteLE( File, 0xFFFFFFF0u ) && File.Write( "abc", 3 ) );
   }
   VLargeFile File;
@@ -177,16 +130,16 @@ TEST_F( LargeFileTest, AttributeStoreThroughAFile )
   ASSERT_TRUE( Read.ReadFrom( File ) );
   EXPECT_TRUE( Read == Store );
   EXPECT_FALSE( Read.ReadFrom( File ) );
-  EXPECT_FALSE( File.IsGood() ) << "the lie fails the stream as a short read would";
+  EXPECT_FALSE( File.IsGood() );
   EXPECT_TRUE( File.IsAtEnd() );
 }
 
-TEST_F( LargeFileTest, OpenTwiceKeepsTheFirstFile )
+TEST( LargeFile, OpenTwiceKeepsTheFirstFileAndAClosedFileFailsEverything )
 {
-  const std::string First = m_Scratch.File( "first.bin" );
-  const std::string Second = m_Scratch.File( "second.bin" );
-  WriteFile( First, "first" );
-  WriteFile( Second, "second" );
+  const LumekTest::VTemporaryFolder Folder;
+  const std::string First = Folder.File( "first.bin" ), Second = Folder.File( "second.bin" );
+  WriteText( First, "first" );
+  WriteText( Second, "second" );
   VLargeFile File;
   ASSERT_TRUE( File.Open( First, UtilsIO::OpenMode_Read ) );
   EXPECT_FALSE( File.Open( Second, UtilsIO::OpenMode_Read ) );
@@ -194,13 +147,7 @@ TEST_F( LargeFileTest, OpenTwiceKeepsTheFirstFile )
   EXPECT_TRUE( File.Close() );
   EXPECT_FALSE( File.Close() );
   EXPECT_FALSE( File.IsOpen() );
-  ASSERT_TRUE( File.Open( Second, UtilsIO::OpenMode_Read ) );
-  EXPECT_EQ( "second", ReadAt( File, 0, 6 ) );
-}
 
-TEST_F( LargeFileTest, ClosedFileFailsEverything )
-{
-  VLargeFile File;
   char Byte = 0;
   std::uint64_t Value = 0;
   EXPECT_FALSE( File.Read( &Byte, 1 ) );
@@ -210,49 +157,41 @@ TEST_F( LargeFileTest, ClosedFileFailsEverything )
   EXPECT_FALSE( File.Seek( 0 ) );
   EXPECT_FALSE( File.SeekToEnd() );
   EXPECT_FALSE( File.IsAtEnd() );
-  EXPECT_FALSE( File.Open( m_Scratch.File( "missing.bin" ), UtilsIO::OpenMode_Read ) );
+  EXPECT_FALSE( File.Open( Folder.File( "missing.bin" ), UtilsIO::OpenMode_Read ) );
+  ASSERT_TRUE( File.Open( Second, UtilsIO::OpenMode_Read ) );
+  EXPECT_EQ( "second", ReadAt( File, 0, 6 ) );
 }
 
-struct VModeCase
+TEST( LargeFile, ModeDecidesAccess )
 {
-  const char* Name;
-  int Mode;
-  const char* Text;
-  bool Opens;       // on an existing file
-  bool Writes;      // a write there succeeds
-  bool Truncates;   // the old content is gone
-  bool CreatesFile; // opening a missing file creates it
-};
-
-class LargeFileModeTest : public testing::TestWithParam< VModeCase >
-{
-protected:
-  VScratch m_Scratch;
-};
-
-TEST_P( LargeFileModeTest, ModeDecidesAccess )
-{
-  EXPECT_STREQ( GetParam().Text, UtilsIO::OpenModeText( GetParam().Mode ) );
-  const std::string Path = m_Scratch.File( "mode.bin" );
-  WriteFile( Path, "old" );
+  const struct
   {
-    VLargeFile File;
-    ASSERT_EQ( GetParam().Opens, File.Open( Path, GetParam().Mode ) );
-    if( GetParam().Opens )
+    int Mode;
+    const char* Text;
+    bool Opens;       // on an existing file
+    bool Writes;      // a write there succeeds
+    bool Truncates;   // the old content is gone
+    bool CreatesFile; // opening a missing file creates it
+  } Cases[] = { { 0, "rb", true, false, false, false }, { 1, "r+b", true, true, false, false },
+                { 2, "w+b", true, true, true, true },   { 3, "wb", true, true, true, true },
+                { 4, "", false, false, false, false },  { -1, "", false, false, false, false } };
+  for( const auto& rCase : Cases )
+  {
+    SCOPED_TRACE( rCase.Mode );
+    EXPECT_STREQ( rCase.Text, UtilsIO::OpenModeText( rCase.Mode ) );
+    const LumekTest::VTemporaryFolder Folder;
+    const std::string Path = Folder.File( "mode.bin" );
+    WriteText( Path, "old" );
     {
-      EXPECT_EQ( GetParam().Truncates ? 0u : 3u, File.GetCachedSize() );
-      EXPECT_EQ( GetParam().Writes, File.Write( "new", 3 ) );
+      VLargeFile File;
+      ASSERT_EQ( rCase.Opens, File.Open( Path, rCase.Mode ) );
+      if( rCase.Opens )
+      {
+        EXPECT_EQ( rCase.Truncates ? 0u : 3u, File.GetCachedSize() );
+        EXPECT_EQ( rCase.Writes, File.Write( "new", 3 ) );
+      }
     }
+    VLargeFile Missing;
+    EXPECT_EQ( rCase.CreatesFile, Missing.Open( Folder.File( "created.bin" ), rCase.Mode ) );
   }
-  VLargeFile Missing;
-  EXPECT_EQ( GetParam().CreatesFile, Missing.Open( m_Scratch.File( "created.bin" ), GetParam().Mode ) );
 }
-
-INSTANTIATE_TEST_SUITE_P( Modes, LargeFileModeTest,
-                          testing::Values( VModeCase{ "Read", 0, "rb", true, false, false, false },
-                                           VModeCase{ "ReadWrite", 1, "r+b", true, true, false, false },
-                                           VModeCase{ "Create", 2, "w+b", true, true, true, true },
-                                           VModeCase{ "Write", 3, "wb", true, true, true, true },
-                                           VModeCase{ "Unknown", 4, "", false, false, false, false },
-                                           VModeCase{ "Negative", -1, "", false, false, false, false } ),
-                          LumekTest::VCaseName() );

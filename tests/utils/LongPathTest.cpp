@@ -1,50 +1,36 @@
 #include "utils/UtilsFileSystem/LongPath.h"
-#include "tests/support/TestNames.h"
 
 #include <gtest/gtest.h>
 
 using UtilsFileSystem::MakeLongPath;
 
-namespace
+TEST( LongPath, NarrowAndWideFormsAgreeAndASecondConversionChangesNothing )
 {
-  struct VPathCase
+  const struct
   {
-    const char* Name;
     const char* Path;
     const char* Long;
-  };
-
-  std::wstring Wide( const std::string& i_rText )
+  } Cases[] = { { "C:\\data\\clip.lvid", "\\\\?\\C:\\data\\clip.lvid" },
+                { "d:/data/clip.lvid", "\\\\?\\d:\\data\\clip.lvid" },
+                { "C:\\", "\\\\?\\C:\\" },
+                { "C:clip.lvid", "C:clip.lvid" }, // relative to the drive's current folder
+                { "C:", "C:" },
+                { "1:\\clip", "1:\\clip" }, // not a drive letter
+                { "\\\\host\\share\\x", "\\\\?\\UNC\\host\\share\\x" },
+                { "//host/share/x", "\\\\?\\UNC\\host\\share\\x" },
+                { "\\\\?\\C:\\x", "\\\\?\\C:\\x" },
+                { "\\\\?\\UNC\\host\\x", "\\\\?\\UNC\\host\\x" },
+                { "\\\\", "\\\\?\\UNC\\" },
+                { "data/clip.lvid", "data\\clip.lvid" },
+                { "/data/clip.lvid", "\\data\\clip.lvid" }, // a POSIX absolute path is not absolute there
+                { "/", "\\" },
+                { "", "" } };
+  for( const auto& rCase : Cases )
   {
-    return std::wstring( i_rText.begin(), i_rText.end() );
+    SCOPED_TRACE( rCase.Path );
+    const std::string Path = rCase.Path, Long = rCase.Long;
+    EXPECT_EQ( Long, MakeLongPath( Path ) );
+    EXPECT_EQ( std::wstring( Long.begin(), Long.end() ), MakeLongPath( std::wstring( Path.begin(), Path.end() ) ) );
+    EXPECT_EQ( Long, MakeLongPath( MakeLongPath( Path ) ) );
   }
-} // namespace
-
-class LongPathTest : public testing::TestWithParam< VPathCase >
-{
-};
-
-TEST_P( LongPathTest, NarrowAndWideFormsAgree )
-{
-  EXPECT_EQ( GetParam().Long, MakeLongPath( std::string( GetParam().Path ) ) );
-  EXPECT_EQ( Wide( GetParam().Long ), MakeLongPath( Wide( GetParam().Path ) ) );
-  // Converting twice changes nothing more.
-  EXPECT_EQ( GetParam().Long, MakeLongPath( MakeLongPath( std::string( GetParam().Path ) ) ) );
 }
-
-INSTANTIATE_TEST_SUITE_P(
-    Paths, LongPathTest,
-    testing::Values( VPathCase{ "Drive", "C:\\data\\clip.lvid", "\\\\?\\C:\\data\\clip.lvid" },
-                     VPathCase{ "DriveWithSlashes", "d:/data/clip.lvid", "\\\\?\\d:\\data\\clip.lvid" },
-                     VPathCase{ "DriveRoot", "C:\\", "\\\\?\\C:\\" },
-                     VPathCase{ "DriveRelative", "C:clip.lvid", "C:clip.lvid" }, VPathCase{ "DriveAlone", "C:", "C:" },
-                     VPathCase{ "NotADriveLetter", "1:\\clip", "1:\\clip" },
-                     VPathCase{ "Network", "\\\\host\\share\\x", "\\\\?\\UNC\\host\\share\\x" },
-                     VPathCase{ "NetworkWithSlashes", "//host/share/x", "\\\\?\\UNC\\host\\share\\x" },
-                     VPathCase{ "AlreadyLong", "\\\\?\\C:\\x", "\\\\?\\C:\\x" },
-                     VPathCase{ "AlreadyLongNetwork", "\\\\?\\UNC\\host\\x", "\\\\?\\UNC\\host\\x" },
-                     VPathCase{ "TwoBackslashesOnly", "\\\\", "\\\\?\\UNC\\" },
-                     VPathCase{ "Relative", "data/clip.lvid", "data\\clip.lvid" },
-                     VPathCase{ "PosixAbsoluteIsNotAbsoluteHere", "/data/clip.lvid", "\\data\\clip.lvid" },
-                     VPathCase{ "OneCharacter", "/", "\\" }, VPathCase{ "Empty", "", "" } ),
-    LumekTest::VCaseName() );

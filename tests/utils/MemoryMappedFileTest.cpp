@@ -18,103 +18,97 @@ namespace
 {
   const std::uint64_t s_Page = static_cast< std::uint64_t >( ::sysconf( _SC_PAGESIZE ) );
 
-  std::vector< std::uint8_t > Slice( const std::vector< std::uint8_t >& i_rBytes, std::uint64_t i_Offset,
-                                     std::uint64_t i_Size )
+  // One file of pattern bytes in a folder of its own.
+  class MappedFileTest : public testing::Test
   {
-    return std::vector< std::uint8_t >( i_rBytes.begin() + static_cast< std::ptrdiff_t >( i_Offset ),
-                                        i_rBytes.begin() + static_cast< std::ptrdiff_t >( i_Offset + i_Size ) );
-  }
+  protected:
+    void MakeFile( std::uint64_t i_Size )
+    {
+      m_Bytes = LumekTest::PatternBytes( i_Size );
+      LumekTest::WriteBytes( m_Path, m_Bytes );
+    }
+    std::vector< std::uint8_t > Slice( std::uint64_t i_Offset, std::uint64_t i_Size ) const
+    {
+      const auto Begin = m_Bytes.begin() + static_cast< std::ptrdiff_t >( i_Offset );
+      return std::vector< std::uint8_t >( Begin, Begin + static_cast< std::ptrdiff_t >( i_Size ) );
+    }
+    static bool ReadAt( VMemoryMappedInputStream& io_rStream, std::uint64_t i_Offset,
+                        std::vector< std::uint8_t >& o_rBytes )
+    {
+      return io_rStream.Seek( static_cast< std::int64_t >( i_Offset ) ) &&
+             io_rStream.Read( o_rBytes.data(), o_rBytes.size() );
+    }
 
-  // A read of a range, in pages of the system's size: where it starts, how long it is, and how many
-  // windows it must map when nothing is mapped yet.
-  struct VRangeCase
-  {
-    const char* Name;
-    std::uint64_t OffsetInPages;
-    std::int64_t OffsetAdjust;
-    std::uint64_t SizeInPages;
-    std::int64_t SizeAdjust;
-    std::uint64_t Swaps;
+    const LumekTest::VTemporaryFolder m_Folder;
+    const std::string m_Path = m_Folder.File( "mapped.bin" );
+    std::vector< std::uint8_t > m_Bytes;
   };
 
-  class MappedRangeTest : public testing::TestWithParam< VRangeCase >
+  TEST_F( MappedFileTest, RangesReadInOrderWithOneSwapPerWindowTouched )
   {
-  };
-
-  TEST_P( MappedRangeTest, ReturnsTheBytesInOrderWithOneSwapPerWindowTouched )
-  {
-    const VRangeCase& rCase = GetParam();
-    const LumekTest::VTemporaryFolder Folder;
-    const std::string Path = Folder.File( "ranges.bin" );
-    const auto Bytes = LumekTest::PatternBytes( 5 * s_Page + 123 );
-    LumekTest::WriteBytes( Path, Bytes );
-
-    VMemoryMappedInputStream Stream( s_Page, 8 );
-    ASSERT_EQ( Stream.Open( Path ), ZOL::Result_Ok );
-    const std::uint64_t Offset = rCase.OffsetInPages * s_Page + rCase.OffsetAdjust;
-    const std::uint64_t Size = rCase.SizeInPages * s_Page + rCase.SizeAdjust;
-    std::vector< std::uint8_t > Read( Size );
-    ASSERT_TRUE( Stream.Seek( static_cast< std::int64_t >( Offset ) ) );
-    ASSERT_TRUE( Stream.Read( Read.data(), Size ) );
-    EXPECT_EQ( Read, Slice( Bytes, Offset, Size ) );
-    EXPECT_EQ( Stream.GetFile().GetSwapCount(), rCase.Swaps );
-    std::uint64_t Position = 0;
-    ASSERT_TRUE( Stream.GetPosition( Position ) );
-    EXPECT_EQ( Position, Offset + Size );
+    MakeFile( 5 * s_Page + 123 );
+    // Where a read starts and how long it is, in the system's pages plus bytes, and how many
+    // windows it must map when nothing is mapped yet.
+    const struct
+    {
+      const char* Name;
+      std::uint64_t OffsetInPages;
+      std::int64_t OffsetAdjust;
+      std::uint64_t SizeInPages;
+      std::int64_t SizeAdjust;
+      std::uint64_t Swaps;
+    } Cases[] = { { "within one page", 1, 10, 0, 100, 1 },
+                  { "two bytes across an end", 1, -1, 0, 2, 2 },
+                  { "ends exactly at an end", 0, 10, 1, -10, 1 },
+                  { "starts exactly at an end", 2, 0, 0, 7, 1 },
+                  { "spans three pages", 0, 100, 2, 100, 3 },
+                  { "the whole file", 0, 0, 5, 123, 6 },
+                  { "to the end of the short last page", 5, -96, 0, 96 + 123, 2 } };
+    for( const auto& rCase : Cases )
+    {
+      SCOPED_TRACE( rCase.Name );
+      VMemoryMappedInputStream Stream( s_Page, 8 );
+      ASSERT_EQ( Stream.Open( m_Path ), ZOL::Result_Ok );
+      const std::uint64_t Offset = rCase.OffsetInPages * s_Page + rCase.OffsetAdjust;
+      std::vector< std::uint8_t > Read( rCase.SizeInPages * s_Page + rCase.SizeAdjust );
+      ASSERT_TRUE( ReadAt( Stream, Offset, Read ) );
+      EXPECT_EQ( Read, Slice( Offset, Read.size() ) );
+      EXPECT_EQ( Stream.GetFile().GetSwapCount(), rCase.Swaps );
+      std::uint64_t Position = 0;
+      ASSERT_TRUE( Stream.GetPosition( Position ) );
+      EXPECT_EQ( Position, Offset + Read.size() );
+    }
   }
 
-  INSTANTIATE_TEST_SUITE_P( PageEnds, MappedRangeTest,
-                            testing::Values( VRangeCase{ "WithinOnePage", 1, 10, 0, 100, 1 },
-                                             VRangeCase{ "TwoBytesAcrossAnEnd", 1, -1, 0, 2, 2 },
-                                             VRangeCase{ "EndsExactlyAtAnEnd", 0, 10, 1, -10, 1 },
-                                             VRangeCase{ "StartsExactlyAtAnEnd", 2, 0, 0, 7, 1 },
-                                             VRangeCase{ "SpansThreePages", 0, 100, 2, 100, 3 },
-                                             VRangeCase{ "TheWholeFile", 0, 0, 5, 123, 6 },
-                                             VRangeCase{ "ToTheEndOfTheShortLastPage", 5, -96, 0, 96 + 123, 2 } ),
-                            []( const testing::TestParamInfo< VRangeCase >& i_rInfo )
-                            { return std::string( i_rInfo.param.Name ); } );
-
-  TEST( MappedStream, ReadsTheLastByteOfAFileOfWholePages )
+  TEST_F( MappedFileTest, ReadsTheLastByteOfAFileOfWholePages )
   {
-    const LumekTest::VTemporaryFolder Folder;
-    const std::string Path = Folder.File( "whole.bin" );
-    const auto Bytes = LumekTest::PatternBytes( 3 * s_Page );
-    LumekTest::WriteBytes( Path, Bytes );
-
+    MakeFile( 3 * s_Page );
     VMemoryMappedInputStream Stream( s_Page, 2 );
-    ASSERT_EQ( Stream.Open( Path ), ZOL::Result_Ok );
-    std::uint8_t Last = 0;
-    ASSERT_TRUE( Stream.Seek( static_cast< std::int64_t >( 3 * s_Page - 1 ) ) );
-    ASSERT_TRUE( Stream.Read( &Last, 1 ) );
-    EXPECT_EQ( Last, Bytes.back() );
+    ASSERT_EQ( Stream.Open( m_Path ), ZOL::Result_Ok );
+    std::vector< std::uint8_t > Byte( 1 );
+    ASSERT_TRUE( ReadAt( Stream, 3 * s_Page - 1, Byte ) );
+    EXPECT_EQ( Byte[0], m_Bytes.back() );
     EXPECT_FALSE( Stream.IsAtEnd() );
-    EXPECT_FALSE( Stream.Read( &Last, 1 ) );
+    EXPECT_FALSE( Stream.Read( Byte.data(), 1 ) );
     EXPECT_TRUE( Stream.IsAtEnd() );
-    ASSERT_TRUE( Stream.Seek( 0 ) );
+    ASSERT_TRUE( ReadAt( Stream, 0, Byte ) );
     EXPECT_FALSE( Stream.IsAtEnd() );
-    ASSERT_TRUE( Stream.Read( &Last, 1 ) );
-    EXPECT_EQ( Last, Bytes.front() );
+    EXPECT_EQ( Byte[0], m_Bytes.front() );
   }
 
-  TEST( MappedStream, OneMorePageThanWindowsReadInTurnSwapsEveryTime )
+  TEST_F( MappedFileTest, OneMorePageThanWindowsReadInTurnSwapsEveryTime )
   {
     constexpr std::size_t MaxPages = 3;
-    const LumekTest::VTemporaryFolder Folder;
-    const std::string Path = Folder.File( "turns.bin" );
-    const auto Bytes = LumekTest::PatternBytes( ( MaxPages + 1 ) * s_Page );
-    LumekTest::WriteBytes( Path, Bytes );
-
-    VMemoryMappedInputStream Stream( s_Page, MaxPages );
-    ASSERT_EQ( Stream.Open( Path ), ZOL::Result_Ok );
     constexpr int Rounds = 4;
+    MakeFile( ( MaxPages + 1 ) * s_Page );
+    VMemoryMappedInputStream Stream( s_Page, MaxPages );
+    ASSERT_EQ( Stream.Open( m_Path ), ZOL::Result_Ok );
+    std::vector< std::uint8_t > Byte( 1 );
     for( int Round = 0; Round < Rounds; ++Round )
       for( std::uint64_t Page = 0; Page <= MaxPages; ++Page )
       {
-        const std::uint64_t Offset = Page * s_Page + 17;
-        std::uint8_t Byte = 0;
-        ASSERT_TRUE( Stream.Seek( static_cast< std::int64_t >( Offset ) ) );
-        ASSERT_TRUE( Stream.Read( &Byte, 1 ) );
-        EXPECT_EQ( Byte, Bytes[Offset] );
+        ASSERT_TRUE( ReadAt( Stream, Page * s_Page + 17, Byte ) );
+        EXPECT_EQ( Byte[0], m_Bytes[Page * s_Page + 17] );
       }
     EXPECT_EQ( Stream.GetFile().GetSwapCount(), Rounds * ( MaxPages + 1 ) );
 
@@ -122,77 +116,59 @@ namespace
     const std::uint64_t Before = Stream.GetFile().GetSwapCount();
     for( int Round = 0; Round < Rounds; ++Round )
       for( std::uint64_t Page = 0; Page < MaxPages; ++Page )
-      {
-        std::uint8_t Byte = 0;
-        ASSERT_TRUE( Stream.Seek( static_cast< std::int64_t >( Page * s_Page ) ) );
-        ASSERT_TRUE( Stream.Read( &Byte, 1 ) );
-      }
+        ASSERT_TRUE( ReadAt( Stream, Page * s_Page, Byte ) );
     EXPECT_EQ( Stream.GetFile().GetSwapCount(), Before + MaxPages );
   }
 
-  TEST( MappedStream, PageSizeIsAMultipleOfTheSystemPage )
+  TEST_F( MappedFileTest, PagesAreWholeSystemPagesAndCloseLogsTheSwaps )
   {
     EXPECT_EQ( VMemoryMappedInputFile( 1, 1 ).GetPageSize(), s_Page );
     EXPECT_EQ( VMemoryMappedInputFile( s_Page + 1, 1 ).GetPageSize(), 2 * s_Page );
     EXPECT_EQ( VMemoryMappedInputFile( 4 * s_Page, 0 ).GetMaxPages(), 1u );
-  }
 
-  TEST( MappedStream, CloseLogsTheSwapsAndPages )
-  {
-    const LumekTest::VTemporaryFolder Folder;
-    const std::string Path = Folder.File( "stats.bin" );
-    LumekTest::WriteBytes( Path, LumekTest::PatternBytes( 2 * s_Page + 1 ) );
-    const LumekTest::VSystemLogCapture Log;
+    MakeFile( 2 * s_Page + 1 );
+    const LumekTest::VLogCapture Log( "System" );
     {
       VMemoryMappedInputStream Stream( s_Page, 1 );
-      ASSERT_EQ( Stream.Open( Path ), ZOL::Result_Ok );
-      std::vector< std::uint8_t > All( 2 * s_Page + 1 );
-      ASSERT_TRUE( Stream.Read( All.data(), All.size() ) );
+      ASSERT_EQ( Stream.Open( m_Path ), ZOL::Result_Ok );
+      std::vector< std::uint8_t > All( m_Bytes.size() );
+      ASSERT_TRUE( ReadAt( Stream, 0, All ) );
     }
     EXPECT_TRUE( Log.Has( "VMemoryMappedInputStream stats: 3 swaps, 3 pages in file." ) );
   }
 
-  TEST( MappedStream, AFileTruncatedUnderTheStreamAnswersFalse )
+  TEST_F( MappedFileTest, AFileTruncatedUnderTheStreamAnswersFalse )
   {
-    const LumekTest::VTemporaryFolder Folder;
-    const std::string Path = Folder.File( "shrinking.bin" );
-    const auto Bytes = LumekTest::PatternBytes( 8 * s_Page );
-    LumekTest::WriteBytes( Path, Bytes );
-
+    MakeFile( 8 * s_Page );
     VMemoryMappedInputStream Stream( s_Page, 8 );
-    ASSERT_EQ( Stream.Open( Path ), ZOL::Result_Ok );
+    ASSERT_EQ( Stream.Open( m_Path ), ZOL::Result_Ok );
     // Every window mapped before the file shrinks: the lost pages are the ones that would fault.
-    std::vector< std::uint8_t > All( Bytes.size() );
-    ASSERT_TRUE( Stream.Read( All.data(), All.size() ) );
-    ASSERT_EQ( ::truncate( Path.c_str(), static_cast< off_t >( 2 * s_Page ) ), 0 );
+    std::vector< std::uint8_t > Read( m_Bytes.size() );
+    ASSERT_TRUE( ReadAt( Stream, 0, Read ) );
+    ASSERT_EQ( ::truncate( m_Path.c_str(), static_cast< off_t >( 2 * s_Page ) ), 0 );
 
-    std::vector< std::uint8_t > Read( s_Page );
-    ASSERT_TRUE( Stream.Seek( static_cast< std::int64_t >( 5 * s_Page ) ) );
-    EXPECT_FALSE( Stream.Read( Read.data(), Read.size() ) );
-    ASSERT_TRUE( Stream.Seek( static_cast< std::int64_t >( 2 * s_Page - 10 ) ) );
-    EXPECT_FALSE( Stream.Read( Read.data(), 20 ) ) << "a range that only starts in what is left";
-    ASSERT_TRUE( Stream.Seek( static_cast< std::int64_t >( s_Page ) ) );
-    ASSERT_TRUE( Stream.Read( Read.data(), Read.size() ) );
-    EXPECT_EQ( Read, Slice( Bytes, s_Page, s_Page ) );
+    Read.resize( s_Page );
+    EXPECT_FALSE( ReadAt( Stream, 5 * s_Page, Read ) );
+    std::vector< std::uint8_t > Across( 20 );
+    EXPECT_FALSE( ReadAt( Stream, 2 * s_Page - 10, Across ) ) << "a range that only starts in what is left";
+    ASSERT_TRUE( ReadAt( Stream, s_Page, Read ) );
+    EXPECT_EQ( Read, Slice( s_Page, s_Page ) );
   }
 
   // Another program cutting and regrowing the file while it is read: a cut can land between the
   // size check and the copy, and must still only fail that read.
-  TEST( MappedStream, AFileCutWhileBeingReadNeverTakesTheProcessDown )
+  TEST_F( MappedFileTest, AFileCutWhileBeingReadNeverTakesTheProcessDown )
   {
-    const LumekTest::VTemporaryFolder Folder;
-    const std::string Path = Folder.File( "cut.bin" );
-    const auto Bytes = LumekTest::PatternBytes( 64 * s_Page );
-    LumekTest::WriteBytes( Path, Bytes );
+    MakeFile( 64 * s_Page );
     VMemoryMappedInputStream Stream( 4 * s_Page, 4 );
-    ASSERT_EQ( Stream.Open( Path ), ZOL::Result_Ok );
-
+    ASSERT_EQ( Stream.Open( m_Path ), ZOL::Result_Ok );
     std::atomic< bool > bStop( false );
     std::thread Cutter(
         [&]
         {
           for( int i = 0; !bStop; ++i )
-            static_cast< void >( ::truncate( Path.c_str(), static_cast< off_t >( ( i % 2 == 0 ? 8 : 64 ) * s_Page ) ) );
+            static_cast< void >(
+                ::truncate( m_Path.c_str(), static_cast< off_t >( ( i % 2 == 0 ? 8 : 64 ) * s_Page ) ) );
         } );
     std::mt19937 Random( 7 );
     std::vector< std::uint8_t > Read( 16 * s_Page );
@@ -203,14 +179,11 @@ namespace
       const std::uint64_t Size = 1 + Random() % ( 16 * s_Page );
       ASSERT_TRUE( Stream.Seek( static_cast< std::int64_t >( Offset ) ) );
       if( !Stream.Read( Read.data(), Size ) )
-      {
         ++Failed;
-        continue;
-      }
-      if( Offset + Size <= 8 * s_Page )
+      else if( Offset + Size <= 8 * s_Page )
       {
         ASSERT_TRUE( std::equal( Read.begin(), Read.begin() + static_cast< std::ptrdiff_t >( Size ),
-                                 Bytes.begin() + static_cast< std::ptrdiff_t >( Offset ) ) );
+                                 m_Bytes.begin() + static_cast< std::ptrdiff_t >( Offset ) ) );
       }
     }
     bStop = true;
@@ -218,107 +191,89 @@ namespace
     EXPECT_GT( Failed, 0 );
   }
 
-  TEST( OpenMemoryMappedInputStream, AnEmptyFileFallsBackToThePlainStream )
+  // A file that cannot be mapped (an empty one) falls back to the plain stream with a log line; a
+  // missing file is an error without a fallback, and a folder fails in the fallback too.
+  TEST_F( MappedFileTest, OpenGivesTheMappedStreamOrFallsBackToThePlainOne )
   {
-    const LumekTest::VTemporaryFolder Folder;
-    const std::string Path = Folder.File( "empty.bin" );
-    LumekTest::WriteBytes( Path, {} );
-    const LumekTest::VSystemLogCapture Log;
-    std::shared_ptr< ZOL::IInputStreamSeekable > pStream;
-    ASSERT_EQ( OpenMemoryMappedInputStream( Path, pStream ), ZOL::Result_Ok );
-    ASSERT_TRUE( pStream );
-    EXPECT_NE( dynamic_cast< VFileInputStreamVirtual* >( pStream.get() ), nullptr );
-    std::uint64_t Size = 1;
-    ASSERT_TRUE( pStream->GetSize( Size ) );
-    EXPECT_EQ( Size, 0u );
-    std::uint8_t Byte = 0;
-    EXPECT_FALSE( pStream->Read( &Byte, 1 ) );
-    EXPECT_TRUE( Log.Has( "Failed to open memory mapped input file stream " + Path + " (" +
-                          ZOL::GetResultText( ZOL::Result_FileIOFailure ) +
-                          "), falling back to a standard input file stream." ) );
-  }
-
-  TEST( OpenMemoryMappedInputStream, AMissingFileIsFileNotFoundWithoutFallback )
-  {
-    const LumekTest::VTemporaryFolder Folder;
-    const LumekTest::VSystemLogCapture Log;
-    std::shared_ptr< ZOL::IInputStreamSeekable > pStream;
-    EXPECT_EQ( OpenMemoryMappedInputStream( Folder.File( "absent.bin" ), pStream ), ZOL::Result_FileNotFound );
-    EXPECT_FALSE( pStream );
-    for( const std::string& rMessage : Log.Messages )
-      EXPECT_EQ( rMessage.find( "falling back" ), std::string::npos ) << rMessage;
-  }
-
-  TEST( OpenMemoryMappedInputStream, AFolderFallsBackAndIsTheWrongType )
-  {
-    const LumekTest::VTemporaryFolder Folder;
-    const LumekTest::VSystemLogCapture Log;
-    std::shared_ptr< ZOL::IInputStreamSeekable > pStream;
-    EXPECT_EQ( OpenMemoryMappedInputStream( Folder.Path(), pStream ), ZOL::Result_InvalidType );
-    EXPECT_FALSE( pStream );
-  }
-
-  TEST( OpenMemoryMappedInputStream, GivesTheMappedStreamForAnOrdinaryFile )
-  {
-    const LumekTest::VTemporaryFolder Folder;
-    const std::string Path = Folder.File( "plain.bin" );
-    LumekTest::WriteBytes( Path, LumekTest::PatternBytes( 100 ) );
-    std::shared_ptr< ZOL::IInputStreamSeekable > pStream;
-    ASSERT_EQ( OpenMemoryMappedInputStream( Path, pStream ), ZOL::Result_Ok );
-    EXPECT_NE( dynamic_cast< VMemoryMappedInputStreamVirtual* >( pStream.get() ), nullptr );
+    const std::string Empty = m_Folder.File( "empty.bin" );
+    LumekTest::WriteText( Empty, "" );
+    MakeFile( 100 );
+    const struct
+    {
+      std::string Path;
+      ZOL::ResultCode Result;
+      const char* Stream; // "mapped", "plain" or nothing
+      bool bFallsBack;
+    } Cases[] = { { m_Path, ZOL::Result_Ok, "mapped", false },
+                  { Empty, ZOL::Result_Ok, "plain", true },
+                  { m_Folder.File( "absent.bin" ), ZOL::Result_FileNotFound, "", false },
+                  { m_Folder.Path(), ZOL::Result_InvalidType, "", true } };
+    for( const auto& rCase : Cases )
+    {
+      SCOPED_TRACE( rCase.Path );
+      const LumekTest::VLogCapture Log( "System" );
+      std::shared_ptr< ZOL::IInputStreamSeekable > pStream;
+      EXPECT_EQ( OpenMemoryMappedInputStream( rCase.Path, pStream ), rCase.Result );
+      const std::string Kind = dynamic_cast< VMemoryMappedInputStreamVirtual* >( pStream.get() ) ? "mapped"
+                               : dynamic_cast< VFileInputStreamVirtual* >( pStream.get() )       ? "plain"
+                                                                                                 : "";
+      EXPECT_EQ( rCase.Stream, Kind );
+      EXPECT_EQ( rCase.bFallsBack, Log.Contains( "falling back" ) );
+      if( Kind == "plain" )
+      {
+        EXPECT_TRUE( Log.Has( "Failed to open memory mapped input file stream " + rCase.Path + " (" +
+                              ZOL::GetResultText( ZOL::Result_FileIOFailure ) +
+                              "), falling back to a standard input file stream." ) );
+        std::uint64_t Size = 1;
+        ASSERT_TRUE( pStream->GetSize( Size ) );
+        EXPECT_EQ( Size, 0u );
+        std::uint8_t Byte = 0;
+        EXPECT_FALSE( pStream->Read( &Byte, 1 ) );
+      }
+    }
   }
 
   // Random reads and seeks give the same answers and bytes from the mapped stream as from the
   // plain one: window choice, eviction and crossing are all exercised by small windows.
-  class MappedAgainstPlainTest : public testing::TestWithParam< unsigned >
+  TEST_F( MappedFileTest, RandomReadsAndSeeksAgreeWithThePlainStream )
   {
-  };
-
-  TEST_P( MappedAgainstPlainTest, RandomReadsAndSeeksAgree )
-  {
-    std::mt19937 Random( GetParam() );
-    const LumekTest::VTemporaryFolder Folder;
-    const std::string Path = Folder.File( "random.bin" );
-    const std::uint64_t FileSize = 6 * s_Page + Random() % s_Page;
-    LumekTest::WriteBytes( Path, LumekTest::PatternBytes( FileSize ) );
-
-    VMemoryMappedInputStream Mapped( s_Page * ( 1 + Random() % 2 ), 1 + Random() % 3 );
-    ASSERT_EQ( Mapped.Open( Path ), ZOL::Result_Ok );
-    VFileInputStream Plain;
-    ASSERT_EQ( OpenInputStream( Path, Plain ), ZOL::Result_Ok );
-
-    for( int Step = 0; Step < 2000; ++Step )
+    for( unsigned Seed = 1; Seed <= 6; ++Seed )
     {
-      SCOPED_TRACE( Step );
-      if( Random() % 3 == 0 )
+      SCOPED_TRACE( "seed " + std::to_string( Seed ) );
+      std::mt19937 Random( Seed );
+      const std::uint64_t FileSize = 6 * s_Page + Random() % s_Page;
+      MakeFile( FileSize );
+      VMemoryMappedInputStream Mapped( s_Page * ( 1 + Random() % 2 ), 1 + Random() % 3 );
+      ASSERT_EQ( Mapped.Open( m_Path ), ZOL::Result_Ok );
+      VFileInputStream Plain;
+      ASSERT_EQ( OpenInputStream( m_Path, Plain ), ZOL::Result_Ok );
+
+      for( int Step = 0; Step < 2000; ++Step )
       {
-        // Now and then past the end, where both must still agree.
-        const std::int64_t Position = static_cast< std::int64_t >( Random() % ( FileSize + 64 ) );
-        ASSERT_EQ( Mapped.Seek( Position ), Plain.Seek( Position ) );
-        continue;
+        SCOPED_TRACE( Step );
+        if( Random() % 3 == 0 )
+        {
+          // Now and then past the end, where both must still agree.
+          const std::int64_t Position = static_cast< std::int64_t >( Random() % ( FileSize + 64 ) );
+          ASSERT_EQ( Mapped.Seek( Position ), Plain.Seek( Position ) );
+          continue;
+        }
+        const std::uint64_t Size = Random() % 4 == 0 ? Random() % ( 3 * s_Page ) : Random() % 64;
+        std::vector< std::uint8_t > FromMapped( Size, 0xAA ), FromPlain( Size, 0x55 );
+        const bool bMapped = Mapped.Read( FromMapped.data(), Size );
+        ASSERT_EQ( bMapped, Plain.Read( FromPlain.data(), Size ) );
+        if( !bMapped )
+        {
+          // A short read leaves the two at different places; both start again from one.
+          const std::int64_t Position = static_cast< std::int64_t >( Random() % FileSize );
+          ASSERT_TRUE( Mapped.Seek( Position ) && Plain.Seek( Position ) );
+          continue;
+        }
+        ASSERT_EQ( FromMapped, FromPlain );
+        std::uint64_t MappedPosition = 0, PlainPosition = 0;
+        ASSERT_TRUE( Mapped.GetPosition( MappedPosition ) && Plain.GetPosition( PlainPosition ) );
+        ASSERT_EQ( MappedPosition, PlainPosition );
       }
-      const std::uint64_t Size = Random() % 4 == 0 ? Random() % ( 3 * s_Page ) : Random() % 64;
-      std::vector< std::uint8_t > FromMapped( Size, 0xAA ), FromPlain( Size, 0x55 );
-      const bool bMapped = Mapped.Read( FromMapped.data(), Size );
-      const bool bPlain = Plain.Read( FromPlain.data(), Size );
-      ASSERT_EQ( bMapped, bPlain );
-      if( !bMapped )
-      {
-        // A short read leaves the two at different places; both start again from one.
-        const std::int64_t Position = static_cast< std::int64_t >( Random() % FileSize );
-        ASSERT_TRUE( Mapped.Seek( Position ) );
-        ASSERT_TRUE( Plain.Seek( Position ) );
-        continue;
-      }
-      ASSERT_EQ( FromMapped, FromPlain );
-      std::uint64_t MappedPosition = 0, PlainPosition = 0;
-      ASSERT_TRUE( Mapped.GetPosition( MappedPosition ) );
-      ASSERT_TRUE( Plain.GetPosition( PlainPosition ) );
-      ASSERT_EQ( MappedPosition, PlainPosition );
     }
   }
-
-  INSTANTIATE_TEST_SUITE_P( Seeds, MappedAgainstPlainTest, testing::Values( 1u, 2u, 3u, 4u, 5u, 6u ),
-                            []( const testing::TestParamInfo< unsigned >& i_rInfo )
-                            { return "Seed" + std::to_string( i_rInfo.param ); } );
 } // namespace
