@@ -1,5 +1,4 @@
 #include "app/CommandLine/CommandLine.h"
-#include "tests/support/TestNames.h"
 
 #include <gtest/gtest.h>
 
@@ -7,32 +6,24 @@
 
 #include <cstdio>
 #include <sstream>
+#include <vector>
 
-using LumekVideoViewer::ParseCommandLine;
 using LumekVideoViewer::VCommandLine;
 
 namespace
 {
   const std::string DefaultServer = "https://versions.lumek.example/";
 
-  struct VParse
-  {
-    int Result;
-    VCommandLine CommandLine;
-    std::string Errors;
-  };
-
-  VParse Parse( std::vector< std::string > i_Arguments )
+  int Parse( std::vector< std::string > i_Arguments, VCommandLine& o_rCommandLine, std::string& o_rErrors )
   {
     i_Arguments.insert( i_Arguments.begin(), "lumekvideoviewer" );
     std::vector< const char* > Pointers;
     for( const std::string& rArgument : i_Arguments )
       Pointers.push_back( rArgument.c_str() );
-    VParse Result;
     std::ostringstream Errors;
-    Result.Result = ParseCommandLine( static_cast< int >( Pointers.size() ), Pointers.data(), DefaultServer,
-                                      Result.CommandLine, Errors );
-    Result.Errors = Errors.str();
+    const int Result = LumekVideoViewer::ParseCommandLine( static_cast< int >( Pointers.size() ), Pointers.data(),
+                                                           DefaultServer, o_rCommandLine, Errors );
+    o_rErrors = Errors.str();
     return Result;
   }
 
@@ -42,70 +33,57 @@ namespace
   }
 } // namespace
 
-TEST( CommandLine, DefaultsAndValues )
+TEST( CommandLine, GoodCommandLines )
 {
-  const VParse Empty = Parse( {} );
-  EXPECT_EQ( Empty.Result, 0 );
-  EXPECT_EQ( Empty.CommandLine.VersionServer, DefaultServer );
-  EXPECT_EQ( Empty.CommandLine.SpoofVersion, "" );
-  EXPECT_EQ( Empty.CommandLine.InputFile, "" );
-
-  const VParse Full =
-      Parse( { "--version-server", "http://127.0.0.1:9/", "--spoof-version=0.3.0.55914h", "clip.lvid" } );
-  EXPECT_EQ( Full.Result, 0 );
-  EXPECT_EQ( Full.CommandLine.VersionServer, "http://127.0.0.1:9/" );
-  EXPECT_EQ( Full.CommandLine.SpoofVersion, "0.3.0.55914h" );
-  EXPECT_EQ( Full.CommandLine.InputFile, "clip.lvid" );
-  EXPECT_EQ( Parse( { "--input-file", "other.lvid" } ).CommandLine.InputFile, "other.lvid" );
+  struct VRow
+  {
+    std::vector< std::string > Arguments;
+    std::string Server, Spoof, Input;
+  };
+  const VRow Rows[] = {
+      { {}, DefaultServer, "", "" },
+      { { "--version-server", "http://127.0.0.1:9/", "--spoof-version=0.3.0.55914h", "clip.lvid" },
+        "http://127.0.0.1:9/",
+        "0.3.0.55914h",
+        "clip.lvid" },
+      { { "--input-file", "other.lvid" }, DefaultServer, "", "other.lvid" },
+      { { "--version-server=" }, "", "", "" },
+      // Accepted, but nothing can reach the developer mode.
+      { { "--developer", "clip.lvid" }, DefaultServer, "", "clip.lvid" },
+  };
+  for( const VRow& rRow : Rows )
+  {
+    SCOPED_TRACE( testing::PrintToString( rRow.Arguments ) );
+    VCommandLine CommandLine;
+    std::string Errors;
+    EXPECT_EQ( Parse( rRow.Arguments, CommandLine, Errors ), 0 );
+    EXPECT_EQ( Errors, "" );
+    EXPECT_EQ( CommandLine.VersionServer, rRow.Server );
+    EXPECT_EQ( CommandLine.SpoofVersion, rRow.Spoof );
+    EXPECT_EQ( CommandLine.InputFile, rRow.Input );
+    EXPECT_FALSE( CommandLine.bDeveloper );
+  }
 }
 
-TEST( CommandLine, DeveloperIsAcceptedButNeverReachable )
+TEST( CommandLine, ErrorsGiveTwoLinesAndExitCode255 )
 {
-  const VParse Developer = Parse( { "--developer", "clip.lvid" } );
-  EXPECT_EQ( Developer.Result, 0 );
-  EXPECT_FALSE( Developer.CommandLine.bDeveloper );
-  EXPECT_EQ( Developer.CommandLine.InputFile, "clip.lvid" );
+  const std::pair< std::vector< std::string >, std::string > Rows[] = {
+      { { "--help" }, "unrecognised option '--help'" },
+      { { "--bogus" }, "unrecognised option '--bogus'" },
+      { { "a.lvid", "b.lvid" }, "option '--input-file' cannot be specified more than once" },
+      { { "--version-server" }, "the required argument for option '--version-server' is missing" },
+      { { "--version-server=a", "--version-server=b" },
+        "option '--version-server' cannot be specified more than once" },
+  };
+  for( const auto& rRow : Rows )
+  {
+    SCOPED_TRACE( testing::PrintToString( rRow.first ) );
+    VCommandLine CommandLine;
+    std::string Errors;
+    EXPECT_EQ( Parse( rRow.first, CommandLine, Errors ), 255 );
+    EXPECT_EQ( Errors, ErrorText( rRow.second ) );
+  }
 }
-
-TEST( CommandLine, EmptyServerIsAccepted )
-{
-  const VParse Parsed = Parse( { "--version-server=" } );
-  EXPECT_EQ( Parsed.Result, 0 );
-  EXPECT_EQ( Parsed.CommandLine.VersionServer, "" );
-}
-
-struct VBadCommandLine
-{
-  const char* Name;
-  std::vector< std::string > Arguments;
-  std::string Reason;
-};
-
-class CommandLineErrors : public testing::TestWithParam< VBadCommandLine >
-{
-};
-
-TEST_P( CommandLineErrors, TwoLinesAndExitCode255 )
-{
-  const VParse Parsed = Parse( GetParam().Arguments );
-  EXPECT_EQ( Parsed.Result, 255 );
-  EXPECT_EQ( Parsed.Errors, ErrorText( GetParam().Reason ) );
-}
-
-INSTANTIATE_TEST_SUITE_P(
-    Cases, CommandLineErrors,
-    testing::Values( VBadCommandLine{ "HelpIsNotAnOption", { "--help" }, "unrecognised option '--help'" },
-                     VBadCommandLine{ "UnknownOption", { "--bogus" }, "unrecognised option '--bogus'" },
-                     VBadCommandLine{ "TwoFiles",
-                                      { "a.lvid", "b.lvid" },
-                                      "option '--input-file' cannot be specified more than once" },
-                     VBadCommandLine{ "ServerWithoutAddress",
-                                      { "--version-server" },
-                                      "the required argument for option '--version-server' is missing" },
-                     VBadCommandLine{ "TwoServers",
-                                      { "--version-server=a", "--version-server=b" },
-                                      "option '--version-server' cannot be specified more than once" } ),
-    LumekTest::VCaseName() );
 
 TEST( CommandLine, TheProgramItselfAnswersOnStandardError )
 {
