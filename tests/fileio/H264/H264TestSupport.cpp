@@ -2,48 +2,55 @@
 
 #include "tests/support/FfmpegFixtures.h"
 
-#include <gtest/gtest.h>
-
-#include <algorithm>
 #include <fstream>
 #include <iterator>
 
 namespace LumekTest
 {
-  namespace
-  {
-    VBytes ReadWholeFile( const std::string& i_rPath )
-    {
-      std::ifstream File( i_rPath, std::ios::binary );
-      return VBytes( std::istreambuf_iterator< char >( File ), std::istreambuf_iterator< char >() );
-    }
-
-    const VBytes s_StartCode = { 0, 0, 0, 1 };
-  } // namespace
-
   std::vector< VBytes > SplitNALUnits( const VBytes& i_rAnnexB )
   {
     std::vector< VBytes > Units;
     std::size_t i = 0, Start = std::string::npos;
     while( i + 2 < i_rAnnexB.size() )
     {
-      if( i_rAnnexB[i] == 0 && i_rAnnexB[i + 1] == 0 && i_rAnnexB[i + 2] == 1 )
+      if( i_rAnnexB[i] != 0 || i_rAnnexB[i + 1] != 0 || i_rAnnexB[i + 2] != 1 )
       {
-        if( Start != std::string::npos )
-        {
-          std::size_t End = i;
-          while( End > Start && i_rAnnexB[End - 1] == 0 )
-            --End;
-          Units.emplace_back( i_rAnnexB.begin() + Start, i_rAnnexB.begin() + End );
-        }
-        Start = i + 3;
-        i += 3;
-      }
-      else
         ++i;
+        continue;
+      }
+      if( Start != std::string::npos )
+      {
+        std::size_t End = i;
+        while( End > Start && i_rAnnexB[End - 1] == 0 )
+          --End;
+        Units.emplace_back( i_rAnnexB.begin() + Start, i_rAnnexB.begin() + End );
+      }
+      Start = i += 3;
     }
     if( Start != std::string::npos )
       Units.emplace_back( i_rAnnexB.begin() + Start, i_rAnnexB.end() );
+    return Units;
+  }
+
+  VBytes JoinNALUnits( const std::vector< VBytes >& i_rUnits, bool i_bLengthPrefixed )
+  {
+    VBytes Out;
+    for( const VBytes& rUnit : i_rUnits )
+    {
+      const std::uint32_t n = i_bLengthPrefixed ? static_cast< std::uint32_t >( rUnit.size() ) : 1;
+      Out.insert( Out.end(),
+                  { std::uint8_t( n >> 24 ), std::uint8_t( n >> 16 ), std::uint8_t( n >> 8 ), std::uint8_t( n ) } );
+      Out.insert( Out.end(), rUnit.begin(), rUnit.end() );
+    }
+    return Out;
+  }
+
+  std::vector< VBytes > UnitsOfType( const VBytes& i_rAccessUnit, unsigned i_Type )
+  {
+    std::vector< VBytes > Units;
+    for( const VBytes& rUnit : SplitNALUnits( i_rAccessUnit ) )
+      if( !rUnit.empty() && ( rUnit[0] & 0x1Fu ) == i_Type )
+        Units.push_back( rUnit );
     return Units;
   }
 
@@ -53,11 +60,12 @@ namespace LumekTest
     VH264Stream Stream;
     Stream.Width = i_Width;
     Stream.Height = i_Height;
+    const std::string Size = std::to_string( i_Width ) + "x" + std::to_string( i_Height );
+    const std::string Key = std::to_string( i_KeyInterval );
     std::vector< std::string > Arguments = { "-f",
                                              "lavfi",
                                              "-i",
-                                             "testsrc2=size=" + std::to_string( i_Width ) + "x" +
-                                                 std::to_string( i_Height ) + ":rate=25",
+                                             "testsrc2=size=" + Size + ":rate=25",
                                              "-frames:v",
                                              std::to_string( i_Frames ),
                                              "-pix_fmt",
@@ -67,28 +75,27 @@ namespace LumekTest
                                              "-bf",
                                              "0",
                                              "-g",
-                                             std::to_string( i_KeyInterval ),
+                                             Key,
                                              "-keyint_min",
-                                             std::to_string( i_KeyInterval ),
+                                             Key,
                                              "-sc_threshold",
                                              "0" };
     Arguments.insert( Arguments.end(), i_rEncoderArguments.begin(), i_rEncoderArguments.end() );
     Arguments.insert( Arguments.end(), { "-bsf:v", "h264_metadata=aud=insert" } );
-    std::string Name = "h264_" + std::to_string( i_Width ) + "x" + std::to_string( i_Height ) + "_" +
-                       std::to_string( i_Frames ) + ".h264";
-    Stream.Path = FfmpegFixture( Name, Arguments );
+    Stream.Path = FfmpegFixture( "h264_" + Size + "_" + std::to_string( i_Frames ) + ".h264", Arguments );
     if( Stream.Path.empty() )
       return Stream;
+    std::ifstream File( Stream.Path, std::ios::binary );
+    const VBytes Whole( ( std::istreambuf_iterator< char >( File ) ), std::istreambuf_iterator< char >() );
     // Each access unit starts at its delimiter (type 9), which stays in the unit.
-    for( const VBytes& rUnit : SplitNALUnits( ReadWholeFile( Stream.Path ) ) )
+    for( const VBytes& rUnit : SplitNALUnits( Whole ) )
     {
       if( rUnit.empty() )
         continue;
       if( ( rUnit[0] & 0x1F ) == 9 || Stream.AccessUnits.empty() )
         Stream.AccessUnits.emplace_back();
-      VBytes& rAccessUnit = Stream.AccessUnits.back();
-      rAccessUnit.insert( rAccessUnit.end(), s_StartCode.begin(), s_StartCode.end() );
-      rAccessUnit.insert( rAccessUnit.end(), rUnit.begin(), rUnit.end() );
+      const VBytes Unit = JoinNALUnits( { rUnit }, false );
+      Stream.AccessUnits.back().insert( Stream.AccessUnits.back().end(), Unit.begin(), Unit.end() );
     }
     return Stream;
   }
@@ -120,28 +127,6 @@ namespace LumekTest
     return Frames;
   }
 
-  VLogCapture::VLogCapture( std::string i_Category ) : m_Category( std::move( i_Category ) )
-  {
-    m_Handle = ZOL::GlobalLog().AddSink(
-        [this]( const ZOL::ILogRecord& i_rRecord )
-        {
-          if( i_rRecord.Category == m_Category )
-            m_Lines.push_back( i_rRecord.Message );
-        },
-        ZOL::LogDetail );
-  }
-
-  VLogCapture::~VLogCapture()
-  {
-    ZOL::GlobalLog().RemoveSink( m_Handle );
-  }
-
-  bool VLogCapture::Contains( const std::string& i_rText ) const
-  {
-    return std::any_of( m_Lines.begin(), m_Lines.end(),
-                        [&]( const std::string& i_rLine ) { return i_rLine.find( i_rText ) != std::string::npos; } );
-  }
-
   VMemoryH264Reader::VMemoryH264Reader( const VH264Stream& i_rStream,
                                         const std::vector< std::uint64_t >& i_rFrameNumbers )
       : m_pAllocator( std::make_shared< ZOL::VReaderBufferAllocator >() )
@@ -152,11 +137,6 @@ namespace LumekTest
     m_VideoInfo.ImageHeight = i_rStream.Height;
     m_VideoInfo.PixelFormat = ZOL::PixelFormat_U8Y8V8Y8;
     m_Timing.FramePeriodInTicks = m_Timing.TicksPerSecond / 25;
-  }
-
-  std::uint64_t VMemoryH264Reader::GetFrameCount() const
-  {
-    return m_Frames.empty() ? 0 : m_Frames.rbegin()->first + 1;
   }
 
   bool VMemoryH264Reader::ReadFrameData( std::uint64_t i_FrameIndex, std::shared_ptr< ZOL::IBuffer >& o_rVideo,
@@ -176,17 +156,13 @@ namespace LumekTest
 
   std::optional< std::uint64_t > VMemoryH264Reader::FindStoredFrameAtOrBefore( std::uint64_t i_FrameIndex ) const
   {
-    auto Found = m_Frames.upper_bound( i_FrameIndex );
-    if( Found == m_Frames.begin() )
-      return std::nullopt;
-    return std::prev( Found )->first;
+    const auto Found = m_Frames.upper_bound( i_FrameIndex );
+    return Found == m_Frames.begin() ? std::nullopt : std::optional< std::uint64_t >( std::prev( Found )->first );
   }
 
   std::optional< std::uint64_t > VMemoryH264Reader::FindStoredFrameAtOrAfter( std::uint64_t i_FrameIndex ) const
   {
     const auto Found = m_Frames.lower_bound( i_FrameIndex );
-    if( Found == m_Frames.end() )
-      return std::nullopt;
-    return Found->first;
+    return Found == m_Frames.end() ? std::nullopt : std::optional< std::uint64_t >( Found->first );
   }
 } // namespace LumekTest

@@ -3,7 +3,7 @@
 // H.264 streams made by ffmpeg in the run, cut into access units, and a reader that serves them
 // from memory so that the video source can be driven without a container that stores H.264.
 
-#include "services/ILogCategorised.h"
+#include "tests/support/LogCapture.h"
 #include "videointerface/BufferAllocators.h"
 #include "videointerface/IVideoReader.h"
 
@@ -37,6 +37,15 @@ namespace LumekTest
 
   // The units of an Annex B byte string, without start codes.
   std::vector< VBytes > SplitNALUnits( const VBytes& i_rAnnexB );
+  // The units joined again, behind 4-byte start codes or 4-byte big-endian lengths.
+  VBytes JoinNALUnits( const std::vector< VBytes >& i_rUnits, bool i_bLengthPrefixed );
+  // The units of one type (7 SPS, 8 PPS, 6 SEI) in an access unit.
+  std::vector< VBytes > UnitsOfType( const VBytes& i_rAccessUnit, unsigned i_Type );
+
+  inline VBytes Bytes( const ZOL::IBufferConst& i_rBuffer )
+  {
+    return VBytes( i_rBuffer.GetData(), i_rBuffer.GetData() + i_rBuffer.GetSize() );
+  }
 
   // A buffer over bytes the test holds.
   class VBytesBuffer : public ZOL::IBufferConst
@@ -48,23 +57,6 @@ namespace LumekTest
 
   private:
     const VBytes& m_rBytes;
-  };
-
-  // Log lines of one category while it lives.
-  class VLogCapture
-  {
-  public:
-    explicit VLogCapture( std::string i_Category );
-    ~VLogCapture();
-    VLogCapture( const VLogCapture& ) = delete;
-    VLogCapture& operator=( const VLogCapture& ) = delete;
-    const std::vector< std::string >& Lines() const { return m_Lines; }
-    bool Contains( const std::string& i_rText ) const;
-
-  private:
-    std::string m_Category;
-    std::vector< std::string > m_Lines;
-    int m_Handle;
   };
 
   // Serves access units as an H.264 file would, under frame numbers the test chooses (gaps
@@ -88,7 +80,7 @@ namespace LumekTest
     ZOL::EVideoPayload GetVideoPayload() const override { return ZOL::VideoPayload_VideoH264; }
     const ZOL::IVideoFrameInfo& GetVideoFrameInfo() const override { return m_VideoInfo; }
     const ZOL::IVideoSettings& GetVideoSettings() const override { return m_Settings; }
-    std::uint64_t GetFrameCount() const override;
+    std::uint64_t GetFrameCount() const override { return m_Frames.empty() ? 0 : m_Frames.rbegin()->first + 1; }
     bool HasFrame( std::uint64_t i_FrameIndex ) const override { return m_Frames.count( i_FrameIndex ) != 0; }
     bool ReadFrameData( std::uint64_t i_FrameIndex, std::shared_ptr< ZOL::IBuffer >& o_rVideo,
                         ZOL::IAudioBuffers& o_rAudio, bool i_bReadVideo, bool i_bReadAudio ) override;
