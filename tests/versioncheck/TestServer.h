@@ -22,11 +22,11 @@ public:
 
   VTestServer();
 
-  void SetReply( int i_Status, const QByteArray& i_rBody );
+  void SetReply( int i_Status, const QByteArray& i_rBody ) { m_Status = i_Status, m_Body = i_rBody; }
   void SetMode( EMode i_Mode ) { m_Mode = i_Mode; }
 
   // "http://127.0.0.1:<port>/"
-  QString Url() const;
+  QString Url() const { return QStringLiteral( "http://127.0.0.1:%1/" ).arg( m_Server.serverPort() ); }
   // The request targets received so far, e.g. "/?protocol=1.0&name=...".
   const QStringList& Requests() const { return m_Requests; }
 
@@ -34,7 +34,6 @@ public:
   static quint16 ClosedPort();
 
 private:
-  void Accept();
   void Answer( QTcpSocket& io_rSocket, const QByteArray& i_rHeader );
 
   QTcpServer m_Server;

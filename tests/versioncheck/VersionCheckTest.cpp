@@ -3,7 +3,6 @@
 // server that never answers, refuses or floods; the dialogs as the user would see them.
 
 #include "services/IApplicationVersion.h"
-#include "tests/support/TestNames.h"
 #include "tests/versioncheck/TestServer.h"
 #include "versioncheck/VersionCheck/VApplicationVersionCheck.h"
 #include "versioncheck/VersionCheck/VVersionCheck.h"
@@ -101,177 +100,166 @@ namespace
            i_rMore + "}--></body></html>";
   }
 
-  class VersionCheckTest : public testing::Test
+  // A check against the test's own server, with every dialog it would show and every callback
+  // it makes written down. Each check of a test shares one store of settings, cleared at both ends.
+  struct VCheckHarness
   {
-  protected:
-    void SetUp() override
+    VCheckHarness()
     {
-      m_Store.clear();
-      m_Check.SetServer( m_Server.Url().toStdString() );
-      m_Check.SetDialogRunner(
+      Store.clear();
+      Check.SetServer( Server.Url().toStdString() );
+      Check.SetDialogRunner(
           [this]( VVersionCheckMessageBox& io_rBox )
           {
-            m_Shown.push_back( { io_rBox.windowTitle(), io_rBox.GetTextBrowser()->toPlainText(),
-                                 io_rBox.GetCheckBox() != nullptr, io_rBox.IsError() } );
-            if( m_bTickBox && io_rBox.GetCheckBox() )
+            Shown.push_back( { io_rBox.windowTitle(), io_rBox.GetTextBrowser()->toPlainText(),
+                               io_rBox.GetCheckBox() != nullptr, io_rBox.IsError() } );
+            if( bTickBox && io_rBox.GetCheckBox() )
               io_rBox.GetCheckBox()->setChecked( true );
           } );
-      m_Check.VersionUpdatedCallback.Set( [this]( const std::string& i_rVersion )
-                                          { m_Versions.push_back( i_rVersion ); } );
-      m_Check.WhitelistUpdatedCallback.Set( [this]( const std::vector< std::string >& i_rList )
-                                            { m_Whitelists.push_back( i_rList ); } );
-      m_Check.VersionCheckCompleteCallback.Set( [this]( bool i_bStartup ) { m_Completions.push_back( i_bStartup ); } );
+      Check.VersionUpdatedCallback.Set( [this]( const std::string& i_rVersion ) { Versions.push_back( i_rVersion ); } );
+      Check.WhitelistUpdatedCallback.Set( [this]( const std::vector< std::string >& i_rList )
+                                          { Whitelists.push_back( i_rList ); } );
+      Check.VersionCheckCompleteCallback.Set( [this]( bool i_bStartup ) { Completions.push_back( i_bStartup ); } );
     }
-
-    void TearDown() override { m_Store.clear(); }
+    ~VCheckHarness() { Store.clear(); }
 
     void Serve( const std::string& i_rBody, int i_Status = 200 )
     {
-      m_Server.SetReply( i_Status, QByteArray::fromStdString( i_rBody ) );
+      Server.SetReply( i_Status, QByteArray::fromStdString( i_rBody ) );
     }
 
     // One check, run until its listener is gone.
-    bool Run( bool i_bStartupCheck, unsigned i_TimeoutSeconds = 10 )
+    bool RunCheck( bool i_bStartupCheck, unsigned i_TimeoutSeconds = 10 )
     {
-      const bool bSent = m_Check.Check( "LumekVideoViewer", "1.10.0.137509h", "Debian+GNU/Linux+12+64Bit",
-                                        i_bStartupCheck, m_pSettings, i_TimeoutSeconds, "1.0" );
-      EXPECT_TRUE( RunUntil( [this] { return m_Check.findChildren< VVersionCheckListener* >().isEmpty(); } ) );
+      const bool bSent = Check.Check( "LumekVideoViewer", "1.10.0.137509h", "Debian+GNU/Linux+12+64Bit",
+                                      i_bStartupCheck, pSettings, i_TimeoutSeconds, "1.0" );
+      EXPECT_TRUE( RunUntil( [this] { return Check.findChildren< VVersionCheckListener* >().isEmpty(); } ) );
       return bSent;
     }
 
-    QSettings m_Store{ "Lumek Labs Ltd", "LumekVideoViewer" };
-    std::shared_ptr< VRecordingSettings > m_pSettings = std::make_shared< VRecordingSettings >( &m_Store );
-    VTestServer m_Server;
-    VVersionCheck m_Check{ nullptr, "" };
-    bool m_bTickBox = false;
-    std::vector< IShownDialog > m_Shown;
-    std::vector< std::string > m_Versions;
-    std::vector< std::vector< std::string > > m_Whitelists;
-    std::vector< bool > m_Completions;
-  };
-
-  // One exchange with the server and everything that should follow from it.
-  struct IExchangeCase
-  {
-    const char* Name;
-    std::string Body;
-    int HttpStatus;
-    bool bStartupCheck;
-    std::optional< std::string > StoredId;
-    std::optional< bool > StoredShowOnStartup;
-    // Expected:
-    int Dialogs;
-    bool bCheckBox;
-    bool bErrorIcon;
-    bool bComplete;
-    int Status;
-    std::string MessageType;
-    std::string Error; // checked when not empty
+    QSettings Store{ "Lumek Labs Ltd", "LumekVideoViewer" };
+    std::shared_ptr< VRecordingSettings > pSettings = std::make_shared< VRecordingSettings >( &Store );
+    VTestServer Server;
+    VVersionCheck Check{ nullptr, "" };
+    bool bTickBox = false;
+    std::vector< IShownDialog > Shown;
     std::vector< std::string > Versions;
     std::vector< std::vector< std::string > > Whitelists;
+    std::vector< bool > Completions;
   };
 
-  std::ostream& operator<<( std::ostream& io_rStream, const IExchangeCase& i_rCase )
+  class VersionCheckTest : public testing::Test, public VCheckHarness
   {
-    return io_rStream << i_rCase.Name;
-  }
+  };
 
   const std::string Optional = Page( "1.0", "OPTIONAL", "A" );
   const std::string Required = Page( "1.0", "REQUIRED", "A" );
   const std::string None = Page( "1.0", "NONE", "A" );
-  const std::string Whitelisted = Page( "3.0", "NONE", "A", ",\"Whitelist\":[\"1.10.0.137509h\",\"1.9.0.1h\"]" );
-  const std::string ListOnly = Page( "3.0", "NONE", "A" );
-  const std::vector< std::string > Newest = { "1.11.0.140100h" };
 
-  // Each row: name, reply body, HTTP status, at start, stored id and show-at-start; then the dialogs
-  // shown, with a check box, with the error icon, completed, the reported status and message type,
-  // the error (when not empty), the versions and whitelists announced.
-  // clang-format off
-  const IExchangeCase ExchangeCases[] = {
-      { "OptionalNewAtStart", Optional, 200, true, {}, {},
-        1, true, false, true, 0, "OPTIONAL", "", Newest, {} },
-      { "OptionalSeenAndDeclinedAtStart", Optional, 200, true, "A", false,
-        0, false, false, true, 0, "OPTIONAL", "", Newest, {} },
-      { "OptionalSeenStillWantedAtStart", Optional, 200, true, "A", true,
-        1, true, false, true, 0, "OPTIONAL", "", Newest, {} },
-      { "OptionalDeclinedButNewIdAtStart", Optional, 200, true, "old", false,
-        1, true, false, true, 0, "OPTIONAL", "", Newest, {} },
-      { "OptionalDeclinedOnRequest", Optional, 200, false, "A", false,
-        1, false, false, true, 0, "OPTIONAL", "", Newest, {} },
-      { "RequiredDeclinedAtStart", Required, 200, true, "A", false,
-        1, false, false, true, 0, "REQUIRED", "", Newest, {} },
-      { "NoneAtStart", None, 200, true, {}, {},
-        0, false, false, true, 0, "NONE", "", Newest, {} },
-      { "NoneOnRequest", None, 200, false, "A", true,
-        1, false, false, true, 0, "NONE", "", Newest, {} },
-      { "TypeAbsentAtStart", "<!--{\"CheckVersion\":\"1.0\",\"Id\":\"A\"}-->", 200, true, {}, {},
-        0, false, false, true, 0, "NONE", "", { "" }, {} },
-      { "Format2AtStart", Page( "2.0", "REQUIRED", "A" ), 200, true, {}, {},
-        0, false, false, false, 0, "", "", {}, {} },
-      { "Format2OnRequest", Page( "2.0", "REQUIRED", "A" ), 200, false, {}, {},
-        0, false, false, false, 0, "", "", {}, {} },
-      { "Format3NewAtStart", Whitelisted, 200, true, {}, {},
-        0, false, false, true, 0, "NONE", "", Newest, { { "1.10.0.137509h", "1.9.0.1h" } } },
-      { "Format3DeclinedAtStart", Whitelisted, 200, true, "A", false,
-        0, false, false, true, 0, "NONE", "", {}, {} },
-      { "Format3DeclinedOnRequest", Whitelisted, 200, false, "A", false,
-        0, false, false, true, 0, "NONE", "", Newest, { { "1.10.0.137509h", "1.9.0.1h" } } },
-      { "Format3WithoutWhitelist", ListOnly, 200, false, {}, {},
-        0, false, false, true, 0, "NONE", "", Newest, { {} } },
-      { "UnknownFormatOnRequest", Page( "4.0", "REQUIRED", "A" ), 200, false, {}, {},
-        0, false, false, true, 0, "REQUIRED", "", {}, {} },
-      { "BadJsonOnRequest", "<!--{\n\"CheckVersion\": \"1.0\",\n}-->", 200, false, {}, {},
-        0, false, false, true, 0, "NONE", "Error parsing JSON data: expected key string on line 3", {}, {} },
-      { "NoCommentAtStart", "<html><body>Down for maintenance</body></html>", 200, true, {}, {},
-        0, false, false, true, 0, "NONE", "Error parsing JSON data: expected value on line 1", {}, {} },
-      { "NotFoundAtStart", Required, 404, true, {}, {},
-        0, false, false, true, 203, "NONE", "", {}, {} },
-      { "NotFoundOnRequest", Required, 404, false, {}, {},
-        1, false, true, true, 203, "NONE", "", {}, {} },
-  };
-  // clang-format on
-
-  class VersionCheckExchange : public VersionCheckTest, public testing::WithParamInterface< IExchangeCase >
+  // One exchange with the server and everything that should follow from it.
+  TEST( VersionCheckExchange, ShowsAndReportsWhatTheReplyAsksFor )
   {
-  };
-
-  TEST_P( VersionCheckExchange, ShowsAndReportsWhatTheReplyAsksFor )
-  {
-    const IExchangeCase& rCase = GetParam();
-    if( rCase.StoredId )
-      m_pSettings->SetMessageId( *rCase.StoredId );
-    if( rCase.StoredShowOnStartup )
-      m_pSettings->SetShowOnStartup( *rCase.StoredShowOnStartup );
-    Serve( rCase.Body, rCase.HttpStatus );
-
-    ASSERT_TRUE( Run( rCase.bStartupCheck ) );
-
-    ASSERT_EQ( static_cast< int >( m_Shown.size() ), rCase.Dialogs );
-    for( const auto& rShown : m_Shown )
+    const std::string Whitelisted = Page( "3.0", "NONE", "A", ",\"Whitelist\":[\"1.10.0.137509h\",\"1.9.0.1h\"]" );
+    const std::vector< std::string > Newest = { "1.11.0.140100h" };
+    const std::vector< std::vector< std::string > > Listed = { { "1.10.0.137509h", "1.9.0.1h" } };
+    const struct
     {
-      EXPECT_EQ( rShown.Title, "Checking LumekVideoViewer Version" );
-      EXPECT_EQ( rShown.bCheckBox, rCase.bCheckBox );
-      EXPECT_EQ( rShown.bError, rCase.bErrorIcon );
-      if( rCase.bErrorIcon )
-        EXPECT_TRUE( rShown.Text.startsWith( "Unable to contact version check server.\n"
-                                             "Please check your network connection and try again.\n" ) )
-            << rShown.Text.toStdString();
-      else
-        EXPECT_EQ( rShown.Text, "Message A" );
-    }
-    EXPECT_EQ( m_Versions, rCase.Versions );
-    EXPECT_EQ( m_Whitelists, rCase.Whitelists );
+      const char* Name;
+      std::string Body;
+      int HttpStatus;
+      bool bStartupCheck;
+      std::optional< std::string > StoredId;
+      std::optional< bool > StoredShowOnStartup;
+      // Expected:
+      int Dialogs;
+      bool bCheckBox;
+      bool bErrorIcon;
+      bool bComplete;
+      int Status;
+      std::string MessageType;
+      std::string Error; // checked when not empty
+      std::vector< std::string > Versions;
+      std::vector< std::vector< std::string > > Whitelists;
+    } Cases[] = {
+        // Each row: name, reply body, HTTP status, at start, stored id and show-at-start; then the
+        // dialogs shown, with a check box, with the error icon, completed, the reported status and
+        // message type, the error (when not empty), the versions and whitelists announced.
+        // clang-format off
+        { "OptionalNewAtStart", Optional, 200, true, {}, {},
+          1, true, false, true, 0, "OPTIONAL", "", Newest, {} },
+        { "OptionalSeenAndDeclinedAtStart", Optional, 200, true, "A", false,
+          0, false, false, true, 0, "OPTIONAL", "", Newest, {} },
+        { "OptionalSeenStillWantedAtStart", Optional, 200, true, "A", true,
+          1, true, false, true, 0, "OPTIONAL", "", Newest, {} },
+        { "OptionalDeclinedButNewIdAtStart", Optional, 200, true, "old", false,
+          1, true, false, true, 0, "OPTIONAL", "", Newest, {} },
+        { "OptionalDeclinedOnRequest", Optional, 200, false, "A", false,
+          1, false, false, true, 0, "OPTIONAL", "", Newest, {} },
+        { "RequiredDeclinedAtStart", Required, 200, true, "A", false,
+          1, false, false, true, 0, "REQUIRED", "", Newest, {} },
+        { "NoneAtStart", None, 200, true, {}, {},
+          0, false, false, true, 0, "NONE", "", Newest, {} },
+        { "NoneOnRequest", None, 200, false, "A", true,
+          1, false, false, true, 0, "NONE", "", Newest, {} },
+        { "TypeAbsentAtStart", "<!--{\"CheckVersion\":\"1.0\",\"Id\":\"A\"}-->", 200, true, {}, {},
+          0, false, false, true, 0, "NONE", "", { "" }, {} },
+        { "Format2AtStart", Page( "2.0", "REQUIRED", "A" ), 200, true, {}, {},
+          0, false, false, false, 0, "", "", {}, {} },
+        { "Format2OnRequest", Page( "2.0", "REQUIRED", "A" ), 200, false, {}, {},
+          0, false, false, false, 0, "", "", {}, {} },
+        { "Format3NewAtStart", Whitelisted, 200, true, {}, {},
+          0, false, false, true, 0, "NONE", "", Newest, Listed },
+        { "Format3DeclinedAtStart", Whitelisted, 200, true, "A", false,
+          0, false, false, true, 0, "NONE", "", {}, {} },
+        { "Format3DeclinedOnRequest", Whitelisted, 200, false, "A", false,
+          0, false, false, true, 0, "NONE", "", Newest, Listed },
+        { "Format3WithoutWhitelist", Page( "3.0", "NONE", "A" ), 200, false, {}, {},
+          0, false, false, true, 0, "NONE", "", Newest, { {} } },
+        { "UnknownFormatOnRequest", Page( "4.0", "REQUIRED", "A" ), 200, false, {}, {},
+          0, false, false, true, 0, "REQUIRED", "", {}, {} },
+        { "BadJsonOnRequest", "<!--{\n\"CheckVersion\": \"1.0\",\n}-->", 200, false, {}, {},
+          0, false, false, true, 0, "NONE", "Error parsing JSON data: expected key string on line 3", {}, {} },
+        { "NoCommentAtStart", "<html><body>Down for maintenance</body></html>", 200, true, {}, {},
+          0, false, false, true, 0, "NONE", "Error parsing JSON data: expected value on line 1", {}, {} },
+        { "NotFoundAtStart", Required, 404, true, {}, {},
+          0, false, false, true, 203, "NONE", "", {}, {} },
+        { "NotFoundOnRequest", Required, 404, false, {}, {},
+          1, false, true, true, 203, "NONE", "", {}, {} },
+        // clang-format on
+    };
+    for( const auto& rCase : Cases )
+    {
+      SCOPED_TRACE( rCase.Name );
+      VCheckHarness H;
+      if( rCase.StoredId )
+        H.pSettings->SetMessageId( *rCase.StoredId );
+      if( rCase.StoredShowOnStartup )
+        H.pSettings->SetShowOnStartup( *rCase.StoredShowOnStartup );
+      H.Serve( rCase.Body, rCase.HttpStatus );
+      ASSERT_TRUE( H.RunCheck( rCase.bStartupCheck ) );
 
-    if( !rCase.bComplete )
-    {
-      EXPECT_TRUE( m_Completions.empty() );
-      EXPECT_TRUE( m_pSettings->Outcomes.empty() );
-    }
-    else
-    {
-      EXPECT_EQ( m_Completions, std::vector< bool >{ rCase.bStartupCheck } );
-      ASSERT_EQ( m_pSettings->Outcomes.size(), 1u );
-      const IOutcome& rOutcome = m_pSettings->Outcomes[0];
+      ASSERT_EQ( static_cast< int >( H.Shown.size() ), rCase.Dialogs );
+      for( const auto& rShown : H.Shown )
+      {
+        EXPECT_EQ( rShown.Title, "Checking LumekVideoViewer Version" );
+        EXPECT_EQ( rShown.bCheckBox, rCase.bCheckBox );
+        EXPECT_EQ( rShown.bError, rCase.bErrorIcon );
+        if( rCase.bErrorIcon )
+          EXPECT_TRUE( rShown.Text.startsWith( "Unable to contact version check server.\n"
+                                               "Please check your network connection and try again.\n" ) )
+              << rShown.Text.toStdString();
+        else
+          EXPECT_EQ( rShown.Text, "Message A" );
+      }
+      EXPECT_EQ( H.Versions, rCase.Versions );
+      EXPECT_EQ( H.Whitelists, rCase.Whitelists );
+
+      // A reply of a format the check does not know ends it without an outcome.
+      EXPECT_EQ( H.Completions, rCase.bComplete ? std::vector< bool >{ rCase.bStartupCheck } : std::vector< bool >{} );
+      ASSERT_EQ( H.pSettings->Outcomes.size(), rCase.bComplete ? 1u : 0u );
+      if( !rCase.bComplete )
+        continue;
+      const IOutcome& rOutcome = H.pSettings->Outcomes[0];
       EXPECT_EQ( rOutcome.Status, rCase.Status );
       EXPECT_EQ( rOutcome.MessageType, rCase.MessageType );
       EXPECT_EQ( rOutcome.Body, rCase.Body );
@@ -282,143 +270,136 @@ namespace
     }
   }
 
-  INSTANTIATE_TEST_SUITE_P( Replies, VersionCheckExchange, testing::ValuesIn( ExchangeCases ), LumekTest::VCaseName() );
-
   TEST_F( VersionCheckTest, DoNotShowAgainHoldsUntilTheIdChanges )
   {
     Serve( Optional );
-    m_bTickBox = true;
-    Run( true );
-    ASSERT_EQ( m_Shown.size(), 1u );
-    EXPECT_TRUE( m_Shown.back().bCheckBox );
-    EXPECT_FALSE( m_pSettings->GetShowOnStartup() );
+    bTickBox = true;
+    RunCheck( true );
+    ASSERT_EQ( Shown.size(), 1u );
+    EXPECT_TRUE( Shown.back().bCheckBox );
+    EXPECT_FALSE( pSettings->GetShowOnStartup() );
 
-    Run( true );
-    EXPECT_EQ( m_Shown.size(), 1u ) << "the same message came back at start after the user declined it";
+    RunCheck( true );
+    EXPECT_EQ( Shown.size(), 1u ) << "the same message came back at start after the user declined it";
 
-    Run( false );
-    ASSERT_EQ( m_Shown.size(), 2u ) << "a user's check shows the message anyway";
-    EXPECT_FALSE( m_Shown.back().bCheckBox );
-    EXPECT_FALSE( m_pSettings->GetShowOnStartup() );
+    RunCheck( false );
+    ASSERT_EQ( Shown.size(), 2u ) << "a user's check shows the message anyway";
+    EXPECT_FALSE( Shown.back().bCheckBox );
+    EXPECT_FALSE( pSettings->GetShowOnStartup() );
 
     Serve( Page( "1.0", "OPTIONAL", "B" ) );
-    m_bTickBox = false;
-    Run( true );
-    ASSERT_EQ( m_Shown.size(), 3u ) << "a new message clears the choice";
-    EXPECT_EQ( m_Shown.back().Text, "Message B" );
-    EXPECT_TRUE( m_pSettings->GetShowOnStartup() );
-    EXPECT_EQ( m_Store.value( "LumekVideoViewer.MessageId" ).toString(), "B" );
-    EXPECT_EQ( m_Server.Requests().size(), 4 );
-  }
+    bTickBox = false;
+    RunCheck( true );
+    ASSERT_EQ( Shown.size(), 3u ) << "a new message clears the choice";
+    EXPECT_EQ( Shown.back().Text, "Message B" );
+    EXPECT_TRUE( pSettings->GetShowOnStartup() );
+    EXPECT_EQ( Store.value( "LumekVideoViewer.MessageId" ).toString(), "B" );
+    EXPECT_EQ( Server.Requests().size(), 4 );
 
-  TEST_F( VersionCheckTest, RequiredIsShownAtEveryStart )
-  {
+    // A required message offers no box to tick and comes back at every start.
     Serve( Required );
-    m_bTickBox = true;
-    for( int Start = 0; Start < 3; ++Start )
-      Run( true );
-    ASSERT_EQ( m_Shown.size(), 3u );
-    for( const auto& rShown : m_Shown )
-      EXPECT_FALSE( rShown.bCheckBox );
+    bTickBox = true;
+    for( int Start = 0; Start < 2; ++Start )
+      RunCheck( true );
+    ASSERT_EQ( Shown.size(), 5u );
+    EXPECT_FALSE( Shown[3].bCheckBox || Shown[4].bCheckBox );
   }
 
   TEST_F( VersionCheckTest, SilentServerTimesOutWithoutADialog )
   {
-    m_Server.SetMode( VTestServer::EMode::Silent );
+    Server.SetMode( VTestServer::EMode::Silent );
     for( const bool bStartupCheck : { true, false } )
     {
-      m_pSettings->Outcomes.clear();
-      ASSERT_TRUE( Run( bStartupCheck, 1 ) );
-      ASSERT_EQ( m_pSettings->Outcomes.size(), 1u );
-      const IOutcome& rOutcome = m_pSettings->Outcomes[0];
+      pSettings->Outcomes.clear();
+      ASSERT_TRUE( RunCheck( bStartupCheck, 1 ) );
+      ASSERT_EQ( pSettings->Outcomes.size(), 1u );
+      const IOutcome& rOutcome = pSettings->Outcomes[0];
       EXPECT_EQ( rOutcome.Status, 4 );
       EXPECT_EQ( rOutcome.Body, "" );
       EXPECT_EQ( rOutcome.MessageType, "NONE" );
       EXPECT_EQ( rOutcome.Error, "Version check request timeout" );
     }
-    EXPECT_TRUE( m_Shown.empty() );
-    EXPECT_TRUE( m_Completions.empty() );
-    EXPECT_EQ( m_Server.Requests().size(), 2 );
+    EXPECT_TRUE( Shown.empty() );
+    EXPECT_TRUE( Completions.empty() );
+    EXPECT_EQ( Server.Requests().size(), 2 );
   }
 
   TEST_F( VersionCheckTest, RefusedConnectionIsSilentAtStartAndShownOnRequest )
   {
-    m_Check.SetServer( QStringLiteral( "http://127.0.0.1:%1/" ).arg( VTestServer::ClosedPort() ).toStdString() );
-    Run( true );
-    EXPECT_TRUE( m_Shown.empty() );
-    Run( false );
-    ASSERT_EQ( m_Shown.size(), 1u );
-    EXPECT_TRUE( m_Shown[0].bError );
-    EXPECT_FALSE( m_Shown[0].bCheckBox );
-    ASSERT_EQ( m_pSettings->Outcomes.size(), 2u );
-    for( const auto& rOutcome : m_pSettings->Outcomes )
+    Check.SetServer( QStringLiteral( "http://127.0.0.1:%1/" ).arg( VTestServer::ClosedPort() ).toStdString() );
+    RunCheck( true );
+    EXPECT_TRUE( Shown.empty() );
+    RunCheck( false );
+    ASSERT_EQ( Shown.size(), 1u );
+    EXPECT_TRUE( Shown[0].bError );
+    EXPECT_FALSE( Shown[0].bCheckBox );
+    ASSERT_EQ( pSettings->Outcomes.size(), 2u );
+    for( const auto& rOutcome : pSettings->Outcomes )
       EXPECT_EQ( rOutcome.Status, 1 ) << rOutcome.Error; // QNetworkReply::ConnectionRefusedError
-    EXPECT_EQ( m_Completions, ( std::vector< bool >{ true, false } ) );
+    EXPECT_EQ( Completions, ( std::vector< bool >{ true, false } ) );
   }
 
   TEST_F( VersionCheckTest, EmptyServerFailsSilentlyAtStart )
   {
-    m_Check.SetServer( "" );
-    EXPECT_EQ( m_Check.RequestUrl( "LumekVideoViewer", "1.10.0.137509h", "X+64Bit", "1.0" ),
+    Check.SetServer( "" );
+    EXPECT_EQ( Check.RequestUrl( "LumekVideoViewer", "1.10.0.137509h", "X+64Bit", "1.0" ),
                "?protocol=1.0&name=LumekVideoViewer&version=1.10.0.137509h&system=X+64Bit" );
-    ASSERT_TRUE( Run( true ) );
-    EXPECT_TRUE( m_Shown.empty() );
-    ASSERT_EQ( m_pSettings->Outcomes.size(), 1u );
-    EXPECT_NE( m_pSettings->Outcomes[0].Status, 0 );
-    EXPECT_EQ( m_Completions, std::vector< bool >{ true } );
+    ASSERT_TRUE( RunCheck( true ) );
+    EXPECT_TRUE( Shown.empty() );
+    ASSERT_EQ( pSettings->Outcomes.size(), 1u );
+    EXPECT_NE( pSettings->Outcomes[0].Status, 0 );
+    EXPECT_EQ( Completions, std::vector< bool >{ true } );
   }
 
   TEST_F( VersionCheckTest, FloodingServerIsCutOff )
   {
     for( const auto Mode : { VTestServer::EMode::Flood, VTestServer::EMode::Stream } )
     {
-      m_pSettings->Outcomes.clear();
-      m_Server.SetMode( Mode );
-      Run( true );
-      EXPECT_TRUE( m_Shown.empty() );
-      ASSERT_EQ( m_pSettings->Outcomes.size(), 1u );
-      EXPECT_EQ( m_pSettings->Outcomes[0].Status, 5 ); // QNetworkReply::OperationCanceledError
-      EXPECT_LE( m_pSettings->Outcomes[0].Body.size(), static_cast< std::size_t >( VVersionCheck::MaximumReplyBytes ) );
+      pSettings->Outcomes.clear();
+      Server.SetMode( Mode );
+      RunCheck( true );
+      EXPECT_TRUE( Shown.empty() );
+      ASSERT_EQ( pSettings->Outcomes.size(), 1u );
+      EXPECT_EQ( pSettings->Outcomes[0].Status, 5 ); // QNetworkReply::OperationCanceledError
+      EXPECT_LE( pSettings->Outcomes[0].Body.size(), static_cast< std::size_t >( VVersionCheck::MaximumReplyBytes ) );
     }
   }
 
   TEST_F( VersionCheckTest, OverlappingChecksEachGetTheirAnswer )
   {
     Serve( None );
-    ASSERT_TRUE( m_Check.Check( "LumekVideoViewer", "1", "S", true, m_pSettings, 10, "1.0" ) );
-    EXPECT_TRUE( m_pSettings->Outcomes.empty() ) << "a check must return before its answer comes";
-    ASSERT_TRUE( Run( false ) );
-    EXPECT_EQ( m_pSettings->Outcomes.size(), 2u );
-    std::sort( m_Completions.begin(), m_Completions.end() );
-    EXPECT_EQ( m_Completions, ( std::vector< bool >{ false, true } ) );
-    EXPECT_EQ( m_Shown.size(), 1u );
+    ASSERT_TRUE( Check.Check( "LumekVideoViewer", "1", "S", true, pSettings, 10, "1.0" ) );
+    EXPECT_TRUE( pSettings->Outcomes.empty() ) << "a check must return before its answer comes";
+    ASSERT_TRUE( RunCheck( false ) );
+    EXPECT_EQ( pSettings->Outcomes.size(), 2u );
+    std::sort( Completions.begin(), Completions.end() );
+    EXPECT_EQ( Completions, ( std::vector< bool >{ false, true } ) );
+    EXPECT_EQ( Shown.size(), 1u );
   }
 
   TEST_F( VersionCheckTest, RefusesWithoutSettingsOrOffTheMainThread )
   {
-    EXPECT_FALSE( m_Check.Check( "LumekVideoViewer", "1", "S", true, nullptr, 10, "1.0" ) );
+    EXPECT_FALSE( Check.Check( "LumekVideoViewer", "1", "S", true, nullptr, 10, "1.0" ) );
     bool bSentFromThread = true;
-    std::thread Other(
-        [&] { bSentFromThread = m_Check.Check( "LumekVideoViewer", "1", "S", true, m_pSettings, 10, "1.0" ); } );
+    std::thread Other( [&]
+                       { bSentFromThread = Check.Check( "LumekVideoViewer", "1", "S", true, pSettings, 10, "1.0" ); } );
     Other.join();
     EXPECT_FALSE( bSentFromThread );
-    EXPECT_TRUE( m_Check.findChildren< VVersionCheckListener* >().isEmpty() );
-  }
+    EXPECT_TRUE( Check.findChildren< VVersionCheckListener* >().isEmpty() );
 
-  TEST_F( VersionCheckTest, ListenerWithoutAReplyReportsUnknownError )
-  {
-    VVersionCheckListener Listener( "LumekVideoViewer", true, m_pSettings, nullptr, {}, nullptr );
+    // A listener that finishes without a reply has nothing to read; a later timeout adds nothing.
+    VVersionCheckListener Listener( "LumekVideoViewer", true, pSettings, nullptr, {}, nullptr );
     Listener.OnReplyFinished();
-    Listener.OnTimeout(); // finished already: no second outcome
-    ASSERT_EQ( m_pSettings->Outcomes.size(), 1u );
-    EXPECT_EQ( m_pSettings->Outcomes[0].Status, 99 );
-    EXPECT_EQ( m_pSettings->Outcomes[0].Error, "Unknown error" );
+    Listener.OnTimeout();
+    ASSERT_EQ( pSettings->Outcomes.size(), 1u );
+    EXPECT_EQ( pSettings->Outcomes[0].Status, 99 );
+    EXPECT_EQ( pSettings->Outcomes[0].Error, "Unknown error" );
   }
 
   // The application's own dialog, run modally: the test ticks the box and presses "OK" as a user would.
   TEST_F( VersionCheckTest, ModalDialogAnsweredLikeAUser )
   {
-    m_Check.SetDialogRunner( {} );
+    Check.SetDialogRunner( {} );
     Serve( Optional );
     QString Title;
     QTimer Answer;
@@ -438,10 +419,10 @@ namespace
                         }
                       } );
     Answer.start( 20 );
-    Run( true );
+    RunCheck( true );
     EXPECT_EQ( Title, "Checking LumekVideoViewer Version" );
-    EXPECT_FALSE( m_pSettings->GetShowOnStartup() );
-    EXPECT_EQ( m_Completions, std::vector< bool >{ true } );
+    EXPECT_FALSE( pSettings->GetShowOnStartup() );
+    EXPECT_EQ( Completions, std::vector< bool >{ true } );
   }
 
   // The settings the window builds over its store.
@@ -464,57 +445,45 @@ namespace
     EXPECT_FALSE( Reader.GetShowOnStartup() );
     EXPECT_TRUE( VVersionCheckSettings( &Again, "LumekVideoViewer", true ).GetShowOnStartup() );
     Store.clear();
+
+    // Without a store nothing is kept and the defaults are read.
+    VVersionCheckSettings Nowhere( nullptr, "LumekVideoViewer", false );
+    Nowhere.SetMessageId( "x" );
+    Nowhere.SetShowOnStartup( false );
+    EXPECT_EQ( Nowhere.GetMessageId(), "" );
+    EXPECT_TRUE( Nowhere.GetShowOnStartup() );
   }
 
-  TEST( VersionCheckSettings, MissingStoreReadsDefaults )
+  // The object the window holds: the release and system it tells the server, or the version it is
+  // told to claim.
+  TEST_F( VersionCheckTest, ApplicationCheckTellsTheServerTheReleaseAndSystem )
   {
-    VVersionCheckSettings Settings( nullptr, "LumekVideoViewer", false );
-    Settings.SetMessageId( "x" );
-    Settings.SetShowOnStartup( false );
-    EXPECT_EQ( Settings.GetMessageId(), "" );
-    EXPECT_TRUE( Settings.GetShowOnStartup() );
-  }
+    VApplicationVersionCheck Unreleased( nullptr, nullptr, nullptr, "http://127.0.0.1:9/", "" );
+    EXPECT_FALSE( Unreleased.CheckAtStartup() || Unreleased.CheckOnRequest() ) << "no release record, nothing sent";
 
-  // The object the window holds.
-  class ApplicationVersionCheckTest : public VersionCheckTest
-  {
-  };
-
-  TEST_F( ApplicationVersionCheckTest, TellsTheServerTheReleaseAndSystem )
-  {
     Serve( None );
-    VApplicationVersionCheck UpdateCheck( nullptr, &m_Store, &LumekVideoViewer::ApplicationVersion(),
-                                          m_Server.Url().toStdString(), "" );
+    VApplicationVersionCheck UpdateCheck( nullptr, &Store, &LumekVideoViewer::ApplicationVersion(),
+                                          Server.Url().toStdString(), "" );
     EXPECT_EQ( UpdateCheck.GetVersionText(), "1.10.0.137509h" );
     ASSERT_TRUE( UpdateCheck.CheckAtStartup() );
     RunUntil( [&] { return UpdateCheck.GetVersionCheck().findChildren< VVersionCheckListener* >().isEmpty(); } );
-    ASSERT_EQ( m_Server.Requests().size(), 1 );
-    EXPECT_EQ( m_Server.Requests()[0].toStdString(),
+    ASSERT_EQ( Server.Requests().size(), 1 );
+    EXPECT_EQ( Server.Requests()[0].toStdString(),
                "/?protocol=1.0&name=LumekVideoViewer&version=1.10.0.137509h&system=" + SystemText() );
     // The outcome leaves no trace: the store holds the two values of the check and nothing else.
-    m_Store.sync();
-    EXPECT_EQ( m_Store.allKeys(), ( QStringList{ "LumekVideoViewer.MessageId", "LumekVideoViewer.ShowOnStartup" } ) );
-  }
+    Store.sync();
+    EXPECT_EQ( Store.allKeys(), ( QStringList{ "LumekVideoViewer.MessageId", "LumekVideoViewer.ShowOnStartup" } ) );
 
-  TEST_F( ApplicationVersionCheckTest, SpoofedVersionAndUsersCheck )
-  {
     Serve( Optional );
-    VApplicationVersionCheck UpdateCheck( nullptr, &m_Store, &LumekVideoViewer::ApplicationVersion(),
-                                          m_Server.Url().toStdString(), "0.3.0.55914h" );
+    VApplicationVersionCheck Spoofed( nullptr, &Store, &LumekVideoViewer::ApplicationVersion(),
+                                      Server.Url().toStdString(), "0.3.0.55914h" );
     std::vector< bool > Boxes;
-    UpdateCheck.GetVersionCheck().SetDialogRunner( [&]( VVersionCheckMessageBox& io_rBox )
-                                                   { Boxes.push_back( io_rBox.GetCheckBox() != nullptr ); } );
-    ASSERT_TRUE( UpdateCheck.CheckOnRequest() );
-    RunUntil( [&] { return UpdateCheck.GetVersionCheck().findChildren< VVersionCheckListener* >().isEmpty(); } );
-    ASSERT_EQ( m_Server.Requests().size(), 1 );
-    EXPECT_NE( m_Server.Requests()[0].indexOf( "&version=0.3.0.55914h&" ), -1 ) << m_Server.Requests()[0].toStdString();
-    EXPECT_EQ( Boxes, std::vector< bool >{ false } );
-  }
-
-  TEST( ApplicationVersionCheck, WithoutAReleaseRecordSendsNothing )
-  {
-    VApplicationVersionCheck UpdateCheck( nullptr, nullptr, nullptr, "http://127.0.0.1:9/", "" );
-    EXPECT_FALSE( UpdateCheck.CheckAtStartup() );
-    EXPECT_FALSE( UpdateCheck.CheckOnRequest() );
+    Spoofed.GetVersionCheck().SetDialogRunner( [&]( VVersionCheckMessageBox& io_rBox )
+                                               { Boxes.push_back( io_rBox.GetCheckBox() != nullptr ); } );
+    ASSERT_TRUE( Spoofed.CheckOnRequest() );
+    RunUntil( [&] { return Spoofed.GetVersionCheck().findChildren< VVersionCheckListener* >().isEmpty(); } );
+    ASSERT_EQ( Server.Requests().size(), 2 );
+    EXPECT_NE( Server.Requests()[1].indexOf( "&version=0.3.0.55914h&" ), -1 ) << Server.Requests()[1].toStdString();
+    EXPECT_EQ( Boxes, std::vector< bool >{ false } ) << "a user's check offers no box to tick";
   }
 } // namespace
