@@ -1,9 +1,8 @@
 // Every way an .lvid recording can be broken gives a false result: never a crash, a hang or an
 // allocation the file's size does not justify.
 
-#include "fileio/LumekVideo/VReader.h"
-#include "services/ILogCategorised.h"
 #include "tests/fileio/LumekVideo/LvidTestSupport.h"
+#include "tests/support/LogCapture.h"
 #include "utils/MemoryStream.h"
 #include "videointerface/AttributeRecords.h"
 
@@ -18,299 +17,205 @@ using namespace LumekVideoTest;
 namespace
 {
   constexpr std::uint64_t Largest = std::numeric_limits< std::uint64_t >::max();
-  const ZOL::IVideoFrameInfo s_Video = MakeVideo( ZOL::PixelFormat_Luminance8, 5, 3 );
-  const ZOL::IAudioFrameInfo s_Audio = MakeAudio( ZOL::AudioSampleFormat_Int16, 2 );
 
-  VRecordingPlan BasePlan()
-  {
-    VRecordingPlan Plan;
-    Plan.DescriptionBlock = DescriptionBlock( s_Video, s_Audio );
-    Plan.AttributeBlock = SerialiseStore( MakeFileAttributes() );
-    Plan.Alignment = 16;
-    for( std::uint32_t i = 0; i < 3; ++i )
-      Plan.Records.push_back( { i, PatternBytes( 15, i ), PatternBytes( 4 * ( i + 1 ), 40 + i ), std::nullopt } );
-    return Plan;
-  }
-
-  VBytes WithDescription( const ZOL::IVideoFrameInfo& i_rVideo, const ZOL::IAudioFrameInfo& i_rAudio )
-  {
-    VRecordingPlan Plan = BasePlan();
-    Plan.DescriptionBlock = DescriptionBlock( i_rVideo, i_rAudio );
-    return Assemble( Plan ).Bytes;
-  }
-
-  VBytes WithoutDescriptionKey( const std::string& i_rKey )
-  {
-    VRecordingPlan Plan = BasePlan();
-    ZOL::IVideoAttributes Store;
-    ZOL::WriteVideoFrameInfo( Store, s_Video );
-    ZOL::WriteAudioFrameInfo( Store, "", s_Audio );
-    Store.Remove( i_rKey );
-    Plan.DescriptionBlock = SerialiseStore( Store );
-    return Assemble( Plan ).Bytes;
-  }
-
-  // A change to the base recording, with the record and index positions at hand.
+  // A change to the small recording, with its record and index positions at hand.
   using VMutation = std::function< void( VBytes&, const VAssembled& ) >;
 
-  std::size_t IndexEntry( const VAssembled& i_rFile, std::size_t i_Entry )
+  std::size_t Entry( const VAssembled& i_rFile, std::size_t i_Entry )
   {
     return static_cast< std::size_t >( i_rFile.IndexOffset + 8 + 16 * i_Entry );
   }
 
-  struct VBrokenCase
+  // The recording with another frame description.
+  VMutation Described( const ZOL::IVideoFrameInfo& i_rVideo )
   {
-    const char* Name;
-    std::function< VBytes() > Make;
-    bool bOpens;
-    // Whether ReadFrameData with video and audio succeeds for frames 0, 1 and 2.
-    std::array< bool, 3 > Frames;
-  };
+    return [i_rVideo]( VBytes& b, const VAssembled& )
+    {
+      VRecordingPlan Plan = SmallPlan();
+      Plan.DescriptionBlock = DescriptionBlock( i_rVideo, s_Stereo16 );
+      b = Assemble( Plan ).Bytes;
+    };
+  }
 
-  VBytes Mutated( const VMutation& i_rMutation )
+  // The recording with one key left out of its frame description.
+  VMutation WithoutKey( const std::string& i_rKey )
   {
-    const VAssembled File = Assemble( BasePlan() );
-    VBytes Bytes = File.Bytes;
-    i_rMutation( Bytes, File );
-    return Bytes;
+    return [i_rKey]( VBytes& b, const VAssembled& )
+    {
+      VRecordingPlan Plan = SmallPlan();
+      ZOL::IVideoAttributes Store;
+      ZOL::WriteVideoFrameInfo( Store, s_SmallVideo );
+      ZOL::WriteAudioFrameInfo( Store, "", s_Stereo16 );
+      Store.Remove( i_rKey );
+      Plan.DescriptionBlock = SerialiseStore( Store );
+      b = Assemble( Plan ).Bytes;
+    };
   }
 
   std::size_t BlocksEnd()
   {
-    const VRecordingPlan Plan = BasePlan();
+    const VRecordingPlan Plan = SmallPlan();
     return 48 + Plan.DescriptionBlock.size() + Plan.AttributeBlock.size();
   }
 
-  constexpr std::array< bool, 3 > All{ true, true, true };
-  constexpr std::array< bool, 3 > None{ false, false, false };
-  constexpr std::array< bool, 3 > AllButMiddle{ true, false, true };
+  using VFrames = std::array< bool, 3 >;
+  constexpr VFrames All{ true, true, true }, None{ false, false, false }, AllButMiddle{ true, false, true };
+  constexpr VFrames FirstTwo{ true, true, false };
 
+  struct VBrokenCase
+  {
+    const char* Name;
+    VMutation Break;
+    bool bOpens;
+    VFrames Frames; // whether frames 0, 1 and 2 read, video and sound
+  };
+
+  // Short names for the two arguments of every row: the bytes, and where things are in them.
+  using B = VBytes;
+  using F = const VAssembled;
   const VBrokenCase s_BrokenCases[] = {
-      { "Empty", [] { return VBytes(); }, false, None },
-      { "ShortHeader", [] { return Mutated( []( VBytes& b, const VAssembled& ) { b.resize( 47 ); } ); }, false, None },
-      { "HeaderOnly", [] { return Mutated( []( VBytes& b, const VAssembled& ) { b.resize( 48 ); } ); }, false, None },
-      { "BadMagicFirstByte", [] { return Mutated( []( VBytes& b, const VAssembled& ) { b[0] = '$'; } ); }, false,
-        None },
-      { "BadMagicLastByte", [] { return Mutated( []( VBytes& b, const VAssembled& ) { b[19] = 0; } ); }, false, None },
-      { "FormatVersion2", [] { return Mutated( []( VBytes& b, const VAssembled& ) { PatchU32( b, 24, 2 ); } ); }, false,
-        None },
-      { "FormatVersion0", [] { return Mutated( []( VBytes& b, const VAssembled& ) { PatchU32( b, 24, 0 ); } ); }, false,
-        None },
+      { "Empty", []( B& b, F& ) { b.clear(); }, false, None },
+      { "ShortHeader", []( B& b, F& ) { b.resize( 47 ); }, false, None },
+      { "HeaderOnly", []( B& b, F& ) { b.resize( 48 ); }, false, None },
+      { "BadMagicFirstByte", []( B& b, F& ) { b[0] = '$'; }, false, None },
+      { "BadMagicLastByte", []( B& b, F& ) { b[19] = 0; }, false, None },
+      { "FormatVersion2", []( B& b, F& ) { PatchU32( b, 24, 2 ); }, false, None },
+      { "FormatVersion0", []( B& b, F& ) { PatchU32( b, 24, 0 ); }, false, None },
       { "AnySignatureAndRevision",
-        []
+        []( B& b, F& )
         {
-          return Mutated(
-              []( VBytes& b, const VAssembled& )
-              {
-                PatchU32( b, 20, 0xDEADBEEF );
-                PatchU32( b, 28, 0xFFFFFFFF );
-              } );
+          PatchU32( b, 20, 0xDEADBEEF );
+          PatchU32( b, 28, 0xFFFFFFFF );
         },
         true, All },
-      { "DescriptionBlockCut", [] { return Mutated( []( VBytes& b, const VAssembled& ) { b.resize( 48 + 20 ); } ); },
-        false, None },
-      { "AttributeBlockCut",
-        [] { return Mutated( []( VBytes& b, const VAssembled& ) { b.resize( BlocksEnd() - 1 ); } ); }, false, None },
-      { "NoPixelFormat", [] { return WithoutDescriptionKey( "VideoFrameInfo.PixelFormat" ); }, false, None },
-      { "NoImageHeight", [] { return WithoutDescriptionKey( "VideoFrameInfo.ImageHeight" ); }, false, None },
-      { "NoAudioPresent", [] { return WithoutDescriptionKey( "AudioFrameInfo.Present" ); }, false, None },
-      { "IndexOffsetAtEnd",
-        [] { return Mutated( []( VBytes& b, const VAssembled& ) { PatchU64( b, 40, b.size() ); } ); }, false, None },
-      { "IndexOffsetSevenBeforeEnd",
-        [] { return Mutated( []( VBytes& b, const VAssembled& ) { PatchU64( b, 40, b.size() - 7 ); } ); }, false,
-        None },
-      { "IndexOffsetPastEnd",
-        [] { return Mutated( []( VBytes& b, const VAssembled& ) { PatchU64( b, 40, b.size() + 4096 ); } ); }, false,
-        None },
-      { "IndexOffsetNegative",
-        [] { return Mutated( []( VBytes& b, const VAssembled& ) { PatchU64( b, 40, Largest ); } ); }, false, None },
-      { "EntryCountZero",
-        [] { return Mutated( []( VBytes& b, const VAssembled& f ) { PatchU64( b, f.IndexOffset, 0 ); } ); }, true,
-        None },
+      { "DescriptionBlockCut", []( B& b, F& ) { b.resize( 48 + 20 ); }, false, None },
+      { "AttributeBlockCut", []( B& b, F& ) { b.resize( BlocksEnd() - 1 ); }, false, None },
+      { "NoPixelFormat", WithoutKey( "VideoFrameInfo.PixelFormat" ), false, None },
+      { "NoImageHeight", WithoutKey( "VideoFrameInfo.ImageHeight" ), false, None },
+      { "NoAudioPresent", WithoutKey( "AudioFrameInfo.Present" ), false, None },
+      { "IndexOffsetAtEnd", []( B& b, F& ) { PatchU64( b, 40, b.size() ); }, false, None },
+      { "IndexOffsetSevenBeforeEnd", []( B& b, F& ) { PatchU64( b, 40, b.size() - 7 ); }, false, None },
+      { "IndexOffsetPastEnd", []( B& b, F& ) { PatchU64( b, 40, b.size() + 4096 ); }, false, None },
+      { "IndexOffsetNegative", []( B& b, F& ) { PatchU64( b, 40, Largest ); }, false, None },
+      { "EntryCountZero", []( B& b, F& f ) { PatchU64( b, f.IndexOffset, 0 ); }, true, None },
       // The entries that are there stay readable, as after any short read of the index.
-      { "EntryCountOneTooMany",
-        [] { return Mutated( []( VBytes& b, const VAssembled& f ) { PatchU64( b, f.IndexOffset, 4 ); } ); }, false,
-        All },
-      { "EntryCountHuge",
-        [] { return Mutated( []( VBytes& b, const VAssembled& f ) { PatchU64( b, f.IndexOffset, Largest / 2 ); } ); },
-        false, All },
-      { "IndexCut",
-        [] { return Mutated( []( VBytes& b, const VAssembled& ) { b.resize( b.size() - 3 ); } ); },
-        false,
-        { true, true, false } },
-      { "FrameNumberLargest",
-        [] { return Mutated( []( VBytes& b, const VAssembled& f ) { PatchU64( b, IndexEntry( f, 2 ), Largest ); } ); },
-        false,
-        { true, true, false } },
-      { "FrameOffsetAtEnd",
-        [] {
-          return Mutated( []( VBytes& b, const VAssembled& f ) { PatchU64( b, IndexEntry( f, 1 ) + 8, b.size() ); } );
-        },
-        true, AllButMiddle },
-      { "FrameOffsetLastByte",
-        [] {
-          return Mutated( []( VBytes& b, const VAssembled& f )
-                          { PatchU64( b, IndexEntry( f, 1 ) + 8, b.size() - 1 ); } );
-        },
-        true, AllButMiddle },
-      { "FrameOffsetNegative",
-        []
-        { return Mutated( []( VBytes& b, const VAssembled& f ) { PatchU64( b, IndexEntry( f, 1 ) + 8, Largest ); } ); },
-        true, AllButMiddle },
-      { "FrameOffsetLargestPositive",
-        [] {
-          return Mutated( []( VBytes& b, const VAssembled& f )
-                          { PatchU64( b, IndexEntry( f, 1 ) + 8, Largest / 2 ); } );
-        },
-        true, AllButMiddle },
-      { "ZeroAlignment", [] { return Mutated( []( VBytes& b, const VAssembled& ) { PatchU64( b, 32, 0 ); } ); }, true,
-        None },
-      { "AlignmentHuge",
-        [] { return Mutated( []( VBytes& b, const VAssembled& ) { PatchU64( b, 32, Largest / 2 + 2 ); } ); }, true,
-        None },
-      { "AudioByteCountHuge",
-        [] { return Mutated( []( VBytes& b, const VAssembled& f ) { PatchU32( b, f.RecordOffsets[1] + 16, ~0u ); } ); },
-        true, AllButMiddle },
-      { "AudioByteCountPastEnd",
-        [] {
-          return Mutated( []( VBytes& b, const VAssembled& f ) { PatchU32( b, f.RecordOffsets[1] + 16, b.size() ); } );
-        },
-        true, AllButMiddle },
+      { "EntryCountOneTooMany", []( B& b, F& f ) { PatchU64( b, f.IndexOffset, 4 ); }, false, All },
+      { "EntryCountHuge", []( B& b, F& f ) { PatchU64( b, f.IndexOffset, Largest / 2 ); }, false, All },
+      { "IndexCut", []( B& b, F& ) { b.resize( b.size() - 3 ); }, false, FirstTwo },
+      { "FrameNumberLargest", []( B& b, F& f ) { PatchU64( b, Entry( f, 2 ), Largest ); }, false, FirstTwo },
+      { "FrameOffsetAtEnd", []( B& b, F& f ) { PatchU64( b, Entry( f, 1 ) + 8, b.size() ); }, true, AllButMiddle },
+      { "FrameOffsetLastByte", []( B& b, F& f ) { PatchU64( b, Entry( f, 1 ) + 8, b.size() - 1 ); }, true,
+        AllButMiddle },
+      { "FrameOffsetNegative", []( B& b, F& f ) { PatchU64( b, Entry( f, 1 ) + 8, Largest ); }, true, AllButMiddle },
+      { "FrameOffsetLargestPositive", []( B& b, F& f ) { PatchU64( b, Entry( f, 1 ) + 8, Largest / 2 ); }, true,
+        AllButMiddle },
+      { "ZeroAlignment", []( B& b, F& ) { PatchU64( b, 32, 0 ); }, true, None },
+      { "AlignmentHuge", []( B& b, F& ) { PatchU64( b, 32, Largest / 2 + 2 ); }, true, None },
+      { "AudioByteCountHuge", []( B& b, F& f ) { PatchU32( b, f.RecordOffsets[1] + 16, ~0u ); }, true, AllButMiddle },
+      { "AudioByteCountPastEnd", []( B& b, F& f ) { PatchU32( b, f.RecordOffsets[1] + 16, b.size() ); }, true,
+        AllButMiddle },
       // A description whose frames could not fit in any file: nothing may be allocated for it.
-      { "HugeFrameSize",
-        [] { return WithDescription( MakeVideo( ZOL::PixelFormat_R8G8B8u8, 0x7FFFFFFF, 0x7FFFFFFF ), s_Audio ); }, true,
-        None },
-      { "FrameSizeJustBeyondTheFile",
-        [] { return WithDescription( MakeVideo( ZOL::PixelFormat_Luminance8, 1000, 1000 ), s_Audio ); }, true, None },
+      { "HugeFrameSize", Described( MakeVideo( ZOL::PixelFormat_R8G8B8u8, 0x7FFFFFFF, 0x7FFFFFFF ) ), true, None },
+      { "FrameSizeJustBeyondTheFile", Described( MakeVideo( ZOL::PixelFormat_Luminance8, 1000, 1000 ) ), true, None },
   };
 
-  void PrintTo( const VBrokenCase& i_rCase, std::ostream* o_pStream )
+  std::shared_ptr< UtilsIO::VMemoryInputStream > StreamOf( const VBytes& i_rBytes )
   {
-    *o_pStream << i_rCase.Name;
+    return std::make_shared< UtilsIO::VMemoryInputStream >( i_rBytes.data(), i_rBytes.size() );
   }
 
-  class LvidBrokenFile : public testing::TestWithParam< VBrokenCase >
+  TEST( LvidBrokenFile, FailsWithFalse )
   {
-  protected:
-    void SetUp() override
+    const VRecordingPlan Plan = SmallPlan();
+    const VAssembled File = Assemble( Plan );
+    for( const VBrokenCase& rCase : s_BrokenCases )
     {
+      SCOPED_TRACE( rCase.Name );
       // No failure of any kind may reach the log: in particular no allocation was attempted.
-      m_Sink = ZOL::GlobalLog().AddSink(
-          [this]( const ZOL::ILogRecord& i_rRecord ) { m_Lines.push_back( i_rRecord.Message ); }, ZOL::LogDetail );
-    }
-    void TearDown() override { ZOL::GlobalLog().RemoveSink( m_Sink ); }
-
-    int m_Sink = 0;
-    std::vector< std::string > m_Lines;
-  };
-
-  TEST_P( LvidBrokenFile, FailsWithFalse )
-  {
-    const VBrokenCase& rCase = GetParam();
-    const VBytes Bytes = rCase.Make();
-    LumekVideo::VReader Reader;
-    EXPECT_EQ( Reader.Open( std::make_shared< UtilsIO::VMemoryInputStream >( Bytes.data(), Bytes.size() ) ),
-               rCase.bOpens );
-    const VRecordingPlan Plan = BasePlan();
-    for( std::uint64_t Frame = 0; Frame < 3; ++Frame )
-    {
-      std::shared_ptr< ZOL::IBuffer > pVideo;
-      ZOL::IAudioBuffers Audio;
-      const bool bRead = Reader.ReadFrameData( Frame, pVideo, Audio, true, true );
-      EXPECT_EQ( bRead, rCase.Frames[Frame] ) << "frame " << Frame;
-      if( bRead )
+      LumekTest::VLogCapture Log;
+      VBytes Bytes = File.Bytes;
+      rCase.Break( Bytes, File );
+      LumekVideo::VReader Reader;
+      EXPECT_EQ( Reader.Open( StreamOf( Bytes ) ), rCase.bOpens );
+      for( std::uint64_t Frame = 0; Frame < 3; ++Frame )
       {
-        ASSERT_TRUE( pVideo );
-        EXPECT_EQ( VBytes( pVideo->GetData(), pVideo->GetData() + pVideo->GetSize() ), Plan.Records[Frame].Video );
+        const auto Read = ReadBytes( Reader, Frame );
+        EXPECT_EQ( Read.has_value(), rCase.Frames[Frame] ) << "frame " << Frame;
+        if( Read )
+        {
+          EXPECT_EQ( Read->Video, Plan.Records[Frame].Video ) << "frame " << Frame;
+        }
       }
+      EXPECT_TRUE( Log.Messages.empty() ) << Log.Messages.front();
     }
-    EXPECT_TRUE( m_Lines.empty() ) << m_Lines.front();
-  }
-
-  INSTANTIATE_TEST_SUITE_P( Cases, LvidBrokenFile, testing::ValuesIn( s_BrokenCases ),
-                            []( const testing::TestParamInfo< VBrokenCase >& i_rInfo ) { return i_rInfo.param.Name; } );
-
-  TEST( LvidReader, DescriptionWithoutVideoOpensWithEmptyFrames )
-  {
-    // "VideoFrameInfo.Present" false is a valid description of no video: such a recording
-    // opens, and its frames are their audio alone.
-    VRecordingPlan Plan = BasePlan();
-    Plan.DescriptionBlock = DescriptionBlock( ZOL::IVideoFrameInfo(), s_Audio );
-    for( VRecord& rRecord : Plan.Records )
-      rRecord.Video.clear();
-    const VBytes Bytes = Assemble( Plan ).Bytes;
-    LumekVideo::VReader Reader;
-    ASSERT_TRUE( Reader.Open( std::make_shared< UtilsIO::VMemoryInputStream >( Bytes.data(), Bytes.size() ) ) );
-    EXPECT_FALSE( Reader.GetVideoFrameInfo().IsValid() );
-    std::shared_ptr< ZOL::IBuffer > pVideo;
-    ZOL::IAudioBuffers Audio;
-    ASSERT_TRUE( Reader.ReadFrameData( 2, pVideo, Audio, true, true ) );
-    EXPECT_EQ( pVideo->GetSize(), 0u );
-    EXPECT_EQ( VBytes( Audio.at( 0 )->GetData(), Audio.at( 0 )->GetData() + Audio.at( 0 )->GetSize() ),
-               *Plan.Records[2].Audio );
   }
 
   TEST( LvidBrokenFile, ZeroAlignmentStillGivesVideoAlone )
   {
-    // Without audio there is no alignment step, so the pixels of such a file can still be read.
-    const VBytes Bytes = Mutated( []( VBytes& b, const VAssembled& ) { PatchU64( b, 32, 0 ); } );
+    // Without sound there is no alignment step, so the pixels of such a file can still be read.
+    VBytes Bytes = Assemble( SmallPlan() ).Bytes;
+    PatchU64( Bytes, 32, 0 );
     LumekVideo::VReader Reader;
-    ASSERT_TRUE( Reader.Open( std::make_shared< UtilsIO::VMemoryInputStream >( Bytes.data(), Bytes.size() ) ) );
-    std::shared_ptr< ZOL::IBuffer > pVideo;
-    ZOL::IAudioBuffers Audio;
-    EXPECT_TRUE( Reader.ReadFrameData( 1, pVideo, Audio, true, false ) );
-    EXPECT_FALSE( Reader.ReadFrameData( 1, pVideo, Audio, false, true ) );
+    ASSERT_TRUE( Reader.Open( StreamOf( Bytes ) ) );
+    EXPECT_TRUE( ReadBytes( Reader, 1, true, false ) );
+    EXPECT_FALSE( ReadBytes( Reader, 1, false, true ) );
+  }
+
+  TEST( LvidReader, DescriptionWithoutVideoOpensWithEmptyFrames )
+  {
+    // "VideoFrameInfo.Present" false is a valid description of no video: such a recording
+    // opens, and its frames are their sound alone.
+    VRecordingPlan Plan = SmallPlan();
+    Plan.DescriptionBlock = DescriptionBlock( ZOL::IVideoFrameInfo(), s_Stereo16 );
+    for( VRecord& rRecord : Plan.Records )
+      rRecord.Video.clear();
+    const VBytes Bytes = Assemble( Plan ).Bytes;
+    LumekVideo::VReader Reader;
+    ASSERT_TRUE( Reader.Open( StreamOf( Bytes ) ) );
+    EXPECT_FALSE( Reader.GetVideoFrameInfo().IsValid() );
+    const auto Read = ReadBytes( Reader, 2 );
+    ASSERT_TRUE( Read );
+    EXPECT_TRUE( Read->Video.empty() );
+    EXPECT_EQ( Read->Audio.at( 0 ), *Plan.Records[2].Audio );
   }
 
   // Reads everything a damaged file offers; what matters is that it returns.
-  void ReadEverything( const VBytes& i_rBytes, bool& o_rOpened )
+  bool OpenAndReadEverything( const VBytes& i_rBytes )
   {
     LumekVideo::VReader Reader;
-    o_rOpened = Reader.Open( std::make_shared< UtilsIO::VMemoryInputStream >( i_rBytes.data(), i_rBytes.size() ) );
+    const bool bOpened = Reader.Open( StreamOf( i_rBytes ) );
     for( std::uint64_t Frame = 0; Frame < 8; ++Frame )
-    {
-      std::shared_ptr< ZOL::IBuffer > pVideo;
-      ZOL::IAudioBuffers Audio;
-      Reader.ReadFrameData( Frame, pVideo, Audio, true, true );
-      Reader.ReadFrameData( Frame, pVideo, Audio, false, true );
-      Reader.ReadFrameData( Frame, pVideo, Audio, true, false );
-    }
+      for( const auto& [bVideo, bAudio] :
+           { std::pair( true, true ), std::pair( false, true ), std::pair( true, false ) } )
+        ReadBytes( Reader, Frame, bVideo, bAudio );
+    return bOpened;
   }
 
   TEST( LvidDamageSweep, EveryCutFailsToOpen )
   {
     // The index is the last thing in a recording, so every shorter file lacks part of it.
-    const VBytes Whole = Assemble( BasePlan() ).Bytes;
+    const VBytes Whole = Assemble( SmallPlan() ).Bytes;
     for( std::size_t Length = 0; Length < Whole.size(); ++Length )
-    {
-      bool bOpened = true;
-      ReadEverything( VBytes( Whole.begin(), Whole.begin() + Length ), bOpened );
-      EXPECT_FALSE( bOpened ) << "cut at " << Length;
-    }
+      EXPECT_FALSE( OpenAndReadEverything( VBytes( Whole.begin(), Whole.begin() + Length ) ) ) << "cut at " << Length;
   }
 
   TEST( LvidDamageSweep, EveryFlippedByteReturns )
   {
-    const VAssembled File = Assemble( BasePlan() );
+    const VAssembled File = Assemble( SmallPlan() );
     for( std::size_t Position = 0; Position < File.Bytes.size(); ++Position )
       for( std::uint8_t Mask : { 0x01, 0x80, 0xFF } )
       {
         VBytes Bytes = File.Bytes;
         Bytes[Position] ^= Mask;
-        bool bOpened = false;
-        ReadEverything( Bytes, bOpened );
+        const bool bOpened = OpenAndReadEverything( Bytes );
         // Opening never reads the records: damage there shows only when a frame is read.
-        const bool bInRecords = Position >= File.RecordOffsets.front() && Position < File.IndexOffset;
-        if( bInRecords )
+        if( Position >= File.RecordOffsets.front() && Position < File.IndexOffset )
         {
           EXPECT_TRUE( bOpened ) << "flip at " << Position;
         }
       }
   }
-} // namespace
 
-namespace
-{
   // Fails the n-th seek from the moment it is told to.
   class VSeekFailingStream : public UtilsIO::VMemoryInputStream
   {
@@ -331,13 +236,13 @@ namespace
     int m_FailingSeek = 0;
   };
 
-  // Audio alone skips the video by a seek; reading on after a failed one would take the video's
-  // bytes for the audio's count and samples.
+  // Sound alone skips the video by a seek; reading on after a failed one would take the video's
+  // bytes for the sound's count and samples.
   TEST( LvidReader, AudioAloneFailsWhenTheSeekPastTheVideoFails )
   {
-    // The video itself starts like an audio block, so that reading on from the wrong place
+    // The video itself starts like a sound block, so that reading on from the wrong place
     // would seem to work.
-    VRecordingPlan Plan = BasePlan();
+    VRecordingPlan Plan = SmallPlan();
     Plan.Records[0].Video = { 4, 0, 0, 0, 0xA1, 0xA2, 0xA3, 0xA4, 9, 9, 9, 9, 9, 9, 9 };
     const VBytes Bytes = Assemble( Plan ).Bytes;
     for( const bool bFail : { false, true } )
@@ -347,14 +252,11 @@ namespace
       ASSERT_TRUE( Reader.Open( pStream ) );
       // The first seek goes to the frame, the second past its video.
       pStream->FailSeek( bFail ? 2 : 0 );
-      std::shared_ptr< ZOL::IBuffer > pVideo;
-      ZOL::IAudioBuffers Audio;
-      const bool bRead = Reader.ReadFrameData( 0, pVideo, Audio, false, true );
-      EXPECT_EQ( bRead, !bFail );
-      if( bRead )
+      const auto Read = ReadBytes( Reader, 0, false, true );
+      EXPECT_EQ( Read.has_value(), !bFail );
+      if( Read )
       {
-        ASSERT_EQ( Audio.size(), 1u );
-        EXPECT_EQ( VBytes( Audio[0]->GetData(), Audio[0]->GetData() + Audio[0]->GetSize() ), *Plan.Records[0].Audio );
+        EXPECT_EQ( Read->Audio, std::vector< VBytes >{ *Plan.Records[0].Audio } );
       }
     }
   }

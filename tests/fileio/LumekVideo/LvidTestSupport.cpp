@@ -1,5 +1,6 @@
 #include "tests/fileio/LumekVideo/LvidTestSupport.h"
 
+#include "fileio/LumekVideo/VWriter.h"
 #include "utils/MemoryStream.h"
 #include "videointerface/AttributeRecords.h"
 
@@ -39,16 +40,15 @@ namespace LumekVideoTest
     return U64( Bits );
   }
 
-  VByteWriter& VByteWriter::Raw( const void* i_pData, std::size_t i_Size )
+  VByteWriter& VByteWriter::Raw( const VBytes& i_rBytes )
   {
-    const auto* pBytes = static_cast< const std::uint8_t* >( i_pData );
-    Bytes.insert( Bytes.end(), pBytes, pBytes + i_Size );
+    Bytes.insert( Bytes.end(), i_rBytes.begin(), i_rBytes.end() );
     return *this;
   }
 
-  VByteWriter& VByteWriter::Zeros( std::size_t i_Count )
+  VByteWriter& VByteWriter::Text( const std::string& i_rText )
   {
-    Bytes.resize( Bytes.size() + i_Count, 0 );
+    Bytes.insert( Bytes.end(), i_rText.begin(), i_rText.end() );
     return *this;
   }
 
@@ -67,8 +67,8 @@ namespace LumekVideoTest
 
   void PatchU64( VBytes& io_rBytes, std::size_t i_Offset, std::uint64_t i_Value )
   {
-    for( int i = 0; i < 8; ++i )
-      io_rBytes.at( i_Offset + i ) = static_cast< std::uint8_t >( i_Value >> ( 8 * i ) );
+    PatchU32( io_rBytes, i_Offset, static_cast< std::uint32_t >( i_Value ) );
+    PatchU32( io_rBytes, i_Offset + 4, static_cast< std::uint32_t >( i_Value >> 32 ) );
   }
 
   VBytes PatternBytes( std::size_t i_Size, std::uint32_t i_Seed )
@@ -114,24 +114,17 @@ namespace LumekVideoTest
       File.Raw( rRecord.Video ).PadTo( i_rPlan.Alignment );
       if( rRecord.Audio )
       {
-        File.U32( rRecord.AudioByteCount ? *rRecord.AudioByteCount
-                                         : static_cast< std::uint32_t >( rRecord.Audio->size() ) );
+        File.U32( rRecord.AudioByteCount.value_or( static_cast< std::uint32_t >( rRecord.Audio->size() ) ) );
         File.Raw( *rRecord.Audio ).PadTo( i_rPlan.Alignment );
       }
     }
     Result.IndexOffset = File.Size();
-    if( i_rPlan.Index )
-    {
-      File.U64( i_rPlan.Index->size() );
-      for( const auto& rEntry : *i_rPlan.Index )
-        File.U64( rEntry.first ).U64( rEntry.second );
-    }
-    else
-    {
-      File.U64( i_rPlan.Records.size() );
-      for( std::size_t i = 0; i < i_rPlan.Records.size(); ++i )
-        File.U64( i_rPlan.Records[i].FrameNumber ).U64( Result.RecordOffsets[i] );
-    }
+    std::vector< std::pair< std::uint64_t, std::uint64_t > > Index;
+    for( std::size_t i = 0; i < i_rPlan.Records.size(); ++i )
+      Index.emplace_back( i_rPlan.Records[i].FrameNumber, Result.RecordOffsets[i] );
+    File.U64( i_rPlan.Index.value_or( Index ).size() );
+    for( const auto& rEntry : i_rPlan.Index.value_or( Index ) )
+      File.U64( rEntry.first ).U64( rEntry.second );
     PatchU64( File.Bytes, 40, Result.IndexOffset );
     Result.Bytes = std::move( File.Bytes );
     return Result;
@@ -141,10 +134,9 @@ namespace LumekVideoTest
                                 const std::vector< std::pair< std::uint64_t, std::size_t > >& i_rFrameToRecord )
   {
     const VAssembled Plain = Assemble( i_Plan );
-    std::vector< std::pair< std::uint64_t, std::uint64_t > > Index;
+    i_Plan.Index.emplace();
     for( const auto& rEntry : i_rFrameToRecord )
-      Index.emplace_back( rEntry.first, Plain.RecordOffsets.at( rEntry.second ) );
-    i_Plan.Index = std::move( Index );
+      i_Plan.Index->emplace_back( rEntry.first, Plain.RecordOffsets.at( rEntry.second ) );
     return Assemble( i_Plan );
   }
 
@@ -184,10 +176,60 @@ namespace LumekVideoTest
     return Attributes;
   }
 
+  VRecordingPlan SmallPlan()
+  {
+    VRecordingPlan Plan;
+    Plan.DescriptionBlock = DescriptionBlock( s_SmallVideo, s_Stereo16 );
+    Plan.AttributeBlock = SerialiseStore( MakeFileAttributes() );
+    Plan.Alignment = 16;
+    for( std::uint32_t i = 0; i < 3; ++i )
+      Plan.Records.push_back( { i, PatternBytes( 15, i ), PatternBytes( 4 * ( i + 1 ), 40 + i ), std::nullopt } );
+    return Plan;
+  }
+
+  VBytes WriteToMemory( const ZOL::IVideoFrameInfo& i_rVideo, const ZOL::IAudioFrameInfo& i_rAudio,
+                        const std::vector< VFrameContent >& i_rFrames, std::uint64_t i_Alignment )
+  {
+    auto pStream = std::make_shared< UtilsIO::VMemoryStream >();
+    LumekVideo::VWriter Writer;
+    if( !Writer.Create( pStream, i_rVideo, i_rAudio, MakeFileAttributes(), i_Alignment ) )
+      return {};
+    for( const VFrameContent& rFrame : i_rFrames )
+      if( !Writer.AppendFrame( rFrame.FrameNumber, rFrame.Video.data(), rFrame.Video.size(),
+                               rFrame.Audio.empty() ? nullptr : rFrame.Audio.data(), rFrame.Audio.size() ) )
+        return {};
+    return Writer.Close() ? pStream->GetData() : VBytes();
+  }
+
+  VMemoryRecording::VMemoryRecording( VBytes i_Bytes ) : Bytes( std::move( i_Bytes ) )
+  {
+    bOpened = Reader.Open( std::make_shared< UtilsIO::VMemoryInputStream >( Bytes.data(), Bytes.size() ) );
+  }
+
+  VBytes BytesOf( const ZOL::IBufferConst& i_rBuffer )
+  {
+    return VBytes( i_rBuffer.GetData(), i_rBuffer.GetData() + i_rBuffer.GetSize() );
+  }
+
+  std::optional< VFrameBytes > ReadBytes( LumekVideo::VReader& io_rReader, std::uint64_t i_Frame, bool i_bVideo,
+                                          bool i_bAudio )
+  {
+    std::shared_ptr< ZOL::IBuffer > pVideo;
+    ZOL::IAudioBuffers Audio;
+    if( !io_rReader.ReadFrameData( i_Frame, pVideo, Audio, i_bVideo, i_bAudio ) )
+      return std::nullopt;
+    VFrameBytes Result;
+    if( pVideo )
+      Result.Video = BytesOf( *pVideo );
+    for( const auto& rpBlock : Audio )
+      Result.Audio.push_back( BytesOf( *rpBlock ) );
+    return Result;
+  }
+
   VTempDir::VTempDir()
   {
-    const boost::filesystem::path Base = boost::filesystem::temp_directory_path();
-    const boost::filesystem::path Dir = Base / boost::filesystem::unique_path( "lvid-test-%%%%-%%%%-%%%%" );
+    const boost::filesystem::path Dir =
+        boost::filesystem::temp_directory_path() / boost::filesystem::unique_path( "lvid-test-%%%%-%%%%-%%%%" );
     boost::filesystem::create_directories( Dir );
     m_Path = Dir.string();
   }

@@ -3,6 +3,7 @@
 // Recordings for the .lvid tests, assembled byte by byte here, apart from the writer, so that a
 // mistake in the writer's layout cannot hide behind the same mistake in the reader.
 
+#include "fileio/LumekVideo/VReader.h"
 #include "videointerface/IVideoAttributes.h"
 #include "videointerface/IVideoFrameInfo.h"
 
@@ -25,10 +26,8 @@ namespace LumekVideoTest
     VByteWriter& U32( std::uint32_t i_Value );
     VByteWriter& U64( std::uint64_t i_Value );
     VByteWriter& F64( double i_Value );
-    VByteWriter& Raw( const void* i_pData, std::size_t i_Size );
-    VByteWriter& Raw( const VBytes& i_rBytes ) { return Raw( i_rBytes.data(), i_rBytes.size() ); }
-    VByteWriter& Text( const std::string& i_rText ) { return Raw( i_rText.data(), i_rText.size() ); }
-    VByteWriter& Zeros( std::size_t i_Count );
+    VByteWriter& Raw( const VBytes& i_rBytes );
+    VByteWriter& Text( const std::string& i_rText );
     VByteWriter& PadTo( std::uint64_t i_Alignment );
 
     std::size_t Size() const { return Bytes.size(); }
@@ -62,8 +61,7 @@ namespace LumekVideoTest
     VBytes AttributeBlock;
     std::uint64_t Alignment = 64;
     std::vector< VRecord > Records;
-    // Entries to write instead of one per record, in order; offsets are those of the records'
-    // positions when given as a record number through RecordOffset.
+    // (frame number, record offset) entries to write instead of one per record, in order.
     std::optional< std::vector< std::pair< std::uint64_t, std::uint64_t > > > Index;
   };
 
@@ -75,7 +73,7 @@ namespace LumekVideoTest
   };
 
   VAssembled Assemble( const VRecordingPlan& i_rPlan );
-  // The same plan with the index replaced, now that the record offsets are known.
+  // The same plan with an index of (frame number, record number) entries.
   VAssembled AssembleWithIndex( VRecordingPlan i_Plan,
                                 const std::vector< std::pair< std::uint64_t, std::size_t > >& i_rFrameToRecord );
 
@@ -84,6 +82,42 @@ namespace LumekVideoTest
   ZOL::IAudioFrameInfo MakeAudio( ZOL::EAudioSampleFormat i_Format, int i_Channels, int i_Rate = 48000 );
   // File attributes with timing, settings and a key of the recording's own.
   ZOL::IVideoAttributes MakeFileAttributes();
+
+  // Frames 0, 1 and 2 of 5 x 3 Luminance8 with 16-bit stereo sound, aligned to 16: small enough
+  // to cut and damage at every byte.
+  inline const ZOL::IVideoFrameInfo s_SmallVideo = MakeVideo( ZOL::PixelFormat_Luminance8, 5, 3 );
+  inline const ZOL::IAudioFrameInfo s_Stereo16 = MakeAudio( ZOL::AudioSampleFormat_Int16, 2 );
+  VRecordingPlan SmallPlan();
+
+  struct VFrameContent
+  {
+    std::uint64_t FrameNumber;
+    VBytes Video;
+    VBytes Audio;
+  };
+
+  // The writer's recording of these frames, or nothing when any call fails.
+  VBytes WriteToMemory( const ZOL::IVideoFrameInfo& i_rVideo, const ZOL::IAudioFrameInfo& i_rAudio,
+                        const std::vector< VFrameContent >& i_rFrames, std::uint64_t i_Alignment );
+
+  // A reader of a recording held in memory.
+  struct VMemoryRecording
+  {
+    explicit VMemoryRecording( VBytes i_Bytes );
+    VBytes Bytes;
+    LumekVideo::VReader Reader;
+    bool bOpened = false;
+  };
+
+  VBytes BytesOf( const ZOL::IBufferConst& i_rBuffer );
+  // What ReadFrameData gave, copied out, or nothing when it failed.
+  struct VFrameBytes
+  {
+    VBytes Video;
+    std::vector< VBytes > Audio;
+  };
+  std::optional< VFrameBytes > ReadBytes( LumekVideo::VReader& io_rReader, std::uint64_t i_Frame, bool i_bVideo = true,
+                                          bool i_bAudio = true );
 
   // A folder of its own under the test temp folder, removed with everything in it.
   class VTempDir

@@ -1,7 +1,6 @@
 // Writes the small recordings the .lvid fuzz target starts from: lvid_make_seeds <folder>.
 // Small alignments keep them to a few hundred bytes, so that mutations reach every part.
 
-#include "fileio/LumekVideo/VWriter.h"
 #include "tests/fileio/LumekVideo/LvidTestSupport.h"
 
 #include <iostream>
@@ -17,25 +16,21 @@ namespace
     ZOL::IAudioFrameInfo Audio;
     std::uint64_t Alignment;
     std::vector< std::uint64_t > Frames;
-    std::uint64_t AudioBytes;
+    std::size_t AudioBytes;
   };
 
   bool WriteSeed( const std::string& i_rFolder, const VSeed& i_rSeed )
   {
-    const std::string Path = i_rFolder + "/" + i_rSeed.Name;
-    LumekVideo::VWriter Writer;
-    if( !Writer.Create( Path, i_rSeed.Video, i_rSeed.Audio, MakeFileAttributes(), i_rSeed.Alignment ) )
-      return false;
+    std::vector< VFrameContent > Frames;
     std::uint32_t Seed = 1;
     for( const std::uint64_t Frame : i_rSeed.Frames )
     {
-      const VBytes Video = PatternBytes( Writer.GetVideoFrameSize(), Seed++ );
-      const VBytes Audio = PatternBytes( i_rSeed.AudioBytes, Seed++ );
-      if( !Writer.AppendFrame( Frame, Video.data(), Video.size(), Audio.empty() ? nullptr : Audio.data(),
-                               Audio.size() ) )
-        return false;
+      Frames.push_back( { Frame, PatternBytes( ZOL::GetVideoFrameSizeInBytes( i_rSeed.Video ), Seed ),
+                          PatternBytes( i_rSeed.AudioBytes, Seed + 1 ) } );
+      Seed += 2;
     }
-    return Writer.Close();
+    const VBytes Bytes = WriteToMemory( i_rSeed.Video, i_rSeed.Audio, Frames, i_rSeed.Alignment );
+    return !Bytes.empty() && WriteFile( i_rFolder + "/" + i_rSeed.Name, Bytes );
   }
 } // namespace
 
@@ -50,12 +45,7 @@ int main( int argc, char** argv )
       // Frames out of order with a gap, no audio.
       { "gaps.lvid", MakeVideo( ZOL::PixelFormat_Luminance8, 4, 2 ), ZOL::IAudioFrameInfo(), 16, { 1, 0, 3 }, 0 },
       // Stereo 16-bit audio with a partial sample group, and a frame written twice.
-      { "audio.lvid",
-        MakeVideo( ZOL::PixelFormat_R8G8B8, 3, 1 ),
-        MakeAudio( ZOL::AudioSampleFormat_Int16, 2 ),
-        8,
-        { 0, 1, 1 },
-        10 },
+      { "audio.lvid", MakeVideo( ZOL::PixelFormat_R8G8B8, 3, 1 ), s_Stereo16, 8, { 0, 1, 1 }, 10 },
       // A packed format whose size is not a whole number of pixels, with 24-bit audio.
       { "packed.lvid",
         MakeVideo( ZOL::PixelFormat_BayerGB7, 3, 3 ),
