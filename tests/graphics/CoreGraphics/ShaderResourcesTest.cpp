@@ -6,7 +6,6 @@
 #include "graphics/CoreGraphics/VShaderProgram.h"
 #include "tests/graphics/CoreGraphics/DisplayTestMain.h"
 #include "tests/support/LogCapture.h"
-#include "tests/support/TestNames.h"
 
 #include <QDir>
 #include <QFile>
@@ -29,6 +28,8 @@ namespace
   using CoreGraphics::VShader;
   using CoreGraphics::VShaderProgram;
 
+  // A current context on an offscreen surface, the viewer's resources loaded and a render
+  // context over them.
   class ShaderResourcesTest : public ::testing::Test
   {
   protected:
@@ -39,141 +40,154 @@ namespace
       m_Surface.create();
       ASSERT_TRUE( m_Context.create() );
       ASSERT_TRUE( m_Context.makeCurrent( &m_Surface ) );
+      m_pResources = std::make_unique< VResources >( false, QDir::currentPath() );
+      m_pResources->Load();
+      m_pRender = std::make_unique< CoreGraphics::VRenderContext >();
+      m_pRender->Initialise();
     }
     void TearDown() override
     {
+      m_pRender.reset();
+      m_pResources.reset();
       if( QOpenGLContext::currentContext() == &m_Context )
         m_Context.doneCurrent();
     }
 
+    // Draws a quad over the whole clip square through (Simple3D, UniformColour) in i_Colour,
+    // into a framebuffer object cleared to i_Clear, and reads the picture back.
+    QImage DrawQuad( int i_Size, const QVector4D& i_Colour, const QColor& i_Clear,
+                     const CoreGraphics::VRenderState& i_rState, const QMatrix4x4& i_Projection = QMatrix4x4() )
+    {
+      CoreGraphics::VRenderContext& rContext = *m_pRender;
+      QOpenGLFramebufferObject Framebuffer( i_Size, i_Size );
+      EXPECT_TRUE( Framebuffer.isValid() );
+      rContext.BindFramebuffer( &Framebuffer );
+      EXPECT_TRUE( rContext.FramebufferComplete() );
+      rContext.SetViewport( QRect( 0, 0, i_Size, i_Size ) );
+      rContext.SetClearColour( i_Clear );
+      rContext.Clear( true, false );
+      rContext.SetProjection( i_Projection );
+      std::shared_ptr< VShaderProgram > pProgram = m_pResources->GetProgram( "Simple3D", "UniformColour" );
+      EXPECT_TRUE( rContext.UseProgram( pProgram ) );
+      pProgram->SetUniform( pProgram->UniformLocation( "u_colour" ), i_Colour );
+
+      CoreGraphics::VMesh Mesh;
+      const float Corners[] = { -1, -1, 0, 1, -1, 0, 1, 1, 0, -1, 1, 0 };
+      EXPECT_TRUE( Mesh.Vertices.Create( CoreGraphics::VVertexLayout::Position3D(), Corners, sizeof( Corners ) ) );
+      EXPECT_TRUE( Mesh.Indices.Create( std::vector< std::uint16_t >{ 0, 1, 2, 0, 2, 3 } ) );
+      rContext.ApplyState( i_rState );
+      rContext.BindVertexBuffer( Mesh.Vertices );
+      rContext.DrawIndexed( GL_TRIANGLES, Mesh.Indices );
+      const QImage Picture = Framebuffer.toImage();
+      rContext.ResetState();
+      rContext.UnbindFramebuffer();
+      return Picture;
+    }
+
     QOffscreenSurface m_Surface;
     QOpenGLContext m_Context;
+    std::unique_ptr< VResources > m_pResources;
+    std::unique_ptr< CoreGraphics::VRenderContext > m_pRender;
   };
 
-  // clang-format off
-  const char* const VertexStages[] = { "ColoredLine", "Simple", "Simple3D", "Simple3DModel", "Simple3DModelColour",
-                                       "Simple3DModelWireframe", "Simple3DPointSize", "Simple3DUniformColour",
-                                       "Simple3DVertexColour", "SimpleColour", "Video" };
-  // clang-format on
-  const char* const FragmentStages[] = { "Colour",         "ImageSet",      "SimpleLighting",
-                                         "StippledLine",   "UniformColour", "VideoBayer",
-                                         "VideoLuminance", "VideoRaw",      "VideoYUV" };
-
-  TEST_F( ShaderResourcesTest, EveryStageOfTheResourcesCompiles )
+  TEST_F( ShaderResourcesTest, EveryStageCompilesAndEveryProgramLinks )
   {
     LumekTest::VLogCapture Log( "CoreGraphics" );
     VResources Resources( false, QDir::currentPath() );
     Resources.Load();
-
-    QStringList ExpectedVertex, ExpectedFragment;
-    for( const char* pName : VertexStages )
-      ExpectedVertex << pName;
-    for( const char* pName : FragmentStages )
-      ExpectedFragment << pName;
-    EXPECT_EQ( Resources.GetShaderNames( VShader::Kind_Vertex ), ExpectedVertex );
-    EXPECT_EQ( Resources.GetShaderNames( VShader::Kind_Fragment ), ExpectedFragment );
-    for( const char* pName : VertexStages )
-      EXPECT_TRUE( Resources.GetShader( VShader::Kind_Vertex, pName )->IsCompiled() ) << pName;
-    for( const char* pName : FragmentStages )
-      EXPECT_TRUE( Resources.GetShader( VShader::Kind_Fragment, pName )->IsCompiled() ) << pName;
+    const QStringList Vertex = { "ColoredLine",
+                                 "Simple",
+                                 "Simple3D",
+                                 "Simple3DModel",
+                                 "Simple3DModelColour",
+                                 "Simple3DModelWireframe",
+                                 "Simple3DPointSize",
+                                 "Simple3DUniformColour",
+                                 "Simple3DVertexColour",
+                                 "SimpleColour",
+                                 "Video" };
+    const QStringList Fragment = { "Colour",     "ImageSet",       "SimpleLighting", "StippledLine", "UniformColour",
+                                   "VideoBayer", "VideoLuminance", "VideoRaw",       "VideoYUV" };
+    EXPECT_EQ( Resources.GetShaderNames( VShader::Kind_Vertex ), Vertex );
+    EXPECT_EQ( Resources.GetShaderNames( VShader::Kind_Fragment ), Fragment );
+    for( const QString& rName : Vertex )
+      EXPECT_TRUE( Resources.GetShader( VShader::Kind_Vertex, rName )->IsCompiled() ) << rName.toStdString();
+    for( const QString& rName : Fragment )
+      EXPECT_TRUE( Resources.GetShader( VShader::Kind_Fragment, rName )->IsCompiled() ) << rName.toStdString();
     EXPECT_FALSE( Log.Contains( "Failed" ) );
-  }
 
-  struct VProgramCase
-  {
-    const char* Vertex;
-    const char* Fragment;
-    std::vector< std::string > Uniforms;
-  };
-
-  class ProgramLinkTest : public ShaderResourcesTest, public ::testing::WithParamInterface< VProgramCase >
-  {
-  };
-
-  // The five programs of the viewer, and the general-purpose stages in the pairs they are written for.
-  TEST_P( ProgramLinkTest, LinksAndFindsItsUniformsByHash )
-  {
-    VResources Resources( false, QDir::currentPath() );
-    Resources.Load();
-    const VProgramCase& rCase = GetParam();
-    std::shared_ptr< VShaderProgram > pProgram = Resources.GetProgram( rCase.Vertex, rCase.Fragment );
-    ASSERT_TRUE( pProgram );
-    ASSERT_TRUE( pProgram->IsLinked() );
-    EXPECT_EQ( Resources.GetProgram( rCase.Vertex, rCase.Fragment ), pProgram ) << "a pair is linked once";
-
-    for( const std::string& rName : rCase.Uniforms )
+    // The five programs of the viewer, and the general-purpose stages in the pairs they are
+    // written for, with the uniforms each is driven through, found by name and by hash.
+    const struct
     {
-      const int Location = pProgram->UniformLocation( rName.c_str() );
-      EXPECT_GE( Location, 0 ) << rName;
-      EXPECT_EQ( pProgram->UniformLocationByHash( CoreGraphics::MurmurHash3_32( rName ) ), Location ) << rName;
-    }
-    EXPECT_EQ( pProgram->UniformLocation( "u_NotThere" ), -1 );
-    EXPECT_EQ( pProgram->UniformLocationByHash( CoreGraphics::MurmurHash3_32( "u_NotThere" ) ), -1 );
-  }
-
-  const VProgramCase ProgramCases[] = {
-      { "Video",
-        "VideoRaw",
-        { "u_View2D", "u_SensorSize", "u_RadialDistortionCentre", "u_RadialDistortionParameters", "u_Rotation",
-          "u_RotationCentre", "u_VideoScaleAndOffset", "u_Inverted", "t_DiffuseTexture", "u_Swizzle" } },
-      { "Video", "VideoBayer", { "t_DiffuseTexture", "u_Resolution", "u_FirstRed", "u_ColourCorrection" } },
-      { "Video", "VideoLuminance", { "t_DiffuseTexture", "u_Inverted" } },
-      { "Video", "VideoYUV", { "t_DiffuseTexture", "u_Swizzle", "u_Resolution" } },
-      { "Video", "UniformColour", { "u_colour", "u_View2D" } },
-      { "Video", "ImageSet", { "t_DiffuseTexture", "u_ColourTint" } },
-      { "Simple", "UniformColour", { "u_colour" } },
-      { "SimpleColour", "Colour", {} },
-      { "Simple3D", "UniformColour", { "u_ViewProjection", "u_colour" } },
-      { "Simple3DPointSize", "UniformColour", { "u_ViewProjection", "u_PointSize" } },
-      { "Simple3DUniformColour", "Colour", { "u_ViewProjection", "u_Colour" } },
-      { "Simple3DVertexColour", "Colour", { "u_ViewProjection" } },
-      { "Simple3DModel", "SimpleLighting", { "u_ViewProjection", "u_ModelTransform", "u_View", "u_Up" } },
-      { "Simple3DModelColour", "SimpleLighting", { "u_ModelTransform", "u_ModelColour" } },
-      { "Simple3DModelWireframe", "Colour", { "u_ViewProjection", "u_ModelTransform" } },
-      { "ColoredLine", "StippledLine", { "u_ViewProjection", "u_SourcePoint", "u_ModelColour" } },
-  };
-
-  INSTANTIATE_TEST_SUITE_P( Resources, ProgramLinkTest, ::testing::ValuesIn( ProgramCases ),
-                            []( const ::testing::TestParamInfo< VProgramCase >& i_rInfo )
-                            { return std::string( i_rInfo.param.Vertex ) + "_" + i_rInfo.param.Fragment; } );
-
-  TEST_F( ShaderResourcesTest, MissingOrBrokenStagesGiveNoProgramAndALogLine )
-  {
-    QTemporaryDir Directory;
-    ASSERT_TRUE( Directory.isValid() );
-    const QString BrokenPath = Directory.filePath( "Broken.glsl" );
+      const char* Vertex;
+      const char* Fragment;
+      std::vector< std::string > Uniforms;
+    } Programs[] = {
+        { "Video",
+          "VideoRaw",
+          { "u_View2D", "u_SensorSize", "u_RadialDistortionCentre", "u_RadialDistortionParameters", "u_Rotation",
+            "u_RotationCentre", "u_VideoScaleAndOffset", "u_Inverted", "t_DiffuseTexture", "u_Swizzle" } },
+        { "Video", "VideoBayer", { "t_DiffuseTexture", "u_Resolution", "u_FirstRed", "u_ColourCorrection" } },
+        { "Video", "VideoLuminance", { "t_DiffuseTexture", "u_Inverted" } },
+        { "Video", "VideoYUV", { "t_DiffuseTexture", "u_Swizzle", "u_Resolution" } },
+        { "Video", "UniformColour", { "u_colour", "u_View2D" } },
+        { "Video", "ImageSet", { "t_DiffuseTexture", "u_ColourTint" } },
+        { "Simple", "UniformColour", { "u_colour" } },
+        { "SimpleColour", "Colour", {} },
+        { "Simple3D", "UniformColour", { "u_ViewProjection", "u_colour" } },
+        { "Simple3DPointSize", "UniformColour", { "u_ViewProjection", "u_PointSize" } },
+        { "Simple3DUniformColour", "Colour", { "u_ViewProjection", "u_Colour" } },
+        { "Simple3DVertexColour", "Colour", { "u_ViewProjection" } },
+        { "Simple3DModel", "SimpleLighting", { "u_ViewProjection", "u_ModelTransform", "u_View", "u_Up" } },
+        { "Simple3DModelColour", "SimpleLighting", { "u_ModelTransform", "u_ModelColour" } },
+        { "Simple3DModelWireframe", "Colour", { "u_ViewProjection", "u_ModelTransform" } },
+        { "ColoredLine", "StippledLine", { "u_ViewProjection", "u_SourcePoint", "u_ModelColour" } },
+    };
+    for( const auto& rCase : Programs )
     {
-      QFile File( BrokenPath );
-      ASSERT_TRUE( File.open( QIODevice::WriteOnly ) );
-      File.write( "void main() { gl_FragColor = undeclared; }\n" );
+      SCOPED_TRACE( std::string( rCase.Vertex ) + "_" + rCase.Fragment );
+      std::shared_ptr< VShaderProgram > pProgram = Resources.GetProgram( rCase.Vertex, rCase.Fragment );
+      ASSERT_TRUE( pProgram && pProgram->IsLinked() );
+      EXPECT_EQ( Resources.GetProgram( rCase.Vertex, rCase.Fragment ), pProgram ) << "a pair is linked once";
+      for( const std::string& rName : rCase.Uniforms )
+      {
+        const int Location = pProgram->UniformLocation( rName.c_str() );
+        EXPECT_GE( Location, 0 ) << rName;
+        EXPECT_EQ( pProgram->UniformLocationByHash( CoreGraphics::MurmurHash3_32( rName ) ), Location ) << rName;
+      }
+      EXPECT_EQ( pProgram->UniformLocation( "u_NotThere" ), -1 );
+      EXPECT_EQ( pProgram->UniformLocationByHash( CoreGraphics::MurmurHash3_32( "u_NotThere" ) ), -1 );
     }
-
-    LumekTest::VLogCapture Log( "CoreGraphics" );
-    VResources Resources( false, QDir::currentPath() );
-    Resources.Load();
-    Resources.AddShaderFile( "Broken", BrokenPath, VShader::Kind_Fragment );
-    Resources.AddShaderFile( "Absent", Directory.filePath( "Absent.glsl" ), VShader::Kind_Fragment );
-
-    EXPECT_TRUE( Log.Contains( "Shader Failed To Compile<" + BrokenPath.toStdString() + "> Log=<" ) );
-    EXPECT_TRUE( Log.Contains( "Failed to open " + Directory.filePath( "Absent.glsl" ).toStdString() ) );
-    EXPECT_EQ( Resources.GetProgram( "Video", "Broken" ), nullptr );
-    EXPECT_EQ( Resources.GetProgram( "Video", "Absent" ), nullptr );
-    EXPECT_EQ( Resources.GetProgram( "NoSuchStage", "VideoRaw" ), nullptr );
   }
 
-  TEST_F( ShaderResourcesTest, OverrideDirectoryWinsAndReloadRelinksInPlace )
+  // Stage files of the user's own: a broken or missing one gives no program and a log line; an
+  // override folder wins over the resources, and a reload relinks the programs in place.
+  TEST_F( ShaderResourcesTest, StageFilesOfOurOwn )
   {
     QTemporaryDir Directory;
     ASSERT_TRUE( QDir( Directory.path() ).mkpath( "FragmentShaders" ) );
-    const QString Path = Directory.filePath( "FragmentShaders/UniformColour.glsl" );
-    auto Write = [&]( const char* i_pText )
+    auto Write = [&]( const QString& i_rName, const char* i_pText )
     {
-      QFile File( Path );
-      ASSERT_TRUE( File.open( QIODevice::WriteOnly | QIODevice::Truncate ) );
+      QFile File( Directory.filePath( i_rName ) );
+      EXPECT_TRUE( File.open( QIODevice::WriteOnly | QIODevice::Truncate ) );
       File.write( i_pText );
+      return Directory.filePath( i_rName );
     };
-    Write( "uniform vec4 u_Overridden;\nvoid main() { gl_FragColor = u_Overridden; }\n" );
+    const QString BrokenPath = Write( "Broken.glsl", "void main() { gl_FragColor = undeclared; }\n" );
+    {
+      LumekTest::VLogCapture Log( "CoreGraphics" );
+      m_pResources->AddShaderFile( "Broken", BrokenPath, VShader::Kind_Fragment );
+      m_pResources->AddShaderFile( "Absent", Directory.filePath( "Absent.glsl" ), VShader::Kind_Fragment );
+      EXPECT_TRUE( Log.Contains( "Shader Failed To Compile<" + BrokenPath.toStdString() + "> Log=<" ) );
+      EXPECT_TRUE( Log.Contains( "Failed to open " + Directory.filePath( "Absent.glsl" ).toStdString() ) );
+    }
+    for( const char* pFragment : { "Broken", "Absent" } )
+      EXPECT_EQ( m_pResources->GetProgram( "Video", pFragment ), nullptr ) << pFragment;
+    EXPECT_EQ( m_pResources->GetProgram( "NoSuchStage", "VideoRaw" ), nullptr );
 
+    Write( "FragmentShaders/UniformColour.glsl",
+           "uniform vec4 u_Overridden;\nvoid main() { gl_FragColor = u_Overridden; }\n" );
     VResources Resources( true, QDir::currentPath() );
     Resources.AddOverrideDirectory( Directory.path() );
     Resources.Load();
@@ -183,7 +197,8 @@ namespace
     ASSERT_TRUE( pProgram && pProgram->IsLinked() );
     EXPECT_GE( pProgram->UniformLocation( "u_Overridden" ), 0 );
 
-    Write( "uniform vec4 u_Reloaded;\nvoid main() { gl_FragColor = u_Reloaded; }\n" );
+    Write( "FragmentShaders/UniformColour.glsl",
+           "uniform vec4 u_Reloaded;\nvoid main() { gl_FragColor = u_Reloaded; }\n" );
     Resources.ReloadAll();
     ASSERT_TRUE( pProgram->IsLinked() );
     EXPECT_EQ( pProgram->UniformLocation( "u_Overridden" ), -1 );
@@ -217,18 +232,6 @@ namespace
     ASSERT_TRUE( m_Context.makeCurrent( &m_Surface ) );
   }
 
-  TEST_F( ShaderResourcesTest, UseProgramRefusesAnAbsentProgramAndKeepsTheCurrentOne )
-  {
-    VResources Resources( false, QDir::currentPath() );
-    Resources.Load();
-    CoreGraphics::VRenderContext Context;
-    Context.Initialise();
-    std::shared_ptr< VShaderProgram > pProgram = Resources.GetProgram( "Video", "VideoRaw" );
-    ASSERT_TRUE( Context.UseProgram( pProgram ) );
-    EXPECT_FALSE( Context.UseProgram( nullptr ) );
-    EXPECT_EQ( Context.GetCurrentProgram(), pProgram );
-  }
-
   TEST_F( ShaderResourcesTest, BuffersCountWhatTheyHoldAndRefuseWritesPastTheEnd )
   {
     CoreGraphics::VIndexBuffer Empty;
@@ -255,8 +258,7 @@ namespace
   // Rows of any length arrive tightly packed, and whatever alignment was set before stays set.
   TEST_F( ShaderResourcesTest, UploadReadsTightRowsAndRestoresTheUnpackAlignment )
   {
-    CoreGraphics::VRenderContext Context;
-    Context.Initialise();
+    CoreGraphics::VRenderContext& Context = *m_pRender;
     QOpenGLExtraFunctions& rGL = *Context.Functions();
     QOpenGLTexture Texture( QOpenGLTexture::Target2D );
     Texture.setSize( 3, 2 );
@@ -284,107 +286,55 @@ namespace
     Context.UnbindFramebuffer();
   }
 
-  // Draws a quad of the position-only layout through (Simple3D, UniformColour) into a framebuffer
-  // object and reads it back: the layout, the standard uniforms and the state come together.
+  // The projection halves x, so the quad of the whole clip square covers the middle columns only:
+  // the layout, the standard uniforms and the state come together.
   TEST_F( ShaderResourcesTest, DrawsAnIndexedQuadWithTheStandardUniforms )
   {
-    VResources Resources( false, QDir::currentPath() );
-    Resources.Load();
-    CoreGraphics::VRenderContext Context;
-    Context.Initialise();
-    QOpenGLFramebufferObject Framebuffer( 8, 8 );
-    ASSERT_TRUE( Framebuffer.isValid() );
-    Context.BindFramebuffer( &Framebuffer );
-    ASSERT_TRUE( Context.FramebufferComplete() );
-    Context.SetViewport( QRect( 0, 0, 8, 8 ) );
-    Context.Clear( true, false );
-
-    // The projection halves x, so the quad of the whole clip square covers the middle columns only.
     QMatrix4x4 Projection;
     Projection.scale( 0.5f, 1.0f, 1.0f );
-    Context.SetProjection( Projection );
-    std::shared_ptr< VShaderProgram > pProgram = Resources.GetProgram( "Simple3D", "UniformColour" );
-    ASSERT_TRUE( Context.UseProgram( pProgram ) );
-    pProgram->SetUniform( pProgram->UniformLocation( "u_colour" ), QVector4D( 1.0f, 0.5f, 0.0f, 1.0f ) );
-
-    CoreGraphics::VMesh Mesh;
-    const float Corners[] = { -1, -1, 0, 1, -1, 0, 1, 1, 0, -1, 1, 0 };
-    ASSERT_TRUE( Mesh.Vertices.Create( CoreGraphics::VVertexLayout::Position3D(), Corners, sizeof( Corners ) ) );
-    ASSERT_TRUE( Mesh.Indices.Create( std::vector< std::uint16_t >{ 0, 1, 2, 0, 2, 3 } ) );
-    Context.ApplyState( CoreGraphics::VRenderState() );
-    Context.BindVertexBuffer( Mesh.Vertices );
-    Context.DrawIndexed( GL_TRIANGLES, Mesh.Indices );
-
-    const QImage Picture = Framebuffer.toImage();
-    Context.ResetState();
-    Context.UnbindFramebuffer();
+    const QImage Picture = DrawQuad( 8, QVector4D( 1.0f, 0.5f, 0.0f, 1.0f ), QColor( 25, 25, 25 ),
+                                     CoreGraphics::VRenderState(), Projection );
     for( int x = 0; x < 8; ++x )
     {
       const QRgb Expected = ( x >= 2 && x < 6 ) ? qRgb( 255, 128, 0 ) : qRgb( 25, 25, 25 );
       EXPECT_EQ( Picture.pixel( x, 4 ) & 0xffffff, Expected & 0xffffff ) << "column " << x;
     }
-  }
-} // namespace
 
-namespace
-{
-  struct VBlendCase
-  {
-    const char* Name;
-    int ColourMode;
-    float BlendConstant;
-    // Expected colour over the destination (0.2, 0.4, 0.6) for the source (1.0, 0.5, 0.0, 0.5).
-    float R, G, B;
-  };
-
-  class BlendTest : public ShaderResourcesTest, public ::testing::WithParamInterface< VBlendCase >
-  {
-  };
-
-  TEST_P( BlendTest, MixesSourceAndDestinationByTheMode )
-  {
-    const VBlendCase& rCase = GetParam();
-    CoreGraphics::VResources Resources( false, QDir::currentPath() );
-    Resources.Load();
-    CoreGraphics::VRenderContext Context;
-    Context.Initialise();
-    QOpenGLFramebufferObject Framebuffer( 4, 4 );
-    Context.BindFramebuffer( &Framebuffer );
-    Context.SetViewport( QRect( 0, 0, 4, 4 ) );
-    Context.SetClearColour( QColor::fromRgbF( 0.2, 0.4, 0.6, 1.0 ) );
-    Context.Clear( true, false );
-
-    std::shared_ptr< CoreGraphics::VShaderProgram > pProgram = Resources.GetProgram( "Simple3D", "UniformColour" );
-    ASSERT_TRUE( Context.UseProgram( pProgram ) );
-    pProgram->SetUniform( pProgram->UniformLocation( "u_colour" ), QVector4D( 1.0f, 0.5f, 0.0f, 0.5f ) );
-    CoreGraphics::VMesh Mesh;
-    const float Corners[] = { -1, -1, 0, 1, -1, 0, 1, 1, 0, -1, 1, 0 };
-    ASSERT_TRUE( Mesh.Vertices.Create( CoreGraphics::VVertexLayout::Position3D(), Corners, sizeof( Corners ) ) );
-    ASSERT_TRUE( Mesh.Indices.Create( std::vector< std::uint16_t >{ 0, 1, 2, 0, 2, 3 } ) );
-
-    CoreGraphics::VRenderState State;
-    State.ColourBlendMode = rCase.ColourMode;
-    // Alpha mode 1 turns blending on for colour mode 0 as well.
-    State.AlphaBlendMode = 1;
-    State.BlendConstant = rCase.BlendConstant;
-    Context.ApplyState( State );
-    Context.BindVertexBuffer( Mesh.Vertices );
-    Context.DrawIndexed( GL_TRIANGLES, Mesh.Indices );
-    const QImage Picture = Framebuffer.toImage();
-    Context.ResetState();
-    Context.UnbindFramebuffer();
-
-    const QRgb Pixel = Picture.pixel( 2, 2 );
-    EXPECT_NEAR( qRed( Pixel ), std::min( rCase.R, 1.0f ) * 255, 2 );
-    EXPECT_NEAR( qGreen( Pixel ), std::min( rCase.G, 1.0f ) * 255, 2 );
-    EXPECT_NEAR( qBlue( Pixel ), std::min( rCase.B, 1.0f ) * 255, 2 );
+    // Using no program is refused and leaves the current one in place.
+    const std::shared_ptr< VShaderProgram > pCurrent = m_pResources->GetProgram( "Video", "VideoRaw" );
+    ASSERT_TRUE( m_pRender->UseProgram( pCurrent ) );
+    EXPECT_FALSE( m_pRender->UseProgram( nullptr ) );
+    EXPECT_EQ( m_pRender->GetCurrentProgram(), pCurrent );
   }
 
-  INSTANTIATE_TEST_SUITE_P( Modes, BlendTest,
-                            ::testing::Values( VBlendCase{ "Replace", 0, 1.0f, 1.0f, 0.5f, 0.0f },
-                                               VBlendCase{ "Alpha", 1, 1.0f, 0.6f, 0.45f, 0.3f },
-                                               VBlendCase{ "AdditiveAlpha", 2, 1.0f, 0.7f, 0.65f, 0.6f },
-                                               VBlendCase{ "ConstantAlphaAdditive", 3, 0.25f, 0.45f, 0.525f, 0.6f },
-                                               VBlendCase{ "Premultiplied", 4, 1.0f, 1.1f, 0.7f, 0.3f } ),
-                            LumekTest::VCaseName() );
+  TEST_F( ShaderResourcesTest, BlendModesMixSourceAndDestination )
+  {
+    const struct
+    {
+      const char* Name;
+      int ColourMode;
+      float BlendConstant;
+      // Expected colour over the destination (0.2, 0.4, 0.6) for the source (1.0, 0.5, 0.0, 0.5).
+      float R, G, B;
+    } Cases[] = {
+        { "Replace", 0, 1.0f, 1.0f, 0.5f, 0.0f },        { "Alpha", 1, 1.0f, 0.6f, 0.45f, 0.3f },
+        { "AdditiveAlpha", 2, 1.0f, 0.7f, 0.65f, 0.6f }, { "ConstantAlphaAdditive", 3, 0.25f, 0.45f, 0.525f, 0.6f },
+        { "Premultiplied", 4, 1.0f, 1.1f, 0.7f, 0.3f },
+    };
+    for( const auto& rCase : Cases )
+    {
+      SCOPED_TRACE( rCase.Name );
+      CoreGraphics::VRenderState State;
+      State.ColourBlendMode = rCase.ColourMode;
+      // Alpha mode 1 turns blending on for colour mode 0 as well.
+      State.AlphaBlendMode = 1;
+      State.BlendConstant = rCase.BlendConstant;
+      const QRgb Pixel =
+          DrawQuad( 4, QVector4D( 1.0f, 0.5f, 0.0f, 0.5f ), QColor::fromRgbF( 0.2, 0.4, 0.6, 1.0 ), State )
+              .pixel( 2, 2 );
+      EXPECT_NEAR( qRed( Pixel ), std::min( rCase.R, 1.0f ) * 255, 2 );
+      EXPECT_NEAR( qGreen( Pixel ), std::min( rCase.G, 1.0f ) * 255, 2 );
+      EXPECT_NEAR( qBlue( Pixel ), std::min( rCase.B, 1.0f ) * 255, 2 );
+    }
+  }
 } // namespace
