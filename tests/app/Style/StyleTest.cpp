@@ -1,0 +1,415 @@
+// The theme's values, the style sheet made from them, and the pictures the sheet shows.
+
+#include "app/Controls/VClickSpinBox.h"
+#include "app/Controls/VLabelSlider.h"
+#include "app/Controls/VProxyStyle.h"
+#include "app/Style/AppStyle.h"
+#include "services/DPIUtils.h"
+#include "services/Theme/IApplicationStyling.h"
+#include "services/Theme/StyleSheetText.h"
+#include "services/Theme/ThemeStart.h"
+
+#include <QApplication>
+#include <QCheckBox>
+#include <QDir>
+#include <QGroupBox>
+#include <QHBoxLayout>
+#include <QLabel>
+#include <QLineEdit>
+#include <QMainWindow>
+#include <QMenuBar>
+#include <QPainter>
+#include <QPushButton>
+#include <QQmlComponent>
+#include <QQmlEngine>
+#include <QRegularExpression>
+#include <QStandardItemModel>
+#include <QSvgRenderer>
+#include <QTableView>
+#include <QToolTip>
+
+#include <gtest/gtest.h>
+
+#include <memory>
+#include <set>
+#include <tuple>
+
+namespace
+{
+  const QString s_Prefix = QStringLiteral( "com.Lumek.LumekVideoViewer." );
+
+  // Every value of the application's theme in record order, as its token writes it: golden text.
+  const char* const s_FinalValues =
+      "Window=#303030 WindowText=#ffffff Base=#303030 AlternateBase=#404040 ToolTipBase=#202020 ToolTipText=#ffffff "
+      "Text=#ffffff Button=#4d4d4d ButtonText=#ffffff BrightText=#e76500 Light=#808080 Midlight=#707070 Dark=#404040 "
+      "Mid=#606060 Shadow=#202020 Highlight=#c89810 HighlightedText=#ffffff Link=#4c8bfc LinkVisited=#4b78aa "
+      "WindowTextDisabled=#999999 ButtonDisabled=#3d3d3d ButtonTextDisabled=#999999 HighlightDisabled=#2e78fc "
+      "Bright=#009fe3 Contrast=#e6007e FieldBorder=#7d7d7d FieldBorderDisabled=#5d5d5d ButtonBorder=#2d2d2d "
+      "ButtonBorderDisabled=#202020 ButtonHover=#c89810 StatusGood=#33cc33 StatusBad=#cc3333 StatusWarning=#ffd400 "
+      "Margin=10 ItemHeight=20 ItemSpacing=4 ItemPadding=4 ButtonRadius=5 ButtonWidth=80 ButtonHeight=24 ToolHeight=28 "
+      "ScrollBarWidth=14 DefaultFont=Segoe_UI PointSizeNormal=9 PointSizeHeader=10 InfoToolTipDelay=500 "
+      "WarnToolTipDelay=0 Default1=#2e78fc Default2=#0055ff Default3=#55aa00 Default4=#e4b90a Default5=#58abd1 "
+      "Default6=#d12e1f";
+
+  QString Sheet()
+  {
+    return LumekVideoViewer::PrepareStyleSheet( *ZOL::ApplicationStyling() );
+  }
+
+  // What Qt says meanwhile, warnings and worse.
+  class VQtMessages
+  {
+  public:
+    VQtMessages() { s_Messages.clear(), m_Previous = qInstallMessageHandler( &Collect ); }
+    ~VQtMessages() { qInstallMessageHandler( m_Previous ); }
+    std::string Text() const { return s_Messages.join( "\n" ).toStdString(); }
+
+  private:
+    static void Collect( QtMsgType i_Type, const QMessageLogContext&, const QString& i_rMessage )
+    {
+      if( i_Type != QtDebugMsg && i_Type != QtInfoMsg )
+        s_Messages << i_rMessage;
+    }
+    static inline QStringList s_Messages;
+    QtMessageHandler m_Previous;
+  };
+
+  class StyleSheet : public testing::Test
+  {
+  protected:
+    void TearDown() override
+    {
+      DPIUtils::SetDPI( DPIUtils::DesignDPI );
+      qApp->setStyleSheet( QString() );
+    }
+  };
+
+  QPushButton* NamedButton( const char* i_pName, bool i_bEnabled = true )
+  {
+    auto* pButton = new QPushButton;
+    pButton->setObjectName( i_pName );
+    pButton->setEnabled( i_bEnabled );
+    return pButton;
+  }
+
+  // Opaque pixels, their alpha-weighted lightness, and where they lie.
+  struct VCoverage
+  {
+    int Opaque = 0;
+    double Luminance = 0.0;
+    QRect Bounds;
+  };
+
+  VCoverage Render( const QString& i_rName, int i_Scale = 4 )
+  {
+    QSvgRenderer Renderer( ":/" + s_Prefix + i_rName + ".svg" );
+    QImage Image( Renderer.defaultSize() * i_Scale, QImage::Format_ARGB32_Premultiplied );
+    Image.fill( Qt::transparent );
+    QPainter Painter( &Image );
+    Renderer.render( &Painter );
+    VCoverage Coverage;
+    double Weight = 0.0;
+    for( int y = 0; y < Image.height(); ++y )
+      for( int x = 0; x < Image.width(); ++x )
+      {
+        const QColor Pixel = QColor::fromRgba( Image.pixel( x, y ) );
+        if( Pixel.alpha() == 0 )
+          continue;
+        ++Coverage.Opaque;
+        Coverage.Bounds |= QRect( x, y, 1, 1 );
+        Coverage.Luminance += Pixel.alphaF() * Pixel.lightnessF();
+        Weight += Pixel.alphaF();
+      }
+    Coverage.Luminance /= std::max( Weight, 1e-9 );
+    return Coverage;
+  }
+} // namespace
+
+TEST( Theme, EveryTokenGivesTheApplicationsValue )
+{
+  QString Text;
+  for( const auto& rField : ZOL::IApplicationStyling::Fields() )
+    Text += QString( "%1=%2 " ).arg( rField.Name, Theme::TokenOf( rField.Name ) );
+  const QString Values = Theme::SubstituteTokens( Text, *ZOL::ApplicationStyling() );
+  EXPECT_EQ( Values.trimmed().replace( "Segoe UI", "Segoe_UI" ).toStdString(), s_FinalValues );
+}
+
+TEST( Theme, ScalingTakesTheIntegerPartOfWholeNumbers )
+{
+  // Truncated, not rounded; point sizes keep their size.
+  const std::tuple< float, const char*, int > Rows[] = { { 1.5f, "Margin", 15 },
+                                                         { 1.25f, "ButtonRadius", 6 },
+                                                         { 1.33f, "ItemHeight", 26 },
+                                                         { 2.0f, "PointSizeNormal", 9 },
+                                                         { 1.5f, "InfoToolTipDelay", 750 } };
+  for( const auto& [Ratio, Name, Expected] : Rows )
+  {
+    SCOPED_TRACE( Name );
+    ZOL::IApplicationStyling Styling = ZOL::CreateApplicationStyling();
+    Styling.Scale( Ratio );
+    EXPECT_EQ( Styling.Value( Name ).toInt(), Expected );
+    EXPECT_EQ( Styling.m_Window, QColor( "#303030" ) );
+  }
+}
+
+// Set before the QApplication was made, and still in force after it.
+TEST( Theme, PaletteRolesTakeTheirColoursBeforeAndAfterTheApplication )
+{
+  const std::tuple< QPalette::ColorGroup, QPalette::ColorRole, const char* > Rows[] = {
+      { QPalette::Active, QPalette::Window, "#303030" },       { QPalette::Inactive, QPalette::Highlight, "#c89810" },
+      { QPalette::Inactive, QPalette::BrightText, "#e76500" }, { QPalette::Disabled, QPalette::WindowText, "#999999" },
+      { QPalette::Disabled, QPalette::Button, "#3d3d3d" },     { QPalette::Disabled, QPalette::Highlight, "#2e78fc" },
+      { QPalette::Disabled, QPalette::Text, "#ffffff" } };
+  const QPalette Palette = ZOL::ApplicationStyling()->MakePalette();
+  for( const auto& [Group, Role, Expected] : Rows )
+  {
+    SCOPED_TRACE( testing::Message() << Group << " " << Role );
+    EXPECT_EQ( Palette.color( Group, Role ).name(), Expected );
+    EXPECT_EQ( QApplication::palette().color( Group, Role ).name(), Expected );
+  }
+  // A role without a value keeps the default.
+  EXPECT_EQ( Palette.color( QPalette::Active, QPalette::PlaceholderText ),
+             QPalette().color( QPalette::Active, QPalette::PlaceholderText ) );
+}
+
+TEST( Theme, SubstitutionGivesTheSheetQtReads )
+{
+  const std::pair< const char*, const char* > Rows[] = {
+      { "font-family: \"[defaultFont]\";", "font-family: \"Segoe UI\";" },
+      // Tokens are case-sensitive; unknown tokens and selectors stay.
+      { "gridline-color: [Mid]; color: [mid]", "gridline-color: [Mid]; color: #606060" },
+      { "[nothing] QPushButton[flat=\"true\"]", "[nothing] QPushButton[flat=\"true\"]" },
+      { "[margin][itemSpacing]px", "104px" },
+      { "margin-top: -([itemHeight] - [itemPadding]) / 2;", "margin-top: -8;" },
+      { "width: 5 / 2;", "width: 2.5;" },
+      { "width: Math.round([itemHeight] * 0.45);", "width: 9;" },
+      // What is not arithmetic is left alone: addresses, syntax errors, infinity, text.
+      { "image: url(:/a/b.svg);", "image: url(:/a/b.svg);" },
+      { "padding: 4 10 * 3;", "padding: 4 10 * 3;" },
+      { "a: 1 / 0;\nb: 'a' + 'b';", "a: 1 / 0;\nb: 'a' + 'b';" },
+      // Every line on its own, blanks kept, and only at the end of a line.
+      { "a: 1 + 1;  \nb: [itemPadding] * 3;\n", "a: 2;  \nb: 12;\n" },
+      { "a: 1 + 1; }", "a: 1 + 1; }" } };
+  for( const auto& [Input, Expected] : Rows )
+    EXPECT_EQ( ZOL::ApplicationStyling()->Substitute( QString::fromUtf8( Input ) ).toStdString(), Expected );
+}
+
+TEST( Theme, TheSheetIsScaledOnACopyAndAMissingSheetSetsNone )
+{
+  DPIUtils::SetDPI( 192 );
+  const QString Scaled = Theme::PrepareStyleSheet( *ZOL::ApplicationStyling() );
+  DPIUtils::SetDPI( DPIUtils::DesignDPI );
+  EXPECT_FALSE( Scaled.isEmpty() );
+  EXPECT_EQ( ZOL::ApplicationStyling()->m_ItemHeight, 20 );
+
+  ZOL::IApplicationStyling Styling = ZOL::CreateApplicationStyling();
+  Styling.m_StyleSheetPath = QStringLiteral( ":/no/such/sheet.qss" );
+  const QString Before = qApp->styleSheet();
+  EXPECT_FALSE( Theme::ApplyPostApplicationTheme( Styling ) );
+  EXPECT_EQ( qApp->styleSheet(), Before );
+}
+
+// The about and legal dialogs read the theme from QML under the record's names, and cannot change it.
+TEST( Theme, QmlSingletonGivesTheValuesReadOnly )
+{
+  QQmlEngine Engine;
+  QQmlComponent Component( &Engine );
+  Component.setData( "import QtQuick 2.0\nimport Lumek.Theme 1.0\n"
+                     "Item {\n"
+                     "  property color window: Theme.Window\n"
+                     "  property int twice: Theme.ItemHeight * 2\n"
+                     "  property string font: Theme.DefaultFont\n"
+                     "  Component.onCompleted: Theme.Margin = 99\n"
+                     "  function margin() { return Theme.Margin }\n"
+                     "}\n",
+                     QUrl() );
+  std::unique_ptr< QObject > pObject( Component.create() );
+  ASSERT_TRUE( pObject ) << Component.errorString().toStdString();
+  EXPECT_EQ( pObject->property( "window" ).value< QColor >(), QColor( "#303030" ) );
+  EXPECT_EQ( pObject->property( "twice" ).toInt(), 40 );
+  EXPECT_EQ( pObject->property( "font" ).toString(), "Segoe UI" );
+  QVariant Margin;
+  QMetaObject::invokeMethod( pObject.get(), "margin", Q_RETURN_ARG( QVariant, Margin ) );
+  EXPECT_EQ( Margin.toInt(), 10 );
+}
+
+// Every picture the sheet or the window names is there, every one there is used, and each is a
+// drawing of glyphs on a transparent ground; a disabled form is the same shape, dimmer.
+TEST( Pictures, AreThereUsedAndDrawn )
+{
+  std::set< QString > InResources;
+  for( const QString& rEntry : QDir( ":/" ).entryList( { s_Prefix + "*.svg" }, QDir::Files ) )
+    InResources.insert( rEntry.mid( s_Prefix.size() ).chopped( 4 ) );
+  // The window shows these by itself rather than through the sheet.
+  std::set< QString > Used = { "LumekLogo", "AppIcon", "AboutLogo" };
+  static const QRegularExpression s_Url( QStringLiteral( R"(url\(:/com\.Lumek\.LumekVideoViewer\.(\w+)\.svg\))" ) );
+  for( auto Matches = s_Url.globalMatch( Sheet() ); Matches.hasNext(); )
+    Used.insert( Matches.next().captured( 1 ) );
+  ASSERT_GT( Used.size(), 3u );
+  for( const QString& rName : Used )
+    EXPECT_TRUE( InResources.count( rName ) ) << rName.toStdString() << " is named but not there";
+  for( const QString& rName : InResources )
+    EXPECT_TRUE( Used.count( rName ) ) << rName.toStdString() << " is there but nothing shows it";
+
+  for( const QString& rName : InResources )
+  {
+    SCOPED_TRACE( rName.toStdString() );
+    QSvgRenderer Renderer( ":/" + s_Prefix + rName + ".svg" );
+    ASSERT_TRUE( Renderer.isValid() );
+    const QSize Size = Renderer.defaultSize();
+    ASSERT_FALSE( Size.isEmpty() );
+    // Drawn on a view box of the same shape, so it scales to any density without distortion.
+    EXPECT_NEAR( Renderer.viewBoxF().width() / Renderer.viewBoxF().height(), double( Size.width() ) / Size.height(),
+                 1e-6 );
+    const VCoverage Enabled = Render( rName );
+    EXPECT_GT( Enabled.Opaque, 0 );
+    EXPECT_LT( Enabled.Opaque, Size.width() * Size.height() * 16 );
+    if( InResources.count( rName + "Disabled" ) )
+    {
+      const VCoverage Disabled = Render( rName + "Disabled" );
+      EXPECT_EQ( Disabled.Bounds, Enabled.Bounds );
+      EXPECT_LT( Disabled.Luminance, Enabled.Luminance - 0.2 );
+    }
+  }
+}
+
+TEST_F( StyleSheet, NoTokenOrExpressionIsLeft )
+{
+  const QString Text = Sheet();
+  ASSERT_FALSE( Text.isEmpty() );
+  // "[Mid]" is matched by no value: the lower-case "[mid]" is the theme's.
+  static const QRegularExpression s_Token( QStringLiteral( R"(\[[A-Za-z][A-Za-z0-9]*\])" ) );
+  for( auto Matches = s_Token.globalMatch( Text ); Matches.hasNext(); )
+    EXPECT_EQ( Matches.next().captured( 0 ), "[Mid]" );
+  // What still looks like arithmetic is a picture's address or a plain number; anything else is
+  // an expression the evaluation could not read, and Qt would not either.
+  static const QRegularExpression s_Arithmetic( QStringLiteral( R"(:(.+[+\-\/*]+.+);\s*$)" ),
+                                                QRegularExpression::MultilineOption );
+  static const QRegularExpression s_Number( QStringLiteral( R"(^\s*-?[0-9.]+$)" ) );
+  for( auto Matches = s_Arithmetic.globalMatch( Text ); Matches.hasNext(); )
+  {
+    const QString Value = Matches.next().captured( 1 );
+    EXPECT_TRUE( Value.contains( "url(:/" + s_Prefix ) || s_Number.match( Value ).hasMatch() ) << Value.toStdString();
+  }
+}
+
+// One of each widget the sheet styles, in the states it has rules for, shown and painted with
+// its menus and a tool tip, so every rule is parsed and every picture read.
+TEST_F( StyleSheet, QtAppliesItWithoutComplaint )
+{
+  const VQtMessages Messages;
+  ASSERT_TRUE( LumekVideoViewer::ApplyStyleSheet() );
+  QMainWindow Window;
+  auto* pCentral = new QWidget;
+  auto* pLayout = new QVBoxLayout( pCentral );
+  auto* pMenuBar = new QMenuBar;
+  QMenu* pMenu = pMenuBar->addMenu( "&Playback " );
+  QAction* pLoop = pMenu->addAction( "&Looping" );
+  pLoop->setCheckable( true );
+  pLoop->setChecked( true );
+  auto* pGroup = new QActionGroup( pMenu );
+  QMenu* pDecoder = pMenu->addMenu( "Decoder" );
+  for( const char* pText : { "Hardware (GPU)", "Software (CPU)" } )
+    pGroup->addAction( pDecoder->addAction( pText ) )->setCheckable( true );
+  pGroup->actions().first()->setChecked( true );
+  pMenu->addSeparator();
+  pMenu->addAction( "Stop" )->setEnabled( false );
+  pLayout->addWidget( pMenuBar );
+  auto* pLogo = new QLabel;
+  pLogo->setObjectName( "Logo" );
+  pLogo->setPixmap( QPixmap( ":/" + s_Prefix + "LumekLogo.svg" ) );
+  pLayout->addWidget( pLogo );
+
+  auto* pTable = new QTableView;
+  auto* pModel = new QStandardItemModel( 40, 2, pTable );
+  pModel->setHorizontalHeaderLabels( { "Name", "Value" } );
+  pTable->setModel( pModel );
+  pTable->setSortingEnabled( true );
+  pTable->setAlternatingRowColors( true );
+  pLayout->addWidget( pTable, 1 );
+
+  auto* pInfo = new QWidget;
+  pInfo->setObjectName( "InfoPanel" );
+  auto* pInfoLayout = new QHBoxLayout( pInfo );
+  pInfoLayout->addWidget( new QLabel( "No file open" ) );
+  auto* pCheck = new QCheckBox( "Checked" );
+  pCheck->setChecked( true );
+  auto* pPartial = new QCheckBox( "Partial" );
+  pPartial->setTristate( true );
+  pPartial->setCheckState( Qt::PartiallyChecked );
+  pPartial->setEnabled( false );
+  for( QWidget* pWidget : std::initializer_list< QWidget* >{ pCheck, pPartial, new QLineEdit( "1.23" ) } )
+    pInfoLayout->addWidget( pWidget );
+  pLayout->addWidget( pInfo );
+
+  auto* pControls = new QGroupBox;
+  pControls->setObjectName( "Controls" );
+  auto* pControlsLayout = new QHBoxLayout( pControls );
+  auto* pSlider = new LumekVideoViewer::VLabelSlider( Qt::Horizontal );
+  auto* pProxy = new LumekVideoViewer::VProxyStyle( pSlider->style() );
+  pProxy->setParent( pSlider );
+  pSlider->setStyle( pProxy );
+  pControlsLayout->addWidget( pSlider, 1 );
+  pControlsLayout->addWidget( new LumekVideoViewer::VClickSpinBox );
+  for( auto* pButton : { NamedButton( "Play" ), NamedButton( "Stop" ), NamedButton( "FullScreen" ),
+                         NamedButton( "Pause", false ), NamedButton( "Close" ) } )
+    pControlsLayout->addWidget( pButton );
+  pLayout->addWidget( pControls );
+  Window.setCentralWidget( pCentral );
+  Window.resize( 800, 600 );
+
+  Window.show();
+  QApplication::processEvents();
+  (void)Window.grab();
+  for( QMenu* pPopup : { pMenu, pDecoder } )
+  {
+    pPopup->popup( QPoint( 0, 0 ) );
+    QApplication::processEvents();
+    (void)pPopup->grab();
+    pPopup->hide();
+  }
+  QToolTip::showText( QPoint( 10, 10 ), "Play video", &Window );
+  QApplication::processEvents();
+  QToolTip::hideText();
+  EXPECT_EQ( Messages.Text(), "" );
+}
+
+TEST_F( StyleSheet, TransportButtonsAndTimeBarGrowWithTheDensity )
+{
+  const std::tuple< int, int, int > Rows[] = { { 96, 40, 20 }, { 144, 60, 30 }, { 192, 80, 40 } };
+  for( const auto& [DPI, ButtonSide, SliderHeight] : Rows )
+  {
+    SCOPED_TRACE( DPI );
+    DPIUtils::SetDPI( DPI );
+    ASSERT_TRUE( LumekVideoViewer::ApplyStyleSheet() );
+    QWidget Host;
+    auto* pLayout = new QHBoxLayout( &Host );
+    auto* pPlay = NamedButton( "Play" );
+    pLayout->addWidget( pPlay );
+    auto* pSlider = new LumekVideoViewer::VLabelSlider( Qt::Horizontal );
+    pLayout->addWidget( pSlider );
+    Host.resize( 600, 300 );
+    Host.show();
+    QApplication::processEvents();
+    EXPECT_EQ( pPlay->size(), QSize( ButtonSide, ButtonSide ) );
+    EXPECT_GE( pSlider->minimumSizeHint().height(), SliderHeight );
+  }
+}
+
+// The window swaps the play button's picture by renaming it and giving it a style sheet of its
+// own, which makes Qt apply the application's rules again.
+TEST_F( StyleSheet, RenamingThePlayButtonSwapsItsPicture )
+{
+  ASSERT_TRUE( LumekVideoViewer::ApplyStyleSheet() );
+  std::unique_ptr< QPushButton > pButton( NamedButton( "Play" ) ), pPause( NamedButton( "Pause" ) );
+  pButton->show();
+  pPause->show();
+  QApplication::processEvents();
+  const QImage Paused = pPause->grab().toImage();
+  ASSERT_NE( pButton->grab().toImage(), Paused );
+
+  pButton->setObjectName( "Pause" );
+  pButton->setStyleSheet( "/**/" );
+  QApplication::processEvents();
+  EXPECT_EQ( pButton->grab().toImage(), Paused );
+}
