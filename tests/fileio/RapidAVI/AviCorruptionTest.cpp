@@ -3,11 +3,9 @@
 
 #include "AviTestSupport.h"
 
-#include "tests/support/FfmpegFixtures.h"
+#include "tests/support/TestNames.h"
 
-#include <fstream>
 #include <gtest/gtest.h>
-#include <iterator>
 #include <sstream>
 
 using namespace AviTest;
@@ -29,30 +27,6 @@ namespace
     }
   }
 
-  VBytes HandBuiltFile()
-  {
-    VAviSpec Spec = GreySpec( 6 );
-    Spec.StandardIndexFrames = 4;
-    Spec.AudioFormat = WaveFormat( 1, 2, 48000, 16 );
-    for( int i = 0; i < 6; ++i )
-      Spec.AudioChunks.push_back( Frame( 7680, static_cast< std::uint8_t >( i ) ) );
-    Spec.ExtendedFrames = { Frame( 32, 50 ) };
-    Spec.ExtraMoviChunks = Chunk( "JUNK", VBytes( 3 ) );
-    return BuildAvi( Spec );
-  }
-
-  VBytes FfmpegFile( const std::string& i_rName, const std::vector< std::string >& i_rCodec )
-  {
-    if( !LumekTest::HaveFfmpeg() )
-      return {};
-    std::vector< std::string > Arguments = { "-f", "lavfi", "-i", "testsrc2=size=32x16:rate=25" };
-    Arguments.insert( Arguments.end(), i_rCodec.begin(), i_rCodec.end() );
-    Arguments.insert( Arguments.end(), { "-frames:v", "3" } );
-    const std::string Path = LumekTest::FfmpegFixture( i_rName, Arguments );
-    std::ifstream Stream( Path, std::ios::binary );
-    return VBytes( std::istreambuf_iterator< char >( Stream ), {} );
-  }
-
   struct VCorruptionCase
   {
     const char* Name;
@@ -70,12 +44,7 @@ TEST_P( AviCorruption, CutsAndFlips )
   if( File.empty() )
     GTEST_SKIP() << "no fixture";
   // Thousands of refusals each say why; only a crash or a hang would matter here.
-  struct VQuiet
-  {
-    int Level = ZOL::GlobalLog().GetStandardErrorLevel();
-    VQuiet() { ZOL::GlobalLog().SetStandardErrorLevel( 0 ); }
-    ~VQuiet() { ZOL::GlobalLog().SetStandardErrorLevel( Level ); }
-  } Quiet;
+  LumekTest::VLogCapture Quiet( "", 0 );
   // Cuts: every byte of the headers, then a spread over the rest.
   const std::size_t Step = std::max< std::size_t >( 1, File.size() / 300 );
   for( std::size_t Cut = 0; Cut < File.size(); Cut += Cut < 512 ? 1 : Step )
@@ -92,16 +61,29 @@ TEST_P( AviCorruption, CutsAndFlips )
 
 INSTANTIATE_TEST_SUITE_P(
     Files, AviCorruption,
-    ::testing::Values( VCorruptionCase{ "HandBuilt", &HandBuiltFile },
-                       VCorruptionCase{ "FfmpegMjpegWithAudio",
-                                        []
-                                        {
-                                          return FfmpegFile( "CorruptMjpeg.avi",
-                                                             { "-f", "lavfi", "-i", "sine=sample_rate=8000", "-c:v",
-                                                               "mjpeg", "-c:a", "pcm_s16le", "-shortest" } );
-                                        } },
-                       VCorruptionCase{ "FfmpegH264",
-                                        [] {
-                                          return FfmpegFile( "CorruptH264.avi", { "-c:v", "libx264", "-bf", "0" } );
-                                        } } ),
-    []( const ::testing::TestParamInfo< VCorruptionCase >& rInfo ) { return rInfo.param.Name; } );
+    ::testing::Values(
+        VCorruptionCase{ "HandBuilt",
+                         []
+                         {
+                           // Both index kinds, audio, an AVIX part and a pad byte.
+                           VAviSpec Spec = GreySpec( 6 );
+                           Spec.StandardIndexFrames = 4;
+                           Spec.AudioFormat = WaveFormat( 1, 2, 48000, 16 );
+                           Spec.AudioChunks.assign( 6, Frame( 7680, 0x55 ) );
+                           Spec.ExtendedFrames = { Frame( 32, 50 ) };
+                           Spec.ExtraMoviChunks = Chunk( "JUNK", VBytes( 3 ) );
+                           return BuildAvi( Spec );
+                         } },
+        VCorruptionCase{ "FfmpegMjpegWithAudio",
+                         []
+                         {
+                           return ReadFile( FfmpegAvi( "CorruptMjpeg.avi",
+                                                       { "-f", "lavfi", "-i", "sine=sample_rate=8000", "-c:v", "mjpeg",
+                                                         "-c:a", "pcm_s16le", "-shortest", "-frames:v", "3" } ) );
+                         } },
+        VCorruptionCase{
+            "FfmpegH264",
+            [] {
+              return ReadFile( FfmpegAvi( "CorruptH264.avi", { "-c:v", "libx264", "-bf", "0", "-frames:v", "3" } ) );
+            } } ),
+    LumekTest::VCaseName() );

@@ -1,59 +1,55 @@
 #include "AviTestSupport.h"
 
-#include "services/ILogCategorised.h"
+#include "tests/support/FfmpegFixtures.h"
+#include "utils/MemoryStream.h"
 
 #include <algorithm>
 #include <cstring>
+#include <fstream>
+#include <iterator>
 
 namespace AviTest
 {
   namespace
   {
-    constexpr std::uint8_t s_SubFormatPCM[16] = { 0x01, 0x00, 0x00, 0x00, 0x00, 0x00, 0x10, 0x00,
-                                                  0x80, 0x00, 0x00, 0xAA, 0x00, 0x38, 0x9B, 0x71 };
+    using VEntries = std::vector< std::pair< std::uint64_t, std::uint64_t > >;
 
     struct VMoviContents
     {
       VBytes Bytes;
-      // Absolute payload positions and sizes of the video chunks, in order.
-      std::vector< std::pair< std::uint64_t, std::uint64_t > > Video;
-      std::vector< std::pair< std::uint64_t, std::uint64_t > > Audio;
+      // Absolute payload positions and sizes of the chunks, in order.
+      VEntries Video;
+      VEntries Audio;
     };
 
     // The chunks of one movi list whose list header starts at i_ListPosition.
     VMoviContents MoviChunks( std::uint64_t i_ListPosition, const VBytes& i_rLeading,
                               const std::vector< VBytes >& i_rFrames, const std::vector< VBytes >& i_rAudio )
     {
-      VMoviContents Contents;
-      Contents.Bytes = i_rLeading;
-      const std::uint64_t DataStart = i_ListPosition + 12;
+      VMoviContents Contents{ i_rLeading, {}, {} };
+      const auto Add = [&]( const char* pId, const VBytes& rPayload, VEntries& rEntries )
+      {
+        rEntries.emplace_back( i_ListPosition + 12 + Contents.Bytes.size() + 8, rPayload.size() );
+        const VBytes Bytes = Chunk( pId, rPayload );
+        Contents.Bytes.insert( Contents.Bytes.end(), Bytes.begin(), Bytes.end() );
+      };
       for( std::size_t i = 0; i < std::max( i_rFrames.size(), i_rAudio.size() ); ++i )
       {
         if( i < i_rFrames.size() )
-        {
-          Contents.Video.emplace_back( DataStart + Contents.Bytes.size() + 8, i_rFrames[i].size() );
-          const VBytes Video = Chunk( "00dc", i_rFrames[i] );
-          Contents.Bytes.insert( Contents.Bytes.end(), Video.begin(), Video.end() );
-        }
+          Add( "00dc", i_rFrames[i], Contents.Video );
         if( i < i_rAudio.size() )
-        {
-          Contents.Audio.emplace_back( DataStart + Contents.Bytes.size() + 8, i_rAudio[i].size() );
-          const VBytes Audio = Chunk( "01wb", i_rAudio[i] );
-          Contents.Bytes.insert( Contents.Bytes.end(), Audio.begin(), Audio.end() );
-        }
+          Add( "01wb", i_rAudio[i], Contents.Audio );
       }
       return Contents;
     }
 
-    VBytes StandardIndex( const std::vector< std::pair< std::uint64_t, std::uint64_t > >& i_rEntries,
-                          std::size_t i_Count, std::uint64_t i_Base )
+    VBytes StandardIndex( const VEntries& i_rEntries, std::size_t i_Count, std::uint64_t i_Base )
     {
       VBytes Payload;
-      AppendLE( Payload, 2, 2 );
-      AppendLE( Payload, 0, 1 );
-      AppendLE( Payload, 1, 1 );
+      AppendLE( Payload, 0x01000002, 4 ); // four-byte entries, of chunks
       AppendLE( Payload, i_Count, 4 );
-      AppendText( Payload, "00dc" );
+      const VBytes Id = Text( "00dc" );
+      Payload.insert( Payload.end(), Id.begin(), Id.end() );
       AppendLE( Payload, i_Base, 8 );
       AppendLE( Payload, 0, 4 );
       for( std::size_t i = 0; i < i_Count; ++i )
@@ -63,6 +59,18 @@ namespace AviTest
       }
       return Chunk( "ix00", Payload );
     }
+
+    // A payload of i_Size bytes with these little-endian fields at their offsets.
+    VBytes Fields( std::size_t i_Size, const std::vector< std::pair< std::size_t, std::uint64_t > >& i_rFields,
+                   int i_Width = 4 )
+    {
+      VBytes Payload( i_Size, 0 );
+      for( const auto& rField : i_rFields )
+        for( int i = 0; i < i_Width; ++i )
+          Payload[rField.first + static_cast< std::size_t >( i )] =
+              static_cast< std::uint8_t >( rField.second >> ( 8 * i ) );
+      return Payload;
+    }
   } // namespace
 
   void AppendLE( VBytes& io_rBytes, std::uint64_t i_Value, int i_Width )
@@ -71,23 +79,14 @@ namespace AviTest
       io_rBytes.push_back( static_cast< std::uint8_t >( i_Value >> ( 8 * i ) ) );
   }
 
-  void AppendText( VBytes& io_rBytes, const std::string& i_rText )
+  VBytes Text( const std::string& i_rText )
   {
-    io_rBytes.insert( io_rBytes.end(), i_rText.begin(), i_rText.end() );
-  }
-
-  VBytes Join( const std::vector< VBytes >& i_rParts )
-  {
-    VBytes Bytes;
-    for( const VBytes& rPart : i_rParts )
-      Bytes.insert( Bytes.end(), rPart.begin(), rPart.end() );
-    return Bytes;
+    return VBytes( i_rText.begin(), i_rText.end() );
   }
 
   VBytes Chunk( const std::string& i_rId, const VBytes& i_rPayload )
   {
-    VBytes Bytes;
-    AppendText( Bytes, i_rId );
+    VBytes Bytes = Text( i_rId );
     AppendLE( Bytes, i_rPayload.size(), 4 );
     Bytes.insert( Bytes.end(), i_rPayload.begin(), i_rPayload.end() );
     if( i_rPayload.size() % 2 != 0 )
@@ -97,10 +96,9 @@ namespace AviTest
 
   VBytes List( const std::string& i_rType, const std::vector< VBytes >& i_rChildren )
   {
-    VBytes Payload;
-    AppendText( Payload, i_rType );
-    const VBytes Children = Join( i_rChildren );
-    Payload.insert( Payload.end(), Children.begin(), Children.end() );
+    VBytes Payload = Text( i_rType );
+    for( const VBytes& rChild : i_rChildren )
+      Payload.insert( Payload.end(), rChild.begin(), rChild.end() );
     return Chunk( "LIST", Payload );
   }
 
@@ -111,45 +109,16 @@ namespace AviTest
     return Bytes;
   }
 
-  VBytes MainHeader( std::uint32_t i_MicrosecondsPerFrame, std::uint32_t i_Width, std::uint32_t i_Height )
-  {
-    VBytes Payload( 56, 0 );
-    VBytes Fields;
-    AppendLE( Fields, i_MicrosecondsPerFrame, 4 );
-    std::copy( Fields.begin(), Fields.end(), Payload.begin() );
-    Fields.clear();
-    AppendLE( Fields, i_Width, 4 );
-    AppendLE( Fields, i_Height, 4 );
-    std::copy( Fields.begin(), Fields.end(), Payload.begin() + 32 );
-    return Chunk( "avih", Payload );
-  }
-
   VBytes StreamHeader( const std::string& i_rType, std::uint32_t i_Scale, std::uint32_t i_Rate )
   {
-    VBytes Payload;
-    AppendText( Payload, i_rType );
-    Payload.resize( 20, 0 );
-    AppendLE( Payload, i_Scale, 4 );
-    AppendLE( Payload, i_Rate, 4 );
-    Payload.resize( 56, 0 );
+    VBytes Payload = Fields( 56, { { 20, i_Scale }, { 24, i_Rate } } );
+    std::copy( i_rType.begin(), i_rType.end(), Payload.begin() );
     return Chunk( "strh", Payload );
-  }
-
-  VBytes BitmapFormat( std::int32_t i_Width, std::int32_t i_Height, std::uint16_t i_Bits, std::uint32_t i_Compression )
-  {
-    VBytes Payload;
-    AppendLE( Payload, 40, 4 );
-    AppendLE( Payload, static_cast< std::uint32_t >( i_Width ), 4 );
-    AppendLE( Payload, static_cast< std::uint32_t >( i_Height ), 4 );
-    AppendLE( Payload, 1, 2 );
-    AppendLE( Payload, i_Bits, 2 );
-    AppendLE( Payload, i_Compression, 4 );
-    Payload.resize( 40, 0 );
-    return Chunk( "strf", Payload );
   }
 
   VBytes WaveFormat( std::uint16_t i_Tag, std::uint16_t i_Channels, std::uint32_t i_Rate, std::uint16_t i_Bits )
   {
+    // 16 bytes, as ffmpeg writes plain PCM.
     VBytes Payload;
     AppendLE( Payload, i_Tag, 2 );
     AppendLE( Payload, i_Channels, 2 );
@@ -157,7 +126,6 @@ namespace AviTest
     AppendLE( Payload, i_Rate * i_Channels * i_Bits / 8, 4 );
     AppendLE( Payload, i_Channels * i_Bits / 8, 2 );
     AppendLE( Payload, i_Bits, 2 );
-    // 16 bytes, as ffmpeg writes plain PCM.
     return Chunk( "strf", Payload );
   }
 
@@ -168,23 +136,10 @@ namespace AviTest
     AppendLE( Payload, 22, 2 );
     AppendLE( Payload, i_Bits, 2 );
     AppendLE( Payload, i_Channels == 2 ? 3 : 4, 4 );
-    VBytes SubFormat( std::begin( s_SubFormatPCM ), std::end( s_SubFormatPCM ) );
-    if( i_bFloat )
-      SubFormat[0] = 3;
-    Payload.insert( Payload.end(), SubFormat.begin(), SubFormat.end() );
+    // KSDATAFORMAT_SUBTYPE_PCM, or _IEEE_FLOAT by its first byte.
+    Payload.insert( Payload.end(), { std::uint8_t( i_bFloat ? 3 : 1 ), 0x00, 0x00, 0x00, 0x00, 0x00, 0x10, 0x00, 0x80,
+                                     0x00, 0x00, 0xAA, 0x00, 0x38, 0x9B, 0x71 } );
     return Chunk( "strf", Payload );
-  }
-
-  VBytes Creator( std::size_t i_Length )
-  {
-    VBytes Payload( i_Length, 'x' );
-    Payload.back() = 0;
-    return Chunk( "ISFT", Payload );
-  }
-
-  VBytes Frame( std::size_t i_Size, std::uint8_t i_Value )
-  {
-    return VBytes( i_Size, i_Value );
   }
 
   VAviSpec GreySpec( int i_Frames )
@@ -198,21 +153,18 @@ namespace AviTest
 
   VBytes BuildAvi( const VAviSpec& i_rSpec )
   {
-    VBytes VideoFormat = BitmapFormat( static_cast< std::int32_t >( i_rSpec.Width ), i_rSpec.StrfHeight, i_rSpec.Bits,
-                                       i_rSpec.Compression );
-    if( !i_rSpec.Palette.empty() )
-    {
-      VBytes Payload( VideoFormat.begin() + 8, VideoFormat.end() );
-      Payload.insert( Payload.end(), i_rSpec.Palette.begin(), i_rSpec.Palette.end() );
-      VideoFormat = Chunk( "strf", Payload );
-    }
-    std::vector< VBytes > StreamLists = {
-        List( "strl", { StreamHeader( "vids", i_rSpec.Scale, i_rSpec.Rate ), VideoFormat } ) };
-    if( !i_rSpec.AudioFormat.empty() )
-      StreamLists.push_back( List( "strl", { StreamHeader( "auds", 1, 48000 ), i_rSpec.AudioFormat } ) );
+    VBytes Bitmap = Fields( 40, { { 0, 40 },
+                                  { 4, i_rSpec.Width },
+                                  { 8, static_cast< std::uint32_t >( i_rSpec.StrfHeight ) },
+                                  { 12, 1u | ( std::uint32_t( i_rSpec.Bits ) << 16 ) },
+                                  { 16, i_rSpec.Compression } } );
+    Bitmap.insert( Bitmap.end(), i_rSpec.Palette.begin(), i_rSpec.Palette.end() );
     std::vector< VBytes > HeaderChildren = {
-        MainHeader( i_rSpec.MicrosecondsPerFrame, i_rSpec.Width, i_rSpec.Height ) };
-    HeaderChildren.insert( HeaderChildren.end(), StreamLists.begin(), StreamLists.end() );
+        Chunk( "avih",
+               Fields( 56, { { 0, i_rSpec.MicrosecondsPerFrame }, { 32, i_rSpec.Width }, { 36, i_rSpec.Height } } ) ),
+        List( "strl", { StreamHeader( "vids", i_rSpec.Scale, i_rSpec.Rate ), Chunk( "strf", Bitmap ) } ) };
+    if( !i_rSpec.AudioFormat.empty() )
+      HeaderChildren.push_back( List( "strl", { StreamHeader( "auds", 1, 48000 ), i_rSpec.AudioFormat } ) );
     HeaderChildren.push_back( i_rSpec.ExtraHeaderChunks );
     const VBytes Header = List( "hdrl", HeaderChildren );
 
@@ -228,17 +180,17 @@ namespace AviTest
     if( i_rSpec.OldIndexFrames >= 0 )
     {
       // Offsets count from the movi FourCC to each chunk's header.
-      const std::uint64_t Origin = MoviPosition + 8;
       VBytes Entries;
-      auto Add = [&]( const char* pId, const std::pair< std::uint64_t, std::uint64_t >& rEntry )
+      const auto Add = [&]( const char* pId, const std::pair< std::uint64_t, std::uint64_t >& rEntry )
       {
-        AppendText( Entries, pId );
+        const VBytes Id = Text( pId );
+        Entries.insert( Entries.end(), Id.begin(), Id.end() );
         AppendLE( Entries, 0x10, 4 );
-        AppendLE( Entries, rEntry.first - 8 - Origin, 4 );
+        AppendLE( Entries, rEntry.first - 8 - ( MoviPosition + 8 ), 4 );
         AppendLE( Entries, rEntry.second, 4 );
       };
-      for( int i = 0; i < i_rSpec.OldIndexFrames && i < static_cast< int >( Movi.Video.size() ); ++i )
-        Add( "00dc", Movi.Video[static_cast< std::size_t >( i )] );
+      for( std::size_t i = 0; i < std::min( std::size_t( i_rSpec.OldIndexFrames ), Movi.Video.size() ); ++i )
+        Add( "00dc", Movi.Video[i] );
       for( const auto& rAudio : Movi.Audio )
         Add( "01wb", rAudio );
       Parts.push_back( Chunk( "idx1", Entries ) );
@@ -255,6 +207,14 @@ namespace AviTest
     }
     File.insert( File.end(), i_rSpec.Trailer.begin(), i_rSpec.Trailer.end() );
     return File;
+  }
+
+  void Patch( VBytes& io_rFile, const std::string& i_rId, std::size_t i_Offset, std::uint64_t i_Value, int i_Width )
+  {
+    const auto Found = std::search( io_rFile.begin(), io_rFile.end(), i_rId.begin(), i_rId.end() );
+    const std::size_t At = static_cast< std::size_t >( Found - io_rFile.begin() ) + 8 + i_Offset;
+    for( int i = 0; i < i_Width; ++i )
+      io_rFile.at( At + static_cast< std::size_t >( i ) ) = static_cast< std::uint8_t >( i_Value >> ( 8 * i ) );
   }
 
   VOpenedAvi OpenAvi( const VBytes& i_rBytes )
@@ -276,21 +236,26 @@ namespace AviTest
     return VBytes( pVideo->GetData(), pVideo->GetData() + pVideo->GetSize() );
   }
 
-  VLogCapture::VLogCapture() : m_pRecords( std::make_shared< std::vector< ZOL::ILogRecord > >() )
+  VBytes DecodeVideo( RapidAVI::VRapidAVIReader& io_rReader, std::uint64_t i_Frame )
   {
-    auto pRecords = m_pRecords;
-    m_Handle = ZOL::GlobalLog().AddSink(
-        [pRecords]( const ZOL::ILogRecord& rRecord ) { pRecords->push_back( rRecord ); }, ZOL::LogDetail );
+    ZOL::IVideoFrame Frame;
+    if( !io_rReader.ReadFrame( i_Frame, Frame, true, false ) || !Frame.Video )
+      return {};
+    return VBytes( Frame.Video->GetData(), Frame.Video->GetData() + Frame.Video->GetSize() );
   }
 
-  VLogCapture::~VLogCapture()
+  std::string FfmpegAvi( const std::string& i_rName, const std::vector< std::string >& i_rArguments )
   {
-    ZOL::GlobalLog().RemoveSink( m_Handle );
+    if( !LumekTest::HaveFfmpeg() )
+      return {};
+    std::vector< std::string > Arguments = { "-f", "lavfi", "-i", "testsrc2=size=64x48:rate=25" };
+    Arguments.insert( Arguments.end(), i_rArguments.begin(), i_rArguments.end() );
+    return LumekTest::FfmpegFixture( i_rName, Arguments );
   }
 
-  bool VLogCapture::Contains( const std::string& i_rText ) const
+  VBytes ReadFile( const std::string& i_rPath )
   {
-    return std::any_of( m_pRecords->begin(), m_pRecords->end(),
-                        [&]( const ZOL::ILogRecord& rRecord ) { return rRecord.Message == i_rText; } );
+    std::ifstream Stream( i_rPath, std::ios::binary );
+    return VBytes( std::istreambuf_iterator< char >( Stream ), {} );
   }
 } // namespace AviTest

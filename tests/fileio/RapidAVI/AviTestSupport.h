@@ -1,11 +1,10 @@
 #pragma once
 
 // Hand-built AVI files: RIFF chunks put together byte by byte, so that each case of the chunk
-// rules can be made exactly, plus a capture of the reader's log lines.
+// rules can be made exactly; and the readers of the files ffmpeg makes.
 
 #include "fileio/RapidAVI/VRapidAVIReader.h"
-#include "services/ILogCategorised.h"
-#include "utils/MemoryStream.h"
+#include "tests/support/LogCapture.h"
 
 #include <cstdint>
 #include <memory>
@@ -17,20 +16,14 @@ namespace AviTest
   using VBytes = std::vector< std::uint8_t >;
 
   void AppendLE( VBytes& io_rBytes, std::uint64_t i_Value, int i_Width );
-  void AppendText( VBytes& io_rBytes, const std::string& i_rText );
-  VBytes Join( const std::vector< VBytes >& i_rParts );
-
+  VBytes Text( const std::string& i_rText );
   // A chunk with its pad byte when the payload is odd.
   VBytes Chunk( const std::string& i_rId, const VBytes& i_rPayload );
   VBytes List( const std::string& i_rType, const std::vector< VBytes >& i_rChildren );
   VBytes Riff( const std::string& i_rForm, const std::vector< VBytes >& i_rChildren );
-
-  VBytes MainHeader( std::uint32_t i_MicrosecondsPerFrame, std::uint32_t i_Width, std::uint32_t i_Height );
   VBytes StreamHeader( const std::string& i_rType, std::uint32_t i_Scale, std::uint32_t i_Rate );
-  VBytes BitmapFormat( std::int32_t i_Width, std::int32_t i_Height, std::uint16_t i_Bits, std::uint32_t i_Compression );
   VBytes WaveFormat( std::uint16_t i_Tag, std::uint16_t i_Channels, std::uint32_t i_Rate, std::uint16_t i_Bits );
   VBytes ExtensibleWaveFormat( bool i_bFloat, std::uint16_t i_Channels, std::uint32_t i_Rate, std::uint16_t i_Bits );
-  VBytes Creator( std::size_t i_Length );
 
   struct VAviSpec
   {
@@ -43,8 +36,7 @@ namespace AviTest
     std::uint32_t Compression = RapidAVI::MakeFourCC( "Y800" );
     std::uint16_t Bits = 8;
     std::int32_t StrfHeight = -4;
-    // Behind the bitmap header in strf.
-    VBytes Palette;
+    VBytes Palette; // behind the bitmap header in strf
     std::vector< VBytes > Frames;
     std::vector< VBytes > AudioChunks;
     // A whole "strf" chunk for the audio stream; empty for no audio stream.
@@ -61,10 +53,15 @@ namespace AviTest
   };
 
   // A frame of i_Size bytes, every byte i_Value.
-  VBytes Frame( std::size_t i_Size, std::uint8_t i_Value );
-  // A Y800 file of i_Frames frames of 8 x 4 with an idx1 of all of them.
+  inline VBytes Frame( std::size_t i_Size, std::uint8_t i_Value )
+  {
+    return VBytes( i_Size, i_Value );
+  }
+  // A Y800 file of i_Frames frames of 8 x 4, frame i filled with i + 1, with an idx1 of all.
   VAviSpec GreySpec( int i_Frames );
   VBytes BuildAvi( const VAviSpec& i_rSpec );
+  // Overwrites i_Width bytes at i_Offset into the payload of the first chunk named i_rId.
+  void Patch( VBytes& io_rFile, const std::string& i_rId, std::size_t i_Offset, std::uint64_t i_Value, int i_Width );
 
   // Keeps the bytes alive as long as the reader reads them.
   struct VOpenedAvi
@@ -74,20 +71,14 @@ namespace AviTest
     bool bOpened = false;
   };
   VOpenedAvi OpenAvi( const VBytes& i_rBytes );
-  // The payload the reader gives for a frame; empty when the read failed.
+  // The stored payload of a frame; empty when the read failed.
   VBytes ReadVideo( RapidAVI::VRapidAVIReader& io_rReader, std::uint64_t i_Frame );
+  // The decoded picture of a frame; empty when the read failed.
+  VBytes DecodeVideo( RapidAVI::VRapidAVIReader& io_rReader, std::uint64_t i_Frame );
 
-  // Lines the log receives while it lives, of every category.
-  class VLogCapture
-  {
-  public:
-    VLogCapture();
-    ~VLogCapture();
-    bool Contains( const std::string& i_rText ) const;
-    const std::vector< ZOL::ILogRecord >& GetRecords() const { return *m_pRecords; }
-
-  private:
-    std::shared_ptr< std::vector< ZOL::ILogRecord > > m_pRecords;
-    int m_Handle = 0;
-  };
+  // An AVI of ffmpeg's from testsrc2 at 64 x 48, 25 Hz, with these arguments behind the input;
+  // empty when there is no ffmpeg.
+  std::string FfmpegAvi( const std::string& i_rName, const std::vector< std::string >& i_rArguments );
+  // The whole file's bytes.
+  VBytes ReadFile( const std::string& i_rPath );
 } // namespace AviTest

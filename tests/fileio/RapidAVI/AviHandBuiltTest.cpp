@@ -1,0 +1,455 @@
+// Hand-built RIFF trees: each case of the chunk rules, the guards against damaged fields, the
+// audio each frame owns, timing, and the dump.
+
+#include "AviTestSupport.h"
+
+#include "fileio/LumekVideo/VReader.h"
+#include "fileio/LumekVideo/VWriter.h"
+#include "utils/MemoryStream.h"
+#include "videointerface/AttributeRecords.h"
+
+#include <gtest/gtest.h>
+#include <sstream>
+
+using namespace AviTest;
+
+namespace
+{
+  VBytes Nested( int i_Depth )
+  {
+    VBytes Inner = Chunk( "JUNK", VBytes( 4, 0 ) );
+    for( int i = 0; i < i_Depth; ++i )
+      Inner = List( "rec ", { Inner } );
+    return Inner;
+  }
+
+  VBytes Info( const std::string& i_rId, const std::string& i_rText )
+  {
+    VBytes Payload = Text( i_rText );
+    Payload.push_back( 0 );
+    return List( "INFO", { Chunk( i_rId, Payload ) } );
+  }
+
+  // 256 grey BGRA entries, with one entry's colour or alpha changed.
+  VBytes GreyPalette( std::size_t i_Changed = 0 )
+  {
+    VBytes Palette;
+    for( int i = 0; i < 256; ++i )
+      Palette.insert( Palette.end(), { std::uint8_t( i ), std::uint8_t( i ), std::uint8_t( i ), 0 } );
+    Palette[i_Changed] ^= i_Changed == 0 ? 0 : 0xFF;
+    return Palette;
+  }
+
+  void Bitmap( VAviSpec& io_rSpec, std::uint32_t i_Compression, std::uint16_t i_Bits, VBytes i_Palette = {} )
+  {
+    io_rSpec.Compression = i_Compression;
+    io_rSpec.Bits = i_Bits;
+    io_rSpec.Palette = std::move( i_Palette );
+  }
+
+  struct VTreeCase
+  {
+    const char* Name;
+    void ( *Change )( VAviSpec& );
+    bool bOpens;
+    std::uint64_t FrameCount;
+    // A line the log must hold; empty for none.
+    std::string LogLine;
+  };
+
+  // GreySpec( 3 ) changed by each row.
+  const VTreeCase s_TreeCases[] = {
+      { "Plain", []( VAviSpec& ) {}, true, 3, "" },
+      { "OddJunkWithPadByte", []( VAviSpec& s ) { s.ExtraMoviChunks = Chunk( "JUNK", VBytes( 3, 7 ) ); }, true, 3, "" },
+      { "ThirdStreamList",
+        []( VAviSpec& s )
+        {
+          s.AudioFormat = WaveFormat( 1, 1, 48000, 16 );
+          s.ExtraHeaderChunks = List( "strl", { StreamHeader( "auds", 1, 48000 ), s.AudioFormat } );
+        },
+        false, 0, "'LIST-hdlr' chunk must contain a single 'avih' and either 1 or 2 'LIST-strl' chunks." },
+      { "UnknownRiffFormAfterGoodPart",
+        []( VAviSpec& s ) { s.Trailer = Riff( "WAVE", { Chunk( "data", VBytes( 6 ) ) } ); }, true, 3,
+        "Unknown RIFF chunk 'WAVE' ignored." },
+      { "RecordListInMovi",
+        []( VAviSpec& s ) { s.ExtraMoviChunks = List( "rec ", { Chunk( "00dc", VBytes( 32, 9 ) ) } ); }, true, 3,
+        "Unknown chunk 'LIST-rec ' ignored." },
+      { "Creator511", []( VAviSpec& s ) { s.ExtraHeaderChunks = Info( "ISFT", std::string( 510, 'x' ) ); }, true, 3,
+        "AVI file created by: " + std::string( 510, 'x' ) },
+      { "Creator512", []( VAviSpec& s ) { s.ExtraHeaderChunks = Info( "ISFT", std::string( 511, 'x' ) ); }, true, 3,
+        "File creator chunk too large to show." },
+      { "SMPTETimecode", []( VAviSpec& s ) { s.ExtraHeaderChunks = Info( "ISMP", "01:02:03:04" ); }, true, 3,
+        "AVI file SMPTE start timecode: 01:02:03:04" },
+      { "OldIndexAheadOfMovi", []( VAviSpec& s ) { s.ExtraHeaderChunks = Chunk( "idx1", VBytes( 16, 0 ) ); }, true, 3,
+        "Index 'idx1' ahead of any 'LIST-movi' chunk ignored." },
+      { "NoIndexNoFrames", []( VAviSpec& s ) { s.OldIndexFrames = -1; }, true, 0, "" },
+      { "RateZero", []( VAviSpec& s ) { s.Rate = 0; }, false, 0, "AVI video stream has a rate of 0." },
+      { "PeriodBeyond32Bits", []( VAviSpec& s ) { s.Scale = 1000; }, false, 0,
+        "AVI video frame period of 1000/25 seconds is too long." },
+      { "ListsNestedTooDeep", []( VAviSpec& s ) { s.ExtraMoviChunks = Nested( 12 ); }, false, 0,
+        "RIFF lists are nested deeper than 8 levels." },
+      { "ListsNestedDeepButFine", []( VAviSpec& s ) { s.ExtraMoviChunks = Nested( 4 ); }, true, 3, "" },
+      { "UnsupportedCompression", []( VAviSpec& s ) { s.Compression = RapidAVI::MakeFourCC( "FMP4" ); }, false, 0,
+        "Unsupported compression format in AVI file." },
+      { "YUY2With32Bits", []( VAviSpec& s ) { Bitmap( s, RapidAVI::MakeFourCC( "YUY2" ), 32 ); }, false, 0,
+        "Unexpected bit depth in AVI file." },
+      { "Y800With16Bits", []( VAviSpec& s ) { s.Bits = 16; }, false, 0,
+        "Unsupported bit depth for Y800 data format in AVI file." },
+      { "RGBWith16Bits", []( VAviSpec& s ) { Bitmap( s, 0, 16 ); }, false, 0,
+        "Unsupported bit depth for BGR or BGRu data format in AVI file." },
+      { "GreyPalette", []( VAviSpec& s ) { Bitmap( s, 0, 8, GreyPalette() ); }, true, 3, "" },
+      { "GreyPaletteOtherAlpha", []( VAviSpec& s ) { Bitmap( s, 0, 8, GreyPalette( 4 * 17 + 3 ) ); }, true, 3, "" },
+      { "ColourPalette", []( VAviSpec& s ) { Bitmap( s, 0, 8, GreyPalette( 4 * 17 + 1 ) ); }, false, 0,
+        "Invalid palette contents.  If a palette is defined it must be greyscale." },
+      { "EightBitWithoutPalette", []( VAviSpec& s ) { s.Compression = 0; }, false, 0,
+        "Unsupported bitmap palette format.  Only a 256-colour BGRA palette is supported." },
+      { "SuperIndexBeyondFile",
+        []( VAviSpec& s )
+        {
+          VBytes Index( 24, 0 );
+          Index[4] = Index[5] = 0xFF;
+          s.ExtraHeaderChunks = Chunk( "indx", Index );
+        },
+        false, 0, "AVI cannot be read because superindex cannot be read." },
+      { "OpenDMLHeaderCut", []( VAviSpec& s ) { s.Trailer = List( "odml", { Chunk( "dmlh", VBytes( 4 ) ) } ); }, false,
+        0, "AVI cannot be read because superindex cannot be read, or doesn't contain exactly one entry." },
+      { "TrailingBytesShorterThanAHeader", []( VAviSpec& s ) { s.Trailer = VBytes( 5, 0xAB ); }, true, 3, "" },
+  };
+} // namespace
+
+TEST( AviTree, OpensAndCountsAsTheRulesSay )
+{
+  for( const VTreeCase& rCase : s_TreeCases )
+  {
+    SCOPED_TRACE( rCase.Name );
+    VAviSpec Spec = GreySpec( 3 );
+    rCase.Change( Spec );
+    LumekTest::VLogCapture Log;
+    VOpenedAvi Avi = OpenAvi( BuildAvi( Spec ) );
+    EXPECT_EQ( Avi.bOpened, rCase.bOpens );
+    EXPECT_TRUE( rCase.LogLine.empty() || Log.Has( rCase.LogLine ) ) << rCase.LogLine;
+    ASSERT_EQ( Avi.pReader->GetFrameCount(), rCase.FrameCount );
+    for( std::uint64_t i = 0; i < rCase.FrameCount; ++i )
+      EXPECT_EQ( ReadVideo( *Avi.pReader, i ), Frame( 32, static_cast< std::uint8_t >( i + 1 ) ) ) << "frame " << i;
+  }
+  // An ix00 whose count runs past its chunk, and a file that is no RIFF at all.
+  VAviSpec Spec = GreySpec( 3 );
+  Spec.StandardIndexFrames = 3;
+  VBytes File = BuildAvi( Spec );
+  Patch( File, "ix00", 4, 0x10000000, 4 );
+  LumekTest::VLogCapture Log;
+  EXPECT_FALSE( OpenAvi( File ).bOpened );
+  EXPECT_TRUE( Log.Has( "Could not read AVI file index." ) );
+  VOpenedAvi Garbage = OpenAvi( VBytes( 64, 0x5A ) );
+  EXPECT_TRUE( Garbage.bOpened );
+  EXPECT_EQ( Garbage.pReader->GetFrameCount(), 0u );
+  EXPECT_TRUE( Log.Has( "Unknown chunk 'ZZZZ' ignored." ) );
+}
+
+TEST( AviIndex, OldIndexOfHundredAgainstStandardIndexOfNinety )
+{
+  VAviSpec Spec = GreySpec( 100 );
+  Spec.StandardIndexFrames = 90;
+  LumekTest::VLogCapture Log;
+  VOpenedAvi Avi = OpenAvi( BuildAvi( Spec ) );
+  ASSERT_TRUE( Avi.bOpened );
+  EXPECT_EQ( Avi.pReader->GetFrameCount(), 100u );
+  EXPECT_TRUE( Avi.pReader->HasFrame( 99 ) );
+  EXPECT_EQ( ReadVideo( *Avi.pReader, 89 ), Frame( 32, 90 ) );
+  for( std::uint64_t Frame = 90; Frame < 100; ++Frame )
+    EXPECT_TRUE( ReadVideo( *Avi.pReader, Frame ).empty() ) << Frame;
+  EXPECT_TRUE( Log.Has( "Attempting to read frame beyond end of file." ) );
+}
+
+TEST( AviIndex, ExtendedPartAddsFrames )
+{
+  VAviSpec Spec = GreySpec( 3 );
+  Spec.StandardIndexFrames = 3;
+  Spec.ExtendedFrames = { Frame( 32, 40 ), Frame( 32, 41 ) };
+  VOpenedAvi Avi = OpenAvi( BuildAvi( Spec ) );
+  ASSERT_TRUE( Avi.bOpened );
+  EXPECT_EQ( Avi.pReader->GetMoviPositions().size(), 2u );
+  ASSERT_EQ( Avi.pReader->GetFrameCount(), 5u );
+  EXPECT_EQ( ReadVideo( *Avi.pReader, 2 ), Frame( 32, 3 ) );
+  EXPECT_EQ( ReadVideo( *Avi.pReader, 3 ), Frame( 32, 40 ) );
+  EXPECT_EQ( ReadVideo( *Avi.pReader, 4 ), Frame( 32, 41 ) );
+}
+
+TEST( AviIndex, TruncationInsideMoviKeepsTheWalkQuiet )
+{
+  const VBytes Whole = BuildAvi( GreySpec( 6 ) );
+  // Cut in the middle of the fourth frame's payload: idx1 is gone, so there are no frames.
+  const std::string Movi = "movi";
+  const auto At = std::search( Whole.begin(), Whole.end(), Movi.begin(), Movi.end() ) + 4 + 3 * 40 + 20;
+  VOpenedAvi Avi = OpenAvi( VBytes( Whole.begin(), At ) );
+  EXPECT_TRUE( Avi.bOpened );
+  EXPECT_EQ( Avi.pReader->GetFrameCount(), 0u );
+}
+
+TEST( AviIndex, DamagedEntriesFailOnlyTheirFrame )
+{
+  const struct
+  {
+    const char* Name;
+    const char* Chunk; // whose payload is patched
+    std::size_t Offset;
+    std::uint64_t Value;
+    bool bStandardIndex;
+    // The damage is to frame 1's audio, which fails the frame only when audio is asked for.
+    bool bAudio;
+  } Cases[] = {
+      { "StandardIndexSizeTopBit", "ix00", 24 + 8 + 4, 0x80000020, true, false },
+      { "OldIndexOffsetBeyondFile", "idx1", 16 + 8, 0x7FFFFFF0, false, false },
+      { "AudioSizeBeyondFile", "idx1", 4 * 16 + 12, 0x40000F00, false, true },
+  };
+  for( const auto& rCase : Cases )
+  {
+    SCOPED_TRACE( rCase.Name );
+    VAviSpec Spec = GreySpec( 3 );
+    Spec.StandardIndexFrames = rCase.bStandardIndex ? 3 : -1;
+    if( rCase.bAudio )
+    {
+      Spec.AudioFormat = WaveFormat( 1, 1, 48000, 16 );
+      Spec.AudioChunks.assign( 3, Frame( 3840, 0x80 ) );
+    }
+    VBytes File = BuildAvi( Spec );
+    Patch( File, rCase.Chunk, rCase.Offset, rCase.Value, 4 );
+    VOpenedAvi Avi = OpenAvi( File );
+    ASSERT_TRUE( Avi.bOpened );
+    for( std::uint64_t i = 0; i < 3; ++i )
+    {
+      std::shared_ptr< ZOL::IBuffer > pVideo;
+      ZOL::IAudioBuffers Audio;
+      EXPECT_EQ( Avi.pReader->ReadFrameData( i, pVideo, Audio, true, true ), i != 1 ) << "frame " << i;
+      EXPECT_EQ( ReadVideo( *Avi.pReader, i ).empty(), i == 1 && !rCase.bAudio ) << "frame " << i;
+    }
+  }
+  // A raw frame one byte too long fails without a word: a player asks for it again and again.
+  VAviSpec Spec = GreySpec( 2 );
+  Spec.Frames[1] = Frame( 33, 2 );
+  VOpenedAvi Avi = OpenAvi( BuildAvi( Spec ) );
+  ASSERT_TRUE( Avi.bOpened );
+  EXPECT_EQ( ReadVideo( *Avi.pReader, 0 ), Frame( 32, 1 ) );
+  LumekTest::VLogCapture Log;
+  EXPECT_TRUE( ReadVideo( *Avi.pReader, 1 ).empty() );
+  EXPECT_TRUE( Log.Records.empty() );
+}
+
+TEST( AviAudio, WaveFormatsUnderstoodAndRefused )
+{
+  const struct
+  {
+    const char* Name;
+    VBytes Format;
+    ZOL::EAudioSampleFormat SampleFormat;
+    // Bytes of one sample group: a chunk of 1920 of them lasts one frame at 48 kHz and 25 Hz.
+    std::size_t GroupBytes;
+    const char* LogLine;
+  } Cases[] = {
+      { "PcmU8", WaveFormat( 1, 2, 48000, 8 ), ZOL::AudioSampleFormat_UInt8, 2, "" },
+      { "PcmS16", WaveFormat( 1, 1, 48000, 16 ), ZOL::AudioSampleFormat_Int16, 2, "" },
+      { "ExtensibleS24", ExtensibleWaveFormat( false, 2, 48000, 24 ), ZOL::AudioSampleFormat_Int24, 6, "" },
+      { "ExtensibleS32", ExtensibleWaveFormat( false, 1, 48000, 32 ), ZOL::AudioSampleFormat_Int32, 4, "" },
+      { "ExtensibleFloat", ExtensibleWaveFormat( true, 1, 48000, 32 ), ZOL::AudioSampleFormat_Float32, 4, "" },
+      { "ExtensibleFloat64", ExtensibleWaveFormat( true, 1, 48000, 64 ), ZOL::AudioSampleFormat_Unspecified, 2,
+        "Unsupported audio bits per sample in AVI file." },
+      { "PcmS12", WaveFormat( 1, 1, 48000, 12 ), ZOL::AudioSampleFormat_Unspecified, 2,
+        "Unsupported audio bits per sample in AVI file." },
+      { "Mp3Tag", WaveFormat( 0x55, 2, 48000, 16 ), ZOL::AudioSampleFormat_Unspecified, 2,
+        "Unsupported audio payload in AVI file." },
+      { "PlainFloatTag", WaveFormat( 3, 1, 48000, 32 ), ZOL::AudioSampleFormat_Unspecified, 2,
+        "Unsupported audio payload in AVI file." },
+  };
+  for( const auto& rCase : Cases )
+  {
+    SCOPED_TRACE( rCase.Name );
+    VAviSpec Spec = GreySpec( 2 );
+    Spec.AudioFormat = rCase.Format;
+    Spec.AudioChunks.assign( 2, Frame( 1920 * rCase.GroupBytes, 0x80 ) );
+    LumekTest::VLogCapture Log;
+    VOpenedAvi Avi = OpenAvi( BuildAvi( Spec ) );
+    ASSERT_TRUE( Avi.bOpened );
+    const bool bAudio = rCase.SampleFormat != ZOL::AudioSampleFormat_Unspecified;
+    EXPECT_EQ( Avi.pReader->GetAudioFrameInfo().SampleFormat, rCase.SampleFormat );
+    EXPECT_EQ( Avi.pReader->GetAudioPayload(), bAudio ? ZOL::AudioPayload_Uncompressed : ZOL::AudioPayload_None );
+    EXPECT_TRUE( bAudio || Log.Has( rCase.LogLine ) ) << rCase.LogLine;
+    // Unusable audio leaves every frame readable, without sound.
+    for( std::uint64_t i = 0; i < 2; ++i )
+    {
+      ZOL::IVideoFrame Frame;
+      ASSERT_TRUE( Avi.pReader->ReadFrame( i, Frame, true, true ) );
+      ASSERT_EQ( Frame.Audio.size(), bAudio ? 1u : 0u );
+      EXPECT_TRUE( !bAudio || Frame.Audio[0]->GetSize() == Spec.AudioChunks[0].size() );
+    }
+  }
+}
+
+TEST( AviAudio, ChunksBelongToFramesByPlayTime )
+{
+  const struct
+  {
+    const char* Name;
+    std::uint32_t SampleRate;
+    std::vector< std::size_t > ChunkBytes;
+    std::vector< std::uint64_t > ChunkOfFrame;
+    // The sizes of the audio blocks of each frame.
+    std::vector< std::vector< std::uint64_t > > Frames;
+  } Cases[] = {
+      { "ZeroSampleRatePlaysWithoutAudio", 0, { 3840, 3840 }, {}, { {}, {} } },
+      { "AudioShorterThanVideo", 48000, { 3840, 3840 }, { 0, 1 }, { { 3840 }, { 3840 }, {}, {}, {} } },
+      // Half-frame chunks, two a frame; then a chunk of two frames, after which each chunk
+      // starts a frame one frame early, and the last frame is left without audio.
+      { "ChunksOfOtherLengths",
+        48000,
+        { 1920, 1920, 1920, 1920, 7680, 3840, 3840 },
+        { 0, 2, 4, 5, 6 },
+        { { 1920, 1920 }, { 1920, 1920 }, { 7680 }, { 3840 }, { 3840 }, {} } },
+  };
+  for( const auto& rCase : Cases )
+  {
+    SCOPED_TRACE( rCase.Name );
+    VAviSpec Spec = GreySpec( static_cast< int >( rCase.Frames.size() ) );
+    Spec.AudioFormat = WaveFormat( 1, 1, rCase.SampleRate, 16 );
+    for( std::size_t Bytes : rCase.ChunkBytes )
+      Spec.AudioChunks.push_back( Frame( Bytes, 0x80 ) );
+    VOpenedAvi Avi = OpenAvi( BuildAvi( Spec ) );
+    ASSERT_TRUE( Avi.bOpened );
+    EXPECT_EQ( Avi.pReader->GetAudioChunkOfFrame(), rCase.ChunkOfFrame );
+    for( std::uint64_t i = 0; i < rCase.Frames.size(); ++i )
+    {
+      ZOL::IVideoFrame Frame;
+      ASSERT_TRUE( Avi.pReader->ReadFrame( i, Frame, true, true ) );
+      std::vector< std::uint64_t > Sizes;
+      for( const auto& pBlock : Frame.Audio )
+        Sizes.push_back( pBlock->GetSize() );
+      EXPECT_EQ( Sizes, rCase.Frames[i] ) << "frame " << i;
+    }
+  }
+}
+
+TEST( AviTiming, PeriodInTicksAndTheOrientation )
+{
+  const struct
+  {
+    const char* Name;
+    std::uint32_t Scale;
+    std::uint32_t Rate;
+    std::uint32_t MicrosecondsPerFrame;
+    std::uint32_t Period;
+    double MainHeaderRate;
+    bool bInexact;
+  } Cases[] = { { "Pal25", 1, 25, 40000, 5400000, 25.0, false },
+                { "Ntsc", 1001, 30000, 33367, 4504500, 29.969, false },
+                { "Seven", 1, 7, 142857, 19285714, 7.0, true },
+                // No stream period: the main header's rate gives it.
+                { "MainHeaderOnly", 0, 25, 33367, 4504654, 29.969, false },
+                { "NoPeriodAnywhere", 0, 25, 0, 0, 0.0, false } };
+  for( const auto& rCase : Cases )
+  {
+    SCOPED_TRACE( rCase.Name );
+    VAviSpec Spec = GreySpec( 1 );
+    Spec.Scale = rCase.Scale;
+    Spec.Rate = rCase.Rate;
+    Spec.MicrosecondsPerFrame = rCase.MicrosecondsPerFrame;
+    LumekTest::VLogCapture Log;
+    VOpenedAvi Avi = OpenAvi( BuildAvi( Spec ) );
+    ASSERT_TRUE( Avi.bOpened );
+    EXPECT_EQ( Avi.pReader->GetVideoTiming().TicksPerSecond, 135000000u );
+    EXPECT_EQ( Avi.pReader->GetVideoTiming().FramePeriodInTicks, rCase.Period );
+    EXPECT_DOUBLE_EQ( Avi.pReader->GetMainHeaderFrameRate(), rCase.MainHeaderRate );
+    EXPECT_EQ( Log.Has( "AVI video frame rate cannot be represented in 135000000Hz ticks." ), rCase.bInexact );
+  }
+
+  // Only RGB bitmaps of positive height are stored bottom row first.
+  const struct
+  {
+    char FourCC[5];
+    std::uint16_t Bits;
+    std::int32_t StrfHeight;
+    bool bInverted;
+  } Orientations[] = { { "RGB ", 24, 4, true },
+                       { "RGB ", 24, -4, false },
+                       { "DIB ", 32, 4, true },
+                       { "Y800", 8, 4, false },
+                       { "YUY2", 16, 4, false } };
+  for( const auto& rCase : Orientations )
+  {
+    SCOPED_TRACE( std::string( rCase.FourCC ) + std::to_string( rCase.StrfHeight ) );
+    VAviSpec Spec;
+    Spec.Compression = RapidAVI::MakeFourCC( rCase.FourCC );
+    Spec.Bits = rCase.Bits;
+    Spec.StrfHeight = rCase.StrfHeight;
+    Spec.Frames = { Frame( 8 * 4 * rCase.Bits / 8, 1 ) };
+    Spec.OldIndexFrames = 1;
+    VOpenedAvi Avi = OpenAvi( BuildAvi( Spec ) );
+    ASSERT_TRUE( Avi.bOpened );
+    EXPECT_EQ( Avi.pReader->GetVideoFrameInfo().IsInverted(), rCase.bInverted );
+    EXPECT_EQ( ReadVideo( *Avi.pReader, 0 ).size(), Spec.Frames[0].size() );
+  }
+}
+
+TEST( AviDump, PrintsTheChunkTree )
+{
+  VAviSpec Spec = GreySpec( 1 );
+  Spec.ExtraMoviChunks = Chunk( "JUNK", VBytes( 3, 0 ) );
+  VOpenedAvi Avi = OpenAvi( BuildAvi( Spec ) );
+  ASSERT_TRUE( Avi.bOpened );
+  std::ostringstream Text;
+  ASSERT_TRUE( Avi.pReader->DumpFileStructure( Text ) );
+  EXPECT_EQ( Text.str(), "RIFF size: 292 pos: 0\n"
+                         "  LIST-hdrl size: 192 pos: 12\n"
+                         "    avih size: 56 pos: 24\n"
+                         "    LIST-strl size: 116 pos: 88\n"
+                         "      strh size: 56 pos: 100\n"
+                         "      strf size: 40 pos: 164\n"
+                         "  LIST-movi size: 56 pos: 212\n"
+                         "    JUNK size: 3 pos: 224\n"
+                         "    00dc size: 32 pos: 236\n"
+                         "  idx1 size: 16 pos: 276\n" );
+}
+
+TEST( AviMetadata, BayerDescriptionPlaysLikeAnLvid )
+{
+  ZOL::IVideoFrameInfo Info;
+  Info.ImageWidth = 8;
+  Info.ImageHeight = 4;
+  Info.PixelFormat = ZOL::PixelFormat_BayerGB8;
+  ZOL::IVideoAttributes FrameStore;
+  ASSERT_TRUE( ZOL::WriteVideoFrameInfo( FrameStore, Info ) );
+  ZOL::IVideoAttributes Attributes;
+  ZOL::IVideoTiming Timing;
+  Timing.FramePeriodInTicks = 1350000;
+  ASSERT_TRUE( ZOL::WriteVideoTiming( Attributes, Timing ) );
+  Attributes.Set( "Recording.Take", std::string( "Take 7" ) );
+  UtilsIO::VMemoryStream Stores;
+  ASSERT_TRUE( FrameStore.WriteTo( Stores ) && Attributes.WriteTo( Stores ) );
+
+  VAviSpec Spec = GreySpec( 4 );
+  Spec.Trailer = Riff( "QMDT", { Stores.GetData() } );
+  VOpenedAvi Avi = OpenAvi( BuildAvi( Spec ) );
+  ASSERT_TRUE( Avi.bOpened );
+
+  // The same frames and description through the .lvid writer and reader.
+  auto pLvid = std::make_shared< UtilsIO::VMemoryStream >();
+  {
+    LumekVideo::VWriter Writer;
+    ASSERT_TRUE( Writer.Create( pLvid, Info, ZOL::IAudioFrameInfo(), Attributes ) );
+    for( std::uint64_t i = 0; i < 4; ++i )
+      ASSERT_TRUE( Writer.AppendFrame( i, Spec.Frames[i].data(), Spec.Frames[i].size() ) );
+    ASSERT_TRUE( Writer.Close() );
+  }
+  LumekVideo::VReader Lvid;
+  ASSERT_TRUE( Lvid.Open( std::shared_ptr< ZOL::IInputStreamSeekable >( pLvid ) ) );
+
+  EXPECT_EQ( Avi.pReader->GetVideoFrameInfo(), Lvid.GetVideoFrameInfo() );
+  EXPECT_EQ( Avi.pReader->GetVideoTiming(), Lvid.GetVideoTiming() );
+  EXPECT_EQ( Avi.pReader->GetAttributes(), Attributes );
+  ASSERT_EQ( Avi.pReader->GetFrameCount(), Lvid.GetFrameCount() );
+  for( std::uint64_t i = 0; i < 4; ++i )
+  {
+    std::shared_ptr< ZOL::IBuffer > pVideo;
+    ZOL::IAudioBuffers Audio;
+    ASSERT_TRUE( Lvid.ReadFrameData( i, pVideo, Audio, true, false ) );
+    EXPECT_EQ( ReadVideo( *Avi.pReader, i ), VBytes( pVideo->GetData(), pVideo->GetData() + pVideo->GetSize() ) );
+  }
+}
