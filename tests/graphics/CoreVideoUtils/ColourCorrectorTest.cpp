@@ -1,6 +1,5 @@
 #include "ConversionTestSupport.h"
 #include "graphics/CoreVideoUtils/DisplayConversion.h"
-#include "tests/support/TestNames.h"
 
 #include <gtest/gtest.h>
 
@@ -29,74 +28,49 @@ namespace
     Corrector.Set( Settings( 1.0f, 0.5f ) );
     for( int i = 0; i < 256; ++i )
       ASSERT_EQ( Corrector.GetTable()[i], i * i / 256 ) << i;
-  }
-
-  TEST( ColourCorrector, TableStaysWhenGammaReturnsToOne )
-  {
-    VColourCorrector Corrector;
-    Corrector.Set( Settings( 1.0f, 0.5f ) );
+    // Gamma 1 leaves the last table in place rather than build an identity one.
     const auto Table = Corrector.GetTable();
     Corrector.Set( Settings( 1.0f, 1.0f ) );
     EXPECT_EQ( Corrector.GetTable(), Table );
+  }
+
+  TEST( ColourCorrector, GivesTheHandComputedBytesToTheRGBFamilyOnly )
+  {
+    const struct
+    {
+      const char* Name;
+      float Saturation, Gamma;
+      EPixelFormat Format;
+      Bytes Before, After;
+    } Cases[] = {
+        // The mean of 30, 60, 90 is 60; saturation 0 is all grey, 2 doubles the distance from grey.
+        { "SaturationZeroIsGrey", 0.0f, 1.0f, PixelFormat_R8G8B8, { 30, 60, 90 }, { 60, 60, 60 } },
+        { "SaturationHalf", 0.5f, 1.0f, PixelFormat_R8G8B8, { 30, 60, 90 }, { 45, 60, 75 } },
+        { "SaturationTwoClampsAtZero", 2.0f, 1.0f, PixelFormat_B8G8R8, { 30, 60, 90 }, { 0, 60, 120 } },
+        { "SaturationTwoClampsAt255", 2.0f, 1.0f, PixelFormat_R8G8B8, { 250, 100, 100 }, { 255, 50, 50 } },
+        { "SaturationBelowZeroStopsAtGrey", -3.0f, 1.0f, PixelFormat_R8G8B8, { 30, 60, 90 }, { 60, 60, 60 } },
+        // Gamma first, then saturation: 64, 128, 255 square to 16, 64, 254; their mean is 111.33.
+        { "GammaBeforeSaturation", 0.0f, 0.5f, PixelFormat_R8G8B8, { 64, 128, 255 }, { 111, 111, 111 } },
+        { "FourthByteUntouched", 0.0f, 0.5f, PixelFormat_R8G8B8u8, { 64, 128, 255, 7 }, { 111, 111, 111, 7 } },
+        { "GammaAloneOnFourBytePixels", 1.0f, 0.5f, PixelFormat_B8G8R8u8, { 16, 32, 255, 9 }, { 1, 4, 254, 9 } },
+        // Back to gamma 1 the table is kept but not applied.
+        { "Identity", 1.0f, 1.0f, PixelFormat_R8G8B8, { 64, 128, 255 }, { 64, 128, 255 } },
+    };
+    VColourCorrector Corrector;
+    for( const auto& rCase : Cases )
+    {
+      Corrector.Set( Settings( rCase.Saturation, rCase.Gamma ) );
+      Bytes Data = rCase.Before;
+      const unsigned Step = rCase.Format >= PixelFormat_R8G8B8u8 ? 4 : 3;
+      ASSERT_TRUE( Corrector.Apply( static_cast< std::int32_t >( Data.size() / Step ), 1, rCase.Format, Data.data() ) );
+      EXPECT_EQ( Data, rCase.After ) << rCase.Name;
+    }
     EXPECT_TRUE( Corrector.IsIdentity() );
-    Bytes Pixel = { 64, 128, 255 };
-    EXPECT_TRUE( Corrector.Apply( 1, 1, PixelFormat_R8G8B8, Pixel.data() ) );
-    EXPECT_EQ( Pixel, ( Bytes{ 64, 128, 255 } ) );
-  }
 
-  struct VCorrection
-  {
-    const char* Name;
-    float Saturation, Gamma;
-    EPixelFormat Format;
-    Bytes Before, After;
-  };
-
-  std::ostream& operator<<( std::ostream& o, const VCorrection& i_rCase )
-  {
-    return o << i_rCase.Name;
-  }
-
-  class Corrections : public ::testing::TestWithParam< VCorrection >
-  {
-  };
-
-  TEST_P( Corrections, GiveTheHandComputedBytes )
-  {
-    const VCorrection& rCase = GetParam();
-    VColourCorrector Corrector;
-    Corrector.Set( Settings( rCase.Saturation, rCase.Gamma ) );
-    Bytes Data = rCase.Before;
-    const unsigned Step = rCase.Format >= PixelFormat_R8G8B8u8 ? 4 : 3;
-    ASSERT_TRUE( Corrector.Apply( static_cast< std::int32_t >( Data.size() / Step ), 1, rCase.Format, Data.data() ) );
-    EXPECT_EQ( Data, rCase.After );
-  }
-
-  const VCorrection s_Corrections[] = {
-      // The mean of 30, 60, 90 is 60; saturation 0 is all grey, 2 doubles the distance from grey.
-      { "SaturationZeroIsGrey", 0.0f, 1.0f, PixelFormat_R8G8B8, { 30, 60, 90 }, { 60, 60, 60 } },
-      { "SaturationHalf", 0.5f, 1.0f, PixelFormat_R8G8B8, { 30, 60, 90 }, { 45, 60, 75 } },
-      { "SaturationTwoClampsAtZero", 2.0f, 1.0f, PixelFormat_B8G8R8, { 30, 60, 90 }, { 0, 60, 120 } },
-      { "SaturationTwoClampsAt255", 2.0f, 1.0f, PixelFormat_R8G8B8, { 250, 100, 100 }, { 255, 50, 50 } },
-      { "SaturationBelowZeroStopsAtGrey", -3.0f, 1.0f, PixelFormat_R8G8B8, { 30, 60, 90 }, { 60, 60, 60 } },
-      // Gamma first, then saturation: 64, 128, 255 square to 16, 64, 254; their mean is 111.33.
-      { "GammaBeforeSaturation", 0.0f, 0.5f, PixelFormat_R8G8B8, { 64, 128, 255 }, { 111, 111, 111 } },
-      { "FourthByteUntouched", 0.0f, 0.5f, PixelFormat_R8G8B8u8, { 64, 128, 255, 7 }, { 111, 111, 111, 7 } },
-      { "GammaAloneOnFourBytePixels", 1.0f, 0.5f, PixelFormat_B8G8R8u8, { 16, 32, 255, 9 }, { 1, 4, 254, 9 } },
-  };
-
-  INSTANTIATE_TEST_SUITE_P( Rules, Corrections, ::testing::ValuesIn( s_Corrections ), LumekTest::VCaseName() );
-
-  TEST( ColourCorrector, OnlyTheRGBFamilyIsCorrected )
-  {
-    VColourCorrector Corrector;
     Corrector.Set( Settings( 0.0f, 2.0f ) );
     Bytes Data( 8, 40 );
     for( int F = 0; F < 22; ++F )
-    {
-      const bool bRGB = F >= 7 && F <= 10;
-      EXPECT_EQ( Corrector.Apply( 2, 1, static_cast< EPixelFormat >( F ), Data.data() ), bRGB ) << F;
-    }
+      EXPECT_EQ( Corrector.Apply( 2, 1, static_cast< EPixelFormat >( F ), Data.data() ), F >= 7 && F <= 10 ) << F;
   }
 
   // After a conversion from the Bayer family into R8G8B8 to B8G8R8u8 the corrector runs once;

@@ -1,7 +1,6 @@
 #pragma once
 
 #include "graphics/CoreVideoUtils/PixelFormatConverter.h"
-#include "services/Log.h"
 
 #include <cstdint>
 #include <random>
@@ -11,6 +10,7 @@
 namespace CoreVideoUtilsTest
 {
   using Bytes = std::vector< std::uint8_t >;
+  using CoreVideoUtils::EInstructionSet;
 
   inline Bytes RandomBytes( std::size_t i_Count, std::uint32_t i_Seed )
   {
@@ -19,6 +19,16 @@ namespace CoreVideoUtilsTest
     for( auto& b : Result )
       b = static_cast< std::uint8_t >( Generator() );
     return Result;
+  }
+
+  // The instruction sets this processor runs, the scalar rule first.
+  inline std::vector< EInstructionSet > SupportedSets()
+  {
+    std::vector< EInstructionSet > Sets;
+    for( auto Set : { EInstructionSet::Scalar, EInstructionSet::SSE2, EInstructionSet::AVX2, EInstructionSet::AVX512 } )
+      if( CoreVideoUtils::IsSupported( Set ) )
+        Sets.push_back( Set );
+    return Sets;
   }
 
   inline ZOL::IVideoFrameInfo Info( std::int32_t i_Width, std::int32_t i_Height, ZOL::EPixelFormat i_Format )
@@ -33,7 +43,7 @@ namespace CoreVideoUtilsTest
   // Converts with a fresh converter; the target is sized for the format and starts as 0xCD.
   inline bool Convert( const Bytes& i_rSource, std::int32_t i_Width, std::int32_t i_Height, ZOL::EPixelFormat i_From,
                        ZOL::EPixelFormat i_To, Bytes& o_rTarget,
-                       CoreVideoUtils::EInstructionSet i_Set = CoreVideoUtils::BestInstructionSet(),
+                       EInstructionSet i_Set = CoreVideoUtils::BestInstructionSet(),
                        const ZOL::IVideoSettings& i_rSettings = ZOL::IVideoSettings() )
   {
     o_rTarget.assign( CoreVideoUtils::FrameSizeInBytes( i_Width, i_Height, i_To ), 0xCD );
@@ -44,6 +54,7 @@ namespace CoreVideoUtilsTest
                               o_rTarget.data(), o_rTarget.size() );
   }
 
+  // The converted frame, or nothing when the conversion fails.
   inline Bytes MustConvert( const Bytes& i_rSource, std::int32_t i_Width, std::int32_t i_Height,
                             ZOL::EPixelFormat i_From, ZOL::EPixelFormat i_To )
   {
@@ -52,27 +63,4 @@ namespace CoreVideoUtilsTest
       Result.clear();
     return Result;
   }
-
-  // Collects the log lines of one category while it lives.
-  class VLogCapture
-  {
-  public:
-    explicit VLogCapture( std::string i_Category ) : m_Category( std::move( i_Category ) )
-    {
-      m_Handle = ZOL::GlobalLog().AddSink(
-          [this]( const ZOL::ILogRecord& i_rRecord )
-          {
-            if( i_rRecord.Category == m_Category )
-              m_Lines.push_back( std::to_string( i_rRecord.Level ) + " " + i_rRecord.Message );
-          },
-          ZOL::LogDetail );
-    }
-    ~VLogCapture() { ZOL::GlobalLog().RemoveSink( m_Handle ); }
-    const std::vector< std::string >& Lines() const { return m_Lines; }
-
-  private:
-    std::string m_Category;
-    std::vector< std::string > m_Lines;
-    int m_Handle = 0;
-  };
 } // namespace CoreVideoUtilsTest

@@ -2,7 +2,6 @@
 // calculator and checked against the floating-point constants to within one step).
 
 #include "ConversionTestSupport.h"
-#include "tests/support/TestNames.h"
 
 #include <gtest/gtest.h>
 
@@ -20,11 +19,6 @@ namespace
     EPixelFormat To;
     Bytes Expected;
   };
-
-  std::ostream& operator<<( std::ostream& o, const VHandCase& i_rCase )
-  {
-    return o << i_rCase.Name;
-  }
 
   Bytes SwapRedBlue( Bytes i_RGB )
   {
@@ -119,26 +113,17 @@ namespace
   };
   // clang-format on
 
-  class HandComputedPixels : public ::testing::TestWithParam< VHandCase >
+  TEST( HandComputedPixels, EveryInstructionSetGivesTheHandComputedBytes )
   {
-  };
-
-  TEST_P( HandComputedPixels, EveryInstructionSetGivesTheHandComputedBytes )
-  {
-    const VHandCase& rCase = GetParam();
-    for( auto Set : { CoreVideoUtils::EInstructionSet::Scalar, CoreVideoUtils::EInstructionSet::SSE2,
-                      CoreVideoUtils::EInstructionSet::AVX2, CoreVideoUtils::EInstructionSet::AVX512 } )
-    {
-      if( !CoreVideoUtils::IsSupported( Set ) )
-        continue;
-      Bytes Target;
-      ASSERT_TRUE( Convert( rCase.Source, rCase.Width, rCase.Height, rCase.From, rCase.To, Target, Set ) )
-          << CoreVideoUtils::ToString( Set );
-      EXPECT_EQ( Target, rCase.Expected ) << CoreVideoUtils::ToString( Set );
-    }
+    for( const VHandCase& rCase : s_HandCases )
+      for( const EInstructionSet Set : SupportedSets() )
+      {
+        Bytes Target;
+        ASSERT_TRUE( Convert( rCase.Source, rCase.Width, rCase.Height, rCase.From, rCase.To, Target, Set ) )
+            << rCase.Name << " " << CoreVideoUtils::ToString( Set );
+        EXPECT_EQ( Target, rCase.Expected ) << rCase.Name << " " << CoreVideoUtils::ToString( Set );
+      }
   }
-
-  INSTANTIATE_TEST_SUITE_P( Formats, HandComputedPixels, ::testing::ValuesIn( s_HandCases ), LumekTest::VCaseName() );
 
   // The demosaic written a second way: by the colour of each site in the 2 x 2 pattern and the
   // neighbours of the colour wanted, instead of the converter's walking site kind.
@@ -173,47 +158,24 @@ namespace
     return Result;
   }
 
-  struct VPatternCase
+  TEST( HandComputedPixels, DemosaicAgreesWithASecondMethod )
   {
-    EPixelFormat Format;
-    const char* Pattern;
-  };
-
-  class DemosaicAgainstSecondMethod
-      : public ::testing::TestWithParam< std::tuple< VPatternCase, std::pair< int, int > > >
-  {
-  };
-
-  TEST_P( DemosaicAgainstSecondMethod, Matches )
-  {
-    const auto& [Pattern, Size] = GetParam();
-    const Bytes Mosaic = RandomBytes( Size.first * Size.second, 77 );
-    const Bytes Expected = ReferenceDemosaic( Mosaic, Size.first, Size.second, Pattern.Pattern );
-    for( auto Set : { CoreVideoUtils::EInstructionSet::Scalar, CoreVideoUtils::EInstructionSet::SSE2,
-                      CoreVideoUtils::EInstructionSet::AVX2, CoreVideoUtils::EInstructionSet::AVX512 } )
-    {
-      if( !CoreVideoUtils::IsSupported( Set ) )
-        continue;
-      Bytes Target;
-      ASSERT_TRUE( Convert( Mosaic, Size.first, Size.second, Pattern.Format, PixelFormat_R8G8B8, Target, Set ) );
-      EXPECT_EQ( Target, Expected ) << CoreVideoUtils::ToString( Set );
-    }
+    const std::pair< EPixelFormat, const char* > Patterns[] = { { PixelFormat_BayerRG8, "RGGB" },
+                                                                { PixelFormat_BayerGB8, "GBRG" },
+                                                                { PixelFormat_BayerGR8, "GRBG" },
+                                                                { PixelFormat_BayerBG8, "BGGR" } };
+    for( const auto& [Format, pPattern] : Patterns )
+      for( const auto& [W, H] : { std::make_pair( 1, 1 ), std::make_pair( 2, 2 ), std::make_pair( 5, 3 ),
+                                  std::make_pair( 37, 9 ), std::make_pair( 64, 4 ) } )
+      {
+        const Bytes Mosaic = RandomBytes( W * H, 77 );
+        const Bytes Expected = ReferenceDemosaic( Mosaic, W, H, pPattern );
+        for( const EInstructionSet Set : SupportedSets() )
+        {
+          Bytes Target;
+          ASSERT_TRUE( Convert( Mosaic, W, H, Format, PixelFormat_R8G8B8, Target, Set ) );
+          EXPECT_EQ( Target, Expected ) << pPattern << " " << W << "x" << H << " " << CoreVideoUtils::ToString( Set );
+        }
+      }
   }
-
-  std::string PatternCaseName( const ::testing::TestParamInfo< DemosaicAgainstSecondMethod::ParamType >& i_rInfo )
-  {
-    const auto& [Pattern, Size] = i_rInfo.param;
-    return std::string( ZOL::ToString( Pattern.Format ) ) + "_" + std::to_string( Size.first ) + "x" +
-           std::to_string( Size.second );
-  }
-
-  INSTANTIATE_TEST_SUITE_P( Patterns, DemosaicAgainstSecondMethod,
-                            ::testing::Combine( ::testing::Values( VPatternCase{ PixelFormat_BayerRG8, "RGGB" },
-                                                                   VPatternCase{ PixelFormat_BayerGB8, "GBRG" },
-                                                                   VPatternCase{ PixelFormat_BayerGR8, "GRBG" },
-                                                                   VPatternCase{ PixelFormat_BayerBG8, "BGGR" } ),
-                                                ::testing::Values( std::make_pair( 1, 1 ), std::make_pair( 2, 2 ),
-                                                                   std::make_pair( 5, 3 ), std::make_pair( 37, 9 ),
-                                                                   std::make_pair( 64, 4 ) ) ),
-                            PatternCaseName );
 } // namespace

@@ -3,7 +3,6 @@
 
 #include "ConversionTestSupport.h"
 #include "graphics/CoreVideoUtils/PixelKernels.h"
-#include "tests/support/TestNames.h"
 
 #include <gtest/gtest.h>
 
@@ -20,11 +19,6 @@ namespace
     unsigned Step;
   };
 
-  std::ostream& operator<<( std::ostream& o, const VRoundTrip& i_rTrip )
-  {
-    return o << i_rTrip.Name;
-  }
-
   const VRoundTrip s_RoundTrips[] = {
       { "R8G8B8_via_B8G8R8", PixelFormat_R8G8B8, PixelFormat_B8G8R8, { 0xFF, 0xFF, 0xFF }, 3 },
       { "R8G8B8_via_R8G8B8u8", PixelFormat_R8G8B8, PixelFormat_R8G8B8u8, { 0xFF, 0xFF, 0xFF }, 3 },
@@ -40,10 +34,6 @@ namespace
       { "BayerGB8_via_BayerGB6", PixelFormat_BayerGB8, PixelFormat_BayerGB6, { 0xFC }, 1 },
   };
 
-  class RoundTrips : public ::testing::TestWithParam< VRoundTrip >
-  {
-  };
-
   void CheckRoundTrip( const VRoundTrip& Trip, int W, int H )
   {
     const Bytes Source = RandomBytes( CoreVideoUtils::FrameSizeInBytes( W, H, Trip.From ), W * 7 + H );
@@ -57,19 +47,18 @@ namespace
     EXPECT_EQ( Back, Expected );
   }
 
-  TEST_P( RoundTrips, LoseOnlyTheNarrowFormatsBits )
+  TEST( RoundTrips, LoseOnlyTheNarrowFormatsBits )
   {
-    // Widths around the 48-pixel rows of the 10-bit format and an odd run longer than the
-    // converter's 4608-pixel runs.
-    for( const auto& [W, H] : { std::make_pair( 2, 1 ), std::make_pair( 47, 2 ), std::make_pair( 48, 3 ),
-                                std::make_pair( 98, 2 ), std::make_pair( 4610, 2 ), std::make_pair( 7, 5 ) } )
-    {
-      SCOPED_TRACE( std::to_string( W ) + "x" + std::to_string( H ) );
-      CheckRoundTrip( GetParam(), W, H );
-    }
+    for( const VRoundTrip& rTrip : s_RoundTrips )
+      // Widths around the 48-pixel rows of the 10-bit format and an odd run longer than the
+      // converter's 4608-pixel runs.
+      for( const auto& [W, H] : { std::make_pair( 2, 1 ), std::make_pair( 47, 2 ), std::make_pair( 48, 3 ),
+                                  std::make_pair( 98, 2 ), std::make_pair( 4610, 2 ), std::make_pair( 7, 5 ) } )
+      {
+        SCOPED_TRACE( std::string( rTrip.Name ) + " " + std::to_string( W ) + "x" + std::to_string( H ) );
+        CheckRoundTrip( rTrip, W, H );
+      }
   }
-
-  INSTANTIATE_TEST_SUITE_P( Pairs, RoundTrips, ::testing::ValuesIn( s_RoundTrips ), LumekTest::VCaseName() );
 
   // Samples read one bit at a time, most significant first: the second method for the packed forms.
   std::uint8_t SampleByBits( const Bytes& i_rStream, unsigned i_Bits, std::uint64_t i_Index )
@@ -82,10 +71,6 @@ namespace
     }
     return static_cast< std::uint8_t >( Value << ( 8 - i_Bits ) );
   }
-
-  class PackedSamples : public ::testing::TestWithParam< unsigned >
-  {
-  };
 
   void CheckPackedRun( unsigned Bits, int First, int Count )
   {
@@ -114,17 +99,15 @@ namespace
   }
 
   // Any start and length, including ones that begin and end inside a byte.
-  TEST_P( PackedSamples, UnpackMatchesBitByBitAndPackLeavesOtherBitsAlone )
+  TEST( PackedSamples, UnpackMatchesBitByBitAndPackLeavesOtherBitsAlone )
   {
-    for( int First : { 0, 1, 5, 8, 13 } )
-      for( int Count : { 1, 7, 8, 9, 31, 32, 33, 100, 1001 } )
-      {
-        SCOPED_TRACE( "first " + std::to_string( First ) + ", count " + std::to_string( Count ) );
-        CheckPackedRun( GetParam(), First, Count );
-      }
+    for( unsigned Bits : { 6u, 7u } )
+      for( int First : { 0, 1, 5, 8, 13 } )
+        for( int Count : { 1, 7, 8, 9, 31, 32, 33, 100, 1001 } )
+        {
+          SCOPED_TRACE( std::to_string( Bits ) + " bits, first " + std::to_string( First ) + ", count " +
+                        std::to_string( Count ) );
+          CheckPackedRun( Bits, First, Count );
+        }
   }
-
-  INSTANTIATE_TEST_SUITE_P( Runs, PackedSamples, ::testing::Values( 6u, 7u ),
-                            []( const ::testing::TestParamInfo< unsigned >& i_rInfo )
-                            { return std::to_string( i_rInfo.param ) + "Bits"; } );
 } // namespace

@@ -10,64 +10,38 @@ namespace
 {
   using namespace CoreVideoUtilsTest;
   using namespace ZOL;
-  using CoreVideoUtils::EInstructionSet;
 
-  const std::pair< int, int > s_Sizes[] = { { 1, 1 },  { 3, 3 },  { 17, 3 },  { 18, 5 },  { 19, 2 },
+  TEST( VectorForms, EqualTheScalarRule )
+  {
+    const std::pair< EPixelFormat, EPixelFormat > Pairs[] = {
+        { PixelFormat_BayerRG8, PixelFormat_R8G8B8 },       { PixelFormat_BayerGB8, PixelFormat_R8G8B8 },
+        { PixelFormat_BayerGR8, PixelFormat_B8G8R8 },       { PixelFormat_BayerBG8, PixelFormat_R8G8B8u8 },
+        { PixelFormat_BayerGB7, PixelFormat_B8G8R8u8 },     { PixelFormat_BayerGB6, PixelFormat_Luminance8 },
+        { PixelFormat_U8Y8V8Y8, PixelFormat_R8G8B8 },       { PixelFormat_Y8U8Y8V8, PixelFormat_R8G8B8 },
+        { PixelFormat_PlanarY8U8V8, PixelFormat_R8G8B8u8 }, { PixelFormat_PlanarR8G8B8, PixelFormat_Luminance8 },
+        { PixelFormat_R5G6B5, PixelFormat_Luminance8 },
+    };
+    // Sizes that leave every kind of remainder of the vector widths.
+    const std::pair< int, int > Sizes[] = { { 1, 1 },  { 3, 3 },  { 17, 3 },  { 18, 5 },  { 19, 2 },
                                             { 33, 7 }, { 35, 1 }, { 101, 9 }, { 255, 4 }, { 1921, 3 } };
-
-  class VectorForms
-      : public ::testing::TestWithParam< std::tuple< EInstructionSet, std::tuple< EPixelFormat, EPixelFormat > > >
-  {
-  protected:
-    void SetUp() override
-    {
-      if( !CoreVideoUtils::IsSupported( std::get< 0 >( GetParam() ) ) )
-        GTEST_SKIP() << "this processor has no " << CoreVideoUtils::ToString( std::get< 0 >( GetParam() ) );
-    }
-  };
-
-  TEST_P( VectorForms, EqualTheScalarRule )
-  {
-    const auto& [Set, Pair] = GetParam();
-    const auto& [From, To] = Pair;
     // Gamma and saturation on, so that Bayer targets also run the colour correction's vector form.
     ZOL::IVideoSettings Settings;
     Settings.GammaCorrection = 1.7f;
     Settings.Saturation = 0.6f;
-    for( const auto& [W, H] : s_Sizes )
-    {
-      if( From == PixelFormat_U10Y10V10Y10 && ( W * H ) % 2 != 0 )
-        continue;
-      const Bytes Source = RandomBytes( CoreVideoUtils::FrameSizeInBytes( W, H, From ), W * 31 + H );
-      Bytes Scalar, Vector;
-      ASSERT_TRUE( Convert( Source, W, H, From, To, Scalar, EInstructionSet::Scalar, Settings ) );
-      ASSERT_TRUE( Convert( Source, W, H, From, To, Vector, Set, Settings ) );
-      ASSERT_EQ( Vector, Scalar ) << W << "x" << H;
-    }
+    for( const auto& [From, To] : Pairs )
+      for( const auto& [W, H] : Sizes )
+      {
+        const Bytes Source = RandomBytes( CoreVideoUtils::FrameSizeInBytes( W, H, From ), W * 31 + H );
+        Bytes Scalar, Vector;
+        ASSERT_TRUE( Convert( Source, W, H, From, To, Scalar, EInstructionSet::Scalar, Settings ) );
+        for( const EInstructionSet Set : SupportedSets() )
+        {
+          ASSERT_TRUE( Convert( Source, W, H, From, To, Vector, Set, Settings ) );
+          ASSERT_EQ( Vector, Scalar ) << CoreVideoUtils::ToString( Set ) << " " << ToString( From ) << " to "
+                                      << ToString( To ) << " " << W << "x" << H;
+        }
+      }
   }
-
-  std::string VectorFormName( const ::testing::TestParamInfo< VectorForms::ParamType >& i_rInfo )
-  {
-    const auto& [Set, Pair] = i_rInfo.param;
-    return std::string( CoreVideoUtils::ToString( Set ) ) + "_" + ToString( std::get< 0 >( Pair ) ) + "_to_" +
-           ToString( std::get< 1 >( Pair ) );
-  }
-
-  INSTANTIATE_TEST_SUITE_P(
-      Kernels, VectorForms,
-      ::testing::Combine( ::testing::Values( EInstructionSet::SSE2, EInstructionSet::AVX2, EInstructionSet::AVX512 ),
-                          ::testing::Values( std::make_tuple( PixelFormat_BayerRG8, PixelFormat_R8G8B8 ),
-                                             std::make_tuple( PixelFormat_BayerGB8, PixelFormat_R8G8B8 ),
-                                             std::make_tuple( PixelFormat_BayerGR8, PixelFormat_B8G8R8 ),
-                                             std::make_tuple( PixelFormat_BayerBG8, PixelFormat_R8G8B8u8 ),
-                                             std::make_tuple( PixelFormat_BayerGB7, PixelFormat_B8G8R8u8 ),
-                                             std::make_tuple( PixelFormat_BayerGB6, PixelFormat_Luminance8 ),
-                                             std::make_tuple( PixelFormat_U8Y8V8Y8, PixelFormat_R8G8B8 ),
-                                             std::make_tuple( PixelFormat_Y8U8Y8V8, PixelFormat_R8G8B8 ),
-                                             std::make_tuple( PixelFormat_PlanarY8U8V8, PixelFormat_R8G8B8u8 ),
-                                             std::make_tuple( PixelFormat_PlanarR8G8B8, PixelFormat_Luminance8 ),
-                                             std::make_tuple( PixelFormat_R5G6B5, PixelFormat_Luminance8 ) ) ),
-      VectorFormName );
 
   // Every 8-bit chroma and luma combination through the YUV kernel: the vector form's split of
   // the 16.16 constants must floor exactly as the full products do.
@@ -102,10 +76,8 @@ namespace
           const std::uint64_t Count = Pixels.size() / Step;
           Bytes Scalar = Pixels;
           Corrector.ApplyToRun( Scalar.data(), Count, Step, EInstructionSet::Scalar );
-          for( EInstructionSet Set : { EInstructionSet::SSE2, EInstructionSet::AVX2, EInstructionSet::AVX512 } )
+          for( const EInstructionSet Set : SupportedSets() )
           {
-            if( !CoreVideoUtils::IsSupported( Set ) )
-              continue;
             Bytes Vector = Pixels;
             Corrector.ApplyToRun( Vector.data(), Count, Step, Set );
             ASSERT_EQ( Vector, Scalar ) << CoreVideoUtils::ToString( Set ) << " gamma " << Gamma << " saturation "
