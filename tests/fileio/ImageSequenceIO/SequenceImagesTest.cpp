@@ -1,22 +1,38 @@
 // Real image sequences made by ffmpeg, described by the project's own descriptor writer, read
-// and decoded by the reader, and compared with ffmpeg's decode of the same files.
+// and decoded by the reader and compared with ffmpeg's decode of the same files; and damaged
+// descriptors and images, cut and flipped at many points, which the reader answers false or
+// reads as far as it can, never crashing, hanging or allocating without bound.
 
-#include "fileio/ImageSequenceIO/VImageSequenceReader.h"
 #include "fileio/VideoReaders/CreateVideoReader.h"
 #include "tests/fileio/ImageSequenceIO/SequenceTestSupport.h"
 #include "tests/support/FfmpegFixtures.h"
+#include "tests/support/LogCapture.h"
+#include "tests/support/TestNames.h"
+#include "utils/MemoryStream.h"
 
 #include <gtest/gtest.h>
 
 #include <cstdlib>
+#include <map>
 
 using namespace ImageSequenceTest;
+using ImageSequenceIO::VImageSequenceReader;
 
 namespace
 {
+  std::string MakeImage( const std::string& i_rName, const char* i_pPixelFormat, const std::string& i_rSize,
+                         std::uint64_t i_Frame = 0 )
+  {
+    const std::string Path = LumekTest::FfmpegFixture(
+        i_rName, { "-f", "lavfi", "-i", "testsrc2=size=" + i_rSize + ":rate=25:duration=1", "-vf",
+                   "trim=start_frame=" + std::to_string( i_Frame ), "-frames:v", "1", "-pix_fmt", i_pPixelFormat } );
+    EXPECT_FALSE( Path.empty() ) << i_rName;
+    return Path;
+  }
+
   struct VImageCase
   {
-    const char* Label;
+    const char* Name;
     const char* Extension;
     const char* FfmpegPixelFormat;
     // JPEG decoders may round and upsample chroma their own way; lossless files match exactly.
@@ -35,10 +51,6 @@ namespace
       { "Tiff", ".tif", "rgb24", 0, 0.0 },
   };
 
-  constexpr std::uint32_t FrameCount = 4;
-  // Frame 1 is left out: a missing frame.
-  constexpr std::uint64_t StoredFrames[] = { 0, 2, 3 };
-
   class SequenceImages : public testing::TestWithParam< VImageCase >
   {
   protected:
@@ -46,23 +58,23 @@ namespace
     {
       if( !LumekTest::HaveFfmpeg() )
         GTEST_SKIP() << "ffmpeg is not installed";
-      const VImageCase& rCase = GetParam();
-      for( const std::uint64_t Frame : StoredFrames )
+      // Frame 1 is left out: a missing frame.
+      for( const std::uint64_t Frame : { 0, 2, 3 } )
       {
-        const std::string Fixture = LumekTest::FfmpegFixture(
-            std::string( "sequence-" ) + rCase.Label + "-" + std::to_string( Frame ) + rCase.Extension,
-            { "-f", "lavfi", "-i", "testsrc2=size=48x32:rate=25:duration=1", "-vf",
-              "trim=start_frame=" + std::to_string( Frame ), "-frames:v", "1", "-pix_fmt", rCase.FfmpegPixelFormat } );
-        ASSERT_FALSE( Fixture.empty() );
-        CopyFile( Fixture, FileName( Frame ) );
+        const std::string Fixture = MakeImage( std::string( "sequence-" ) + GetParam().Name + "-" +
+                                                   std::to_string( Frame ) + GetParam().Extension,
+                                               GetParam().FfmpegPixelFormat, "48x32", Frame );
+        WriteFile( FileName( Frame ), ReadFile( Fixture ) );
+        m_Expected[Frame] = LumekTest::FfmpegDecode( Fixture, GetParam().FfmpegDecodeFormat );
+        ASSERT_FALSE( m_Expected[Frame].empty() );
       }
-      m_Pattern = std::string( "take_%FRAME%" ) + rCase.Extension;
-      ImageSequenceIO::VDescriptor Descriptor = MakeDescriptor( m_Pattern, FrameCount, 4 );
+      ImageSequenceIO::VDescriptor Descriptor = MakeDescriptor( Pattern(), 4, 4 );
       Descriptor.Timecode.Standards = ZOL::TimecodeStandard_25;
       Descriptor.Timecode.Hours = 10;
-      ASSERT_TRUE( ImageSequenceIO::WriteDescriptor( m_Folder / "take_.lumekimagesequence", Descriptor ) );
+      ASSERT_TRUE( WriteDescriptor( m_Folder / "take_.lumekimagesequence", Descriptor ) );
     }
 
+    std::string Pattern() const { return std::string( "take_%FRAME%" ) + GetParam().Extension; }
     std::string FileName( std::uint64_t i_Frame ) const
     {
       return m_Folder / ( "take_000" + std::to_string( i_Frame ) + GetParam().Extension );
@@ -70,70 +82,144 @@ namespace
 
     void ExpectPixelsOfFfmpeg( ZOL::IVideoReader& io_rReader )
     {
-      const VImageCase& rCase = GetParam();
-      for( const std::uint64_t Frame : StoredFrames )
+      EXPECT_EQ( 4u, io_rReader.GetFrameCount() );
+      for( const auto& [Frame, rExpected] : m_Expected )
       {
         ZOL::IVideoFrame Decoded;
         ASSERT_TRUE( io_rReader.ReadFrame( Frame, Decoded, true, true ) ) << Frame;
-        ASSERT_EQ( rCase.Decoded, Decoded.VideoFrameInfo.PixelFormat );
+        ASSERT_EQ( GetParam().Decoded, Decoded.VideoFrameInfo.PixelFormat );
         ASSERT_EQ( 48, Decoded.VideoFrameInfo.ImageWidth );
         ASSERT_EQ( 32, Decoded.VideoFrameInfo.ImageHeight );
-        const std::vector< std::uint8_t > Expected =
-            LumekTest::FfmpegDecode( FileName( Frame ), rCase.FfmpegDecodeFormat );
         // The frame's buffer is sized for colour before the image says it is grey: the pixels
         // are at its start.
-        ASSERT_FALSE( Expected.empty() );
-        ASSERT_LE( Expected.size(), Decoded.Video->GetSize() );
+        ASSERT_LE( rExpected.size(), Decoded.Video->GetSize() );
         int MaxDifference = 0;
         double Sum = 0.0;
-        for( std::size_t i = 0; i < Expected.size(); ++i )
+        for( std::size_t i = 0; i < rExpected.size(); ++i )
         {
-          const int Difference = std::abs( int( Expected[i] ) - int( Decoded.Video->GetData()[i] ) );
+          const int Difference = std::abs( int( rExpected[i] ) - int( Decoded.Video->GetData()[i] ) );
           MaxDifference = std::max( MaxDifference, Difference );
           Sum += Difference;
         }
-        EXPECT_LE( MaxDifference, rCase.MaxDifference ) << "frame " << Frame;
-        EXPECT_LE( Sum / static_cast< double >( Expected.size() ), rCase.MaxMeanDifference ) << "frame " << Frame;
+        EXPECT_LE( MaxDifference, GetParam().MaxDifference ) << "frame " << Frame;
+        EXPECT_LE( Sum / static_cast< double >( rExpected.size() ), GetParam().MaxMeanDifference ) << "frame " << Frame;
       }
       ZOL::IVideoFrame Missing;
       EXPECT_FALSE( io_rReader.ReadFrame( 1, Missing, true, false ) );
     }
 
     VTempFolder m_Folder;
-    std::string m_Pattern;
+    std::map< std::uint64_t, VBytes > m_Expected;
   };
 
-  TEST_P( SequenceImages, ThroughThePatternDecodesAsFfmpegDoes )
+  // Through the pattern, through a middle image that finds the descriptor, and without the
+  // descriptor, where the run of files still plays.
+  TEST_P( SequenceImages, DecodeAsFfmpegDoesHoweverOpened )
   {
-    const auto pReader = CreateVideoReader( m_Folder / m_Pattern );
-    ASSERT_TRUE( pReader && pReader->Open( m_Folder / m_Pattern ) );
-    EXPECT_EQ( FrameCount, pReader->GetFrameCount() );
+    auto pReader = CreateVideoReader( m_Folder / Pattern() );
+    ASSERT_TRUE( pReader && pReader->Open( m_Folder / Pattern() ) );
     EXPECT_EQ( 10, pReader->GetTimecode().Hours );
     EXPECT_DOUBLE_EQ( 25.0, pReader->GetVideoTiming().GetFrameRate() );
     ExpectPixelsOfFfmpeg( *pReader );
-  }
 
-  TEST_P( SequenceImages, ThroughAMiddleImageFindsTheDescriptor )
-  {
-    const std::string Middle = FileName( 2 );
-    const auto pReader = CreateVideoReader( Middle );
-    ASSERT_TRUE( pReader && pReader->Open( Middle ) );
-    auto& rSequence = dynamic_cast< ImageSequenceIO::VImageSequenceReader& >( *pReader );
+    pReader = CreateVideoReader( FileName( 2 ) );
+    ASSERT_TRUE( pReader && pReader->Open( FileName( 2 ) ) );
+    auto& rSequence = dynamic_cast< VImageSequenceReader& >( *pReader );
     EXPECT_EQ( m_Folder / "take_.lumekimagesequence", rSequence.GetDescriptorPath() );
-    EXPECT_EQ( FrameCount, rSequence.GetFrameCount() );
     EXPECT_EQ( 3u, rSequence.GetStoredFrameCount() );
     ExpectPixelsOfFfmpeg( rSequence );
-  }
 
-  TEST_P( SequenceImages, WithoutADescriptorTheRunStillPlays )
-  {
     std::remove( ( m_Folder / "take_.lumekimagesequence" ).c_str() );
-    const auto pReader = CreateVideoReader( FileName( 3 ) );
+    pReader = CreateVideoReader( FileName( 3 ) );
     ASSERT_TRUE( pReader && pReader->Open( FileName( 3 ) ) );
-    EXPECT_EQ( FrameCount, pReader->GetFrameCount() );
     ExpectPixelsOfFfmpeg( *pReader );
   }
 
-  INSTANTIATE_TEST_SUITE_P( Formats, SequenceImages, testing::ValuesIn( s_Images ),
-                            []( const testing::TestParamInfo< VImageCase >& i_rInfo ) { return i_rInfo.param.Label; } );
+  INSTANTIATE_TEST_SUITE_P( Formats, SequenceImages, testing::ValuesIn( s_Images ), LumekTest::VCaseName() );
+
+  // Reads every frame the way the viewer does; the result does not matter, surviving does.
+  void ReadAll( VImageSequenceReader& io_rReader )
+  {
+    for( std::uint64_t i = 0; i < std::min< std::uint64_t >( io_rReader.GetFrameCount(), 8 ); ++i )
+    {
+      (void)io_rReader.HasFrame( i );
+      ZOL::IVideoFrame Frame;
+      (void)io_rReader.ReadFrame( i, Frame, true, true );
+    }
+    (void)io_rReader.GetStoredFrameCount();
+    (void)io_rReader.FindStoredFrameAtOrBefore( ~std::uint64_t( 0 ) );
+  }
+
+  TEST( SequenceDamage, EveryCutAndFlipOfADescriptorIsSurvived )
+  {
+    VTempFolder Folder;
+    for( const char* pName : { "t_00.png", "t_01.png", "t_0102030400.png" } )
+      WriteFile( Folder / pName, std::string( "\x89PNG\r\n\x1a\n not really" ) );
+    const LumekTest::VLogCapture Quiet;
+    for( const char* pPattern : { "t_%FRAME%.png", "t_%TIMECODE%.png" } )
+    {
+      SCOPED_TRACE( pPattern );
+      ImageSequenceIO::VDescriptor Descriptor = MakeDescriptor( pPattern, 3, 2, 2 );
+      if( std::string( pPattern ).find( "%TIMECODE%" ) != std::string::npos )
+      {
+        Descriptor.Timecode.Standards = ZOL::TimecodeStandard_30;
+        Descriptor.Timecode.Hours = 1;
+      }
+      ZOL::IVideoAttributes FrameKeys, Attributes;
+      ASSERT_TRUE( ImageSequenceIO::MakeDescriptorStores( Descriptor, FrameKeys, Attributes ) );
+      UtilsIO::VMemoryStream Stream;
+      ASSERT_TRUE( FrameKeys.WriteTo( Stream ) && Attributes.WriteTo( Stream ) );
+      const VBytes Bytes = Stream.GetData();
+      VImageSequenceReader Reader;
+      for( std::size_t Position = 0; Position <= Bytes.size(); ++Position )
+        for( const std::uint8_t Flip : { 0x00, 0x01, 0x80, 0xFF } )
+        {
+          // A flip of nothing is the cut at this position.
+          VBytes Damaged( Bytes.begin(),
+                          Flip ? Bytes.end() : Bytes.begin() + static_cast< std::ptrdiff_t >( Position ) );
+          if( Flip && Position == Bytes.size() )
+            continue;
+          if( Flip )
+            Damaged[Position] ^= Flip;
+          UtilsIO::VMemoryInputStream Input( Damaged.data(), Damaged.size() );
+          if( Reader.Open( Folder.Path(), Input ) )
+            ReadAll( Reader );
+        }
+      // The same through a file: a cut descriptor on disk.
+      WriteFile( Folder / "t.lumekimagesequence", VBytes( Bytes.begin(), Bytes.begin() + Bytes.size() / 2 ) );
+      EXPECT_FALSE( Reader.Open( Folder / "t.lumekimagesequence" ) );
+    }
+  }
+
+  TEST( SequenceDamage, EveryCutAndFlipOfAnImageIsSurvived )
+  {
+    if( !LumekTest::HaveFfmpeg() )
+      GTEST_SKIP() << "ffmpeg is not installed";
+    const LumekTest::VLogCapture Quiet;
+    VTempFolder Folder;
+    for( const auto& [pExtension, pPixelFormat] :
+         { std::pair( ".jpg", "yuvj420p" ), std::pair( ".png", "rgb24" ), std::pair( ".tiff", "rgb24" ) } )
+    {
+      SCOPED_TRACE( pExtension );
+      const VBytes Image = ReadFile( MakeImage( std::string( "damaged" ) + pExtension, pPixelFormat, "24x16" ) );
+      ASSERT_FALSE( Image.empty() );
+      const std::string Name = Folder / ( std::string( "d_0" ) + pExtension );
+      // Steps that reach every part of a small file without a run per byte.
+      const std::size_t Step = std::max< std::size_t >( 1, Image.size() / 97 );
+      VImageSequenceReader Reader;
+      for( std::size_t Position = 0; Position <= Image.size(); Position += Step )
+        for( const bool bFlip : { false, true } )
+        {
+          VBytes Damaged( Image.begin(),
+                          bFlip ? Image.end() : Image.begin() + static_cast< std::ptrdiff_t >( Position ) );
+          if( bFlip && Position == Image.size() )
+            continue;
+          if( bFlip )
+            Damaged[Position] ^= 0xA5;
+          WriteFile( Name, Damaged );
+          if( Reader.Open( Name ) )
+            ReadAll( Reader );
+        }
+    }
+  }
 } // namespace

@@ -1,321 +1,163 @@
-// Descriptors and patterns against folders of small files: which frames exist, what each
-// frame's file is called, which descriptor a name leads to. The files hold their own names, so
-// a frame read from the wrong file shows at once.
+// Descriptors, patterns and numbered names against folders of small files: which frames exist,
+// what each frame's file is called, which descriptor a name leads to. The files of a pattern
+// hold their own names, so a frame read from the wrong file shows at once; the numbered images
+// are only headers, as the size is all the reader takes from them when it opens.
 
-#include "fileio/ImageSequenceIO/VImageSequenceReader.h"
+#include "fileio/ImageSequenceIO/ImageHeader.h"
 #include "fileio/VideoReaders/CreateVideoReader.h"
 #include "tests/fileio/ImageSequenceIO/SequenceTestSupport.h"
+#include "tests/support/LogCapture.h"
 
 #include <gtest/gtest.h>
 
-#include <set>
+#include <sstream>
 
 using namespace ImageSequenceTest;
+using ImageSequenceIO::VImageSequenceReader;
+using LumekTest::VLogCapture;
 
 namespace
 {
+  std::vector< std::string > Words( const std::string& i_rText )
+  {
+    std::istringstream Stream( i_rText );
+    return { std::istream_iterator< std::string >( Stream ), std::istream_iterator< std::string >() };
+  }
+
+  std::set< std::uint64_t > Frames( const std::string& i_rText )
+  {
+    std::set< std::uint64_t > Numbers;
+    for( const std::string& rWord : Words( i_rText ) )
+      Numbers.insert( std::stoull( rWord ) );
+    return Numbers;
+  }
+
+  // 01:02:03:04 at 30 fps, frames at 60 Hz: every other frame is half a timecode frame on.
+  void SetHalfFrameTimecode( ZOL::ITimecode& o_rStart, ZOL::IVideoTiming& o_rTiming )
+  {
+    o_rStart.Standards = ZOL::TimecodeStandard_30;
+    o_rStart.Hours = 1;
+    o_rStart.Minutes = 2;
+    o_rStart.Seconds = 3;
+    o_rStart.Frames = 4;
+    o_rTiming.FramePeriodInTicks = o_rTiming.TicksPerSecond / 60;
+  }
+
   struct VPatternCase
   {
-    const char* Label;
+    const char* Name;
     const char* Pattern;
-    std::uint32_t IndexPad;
-    std::uint32_t NumberPad;
-    std::uint32_t FrameCount;
-    const char* DescriptorName;
-    const char* OpenName; // what the user opens
-    std::vector< std::string > Files;
+    std::uint32_t IndexPad, NumberPad, FrameCount;
+    const char* Descriptor;
+    const char* Opened; // what the user opens
     bool bOpens;
-    std::set< std::uint64_t > Stored;
+    const char* Files;
+    const char* Stored; // the frames on disk
     std::uint64_t SampleIndex;
     const char* SampleName;
-    // A 60 Hz sequence whose first frame has timecode 01:02:03:04 at 30 fps.
-    bool bTimecode = false;
   };
 
-  const VPatternCase s_Cases[] = {
-      { "FrameIndexPadded",
-        "take_%FRAME%.jpg",
-        4,
-        8,
-        5,
-        "take_.lumekimagesequence",
-        "take_%FRAME%.jpg",
-        { "take_0000.jpg", "take_0001.jpg", "take_0003.jpg", "take_0004.jpg", "take_0005.jpg", "take_003.jpg" },
-        true,
-        { 0, 1, 3, 4 },
-        3,
+  const VPatternCase s_Patterns[] = {
+      { "FrameIndexPadded", "take_%FRAME%.jpg", 4, 8, 5, "take_", "take_%FRAME%.jpg", true,
+        "take_0000.jpg take_0001.jpg take_0003.jpg take_0004.jpg take_0005.jpg take_003.jpg", "0 1 3 4", 3,
         "take_0003.jpg" },
-      { "FrameNumberThroughDescriptor",
-        "shot%FRAME_NUMBER%.png",
-        8,
-        3,
-        3,
-        "shot.lumekimagesequence",
-        "shot.lumekimagesequence",
-        { "shot001.png", "shot002.png", "shot003.png", "shot000.png" },
-        true,
-        { 0, 1, 2 },
-        2,
-        "shot003.png" },
-      { "UnderscoreDroppedSpelling",
-        "take_%FRAME%.jpg",
-        2,
-        2,
-        2,
-        "take.lumekimagesequence",
-        "take_%FRAME%.jpg",
-        { "take_00.jpg", "take_01.jpg" },
-        true,
-        { 0, 1 },
-        1,
-        "take_01.jpg" },
-      { "DotDroppedSpelling",
-        "take.%FRAME%.tif",
-        2,
-        2,
-        2,
-        "take.lumekimagesequence",
-        "take.%FRAME%.tif",
-        { "take.01.tif" },
-        true,
-        { 1 },
-        0,
+      { "FrameNumberThroughDescriptor", "shot%FRAME_NUMBER%.png", 8, 3, 3, "shot", "shot.lumekimagesequence", true,
+        "shot001.png shot002.png shot003.png shot000.png", "0 1 2", 2, "shot003.png" },
+      { "UnderscoreDroppedSpelling", "take_%FRAME%.jpg", 2, 2, 2, "take", "take_%FRAME%.jpg", true,
+        "take_00.jpg take_01.jpg", "0 1", 1, "take_01.jpg" },
+      { "DotDroppedSpelling", "take.%FRAME%.tif", 2, 2, 2, "take", "take.%FRAME%.tif", true, "take.01.tif", "1", 0,
         "take.00.tif" },
-      { "DashDroppedSpelling",
-        "take-%FRAME%.tiff",
-        1,
-        1,
-        3,
-        "take.lumekimagesequence",
-        "take-%FRAME%.tiff",
-        { "take-0.tiff", "take-2.tiff" },
-        true,
-        { 0, 2 },
-        2,
-        "take-2.tiff" },
-      { "PadNarrowerThanNumber",
-        "p%FRAME%.png",
-        3,
-        8,
-        1235,
-        "p.lumekimagesequence",
-        "p%FRAME%.png",
-        { "p000.png", "p999.png", "p1234.png", "p01234.png", "p1235.png" },
-        true,
-        { 0, 999, 1234 },
-        1234,
-        "p1234.png" },
-      { "UpperCaseExtensionRefused",
-        "IMG_%FRAME%.JPG",
-        8,
-        8,
-        1,
-        "IMG_.lumekimagesequence",
-        "IMG_%FRAME%.JPG",
-        { "IMG_00000000.JPG" },
-        false,
-        {},
-        0,
-        "" },
-      { "NoPlaceholderOneFileForAll",
-        "still.png",
-        8,
-        8,
-        3,
-        "still.lumekimagesequence",
-        "still.lumekimagesequence",
-        { "still.png" },
-        true,
-        { 0, 1, 2 },
-        2,
-        "still.png" },
-      { "BothIndexPlaceholders",
-        "a%FRAME%_b%FRAME_NUMBER%.jpeg",
-        2,
-        3,
-        6,
-        "a_b.lumekimagesequence",
-        "a%FRAME%_b%FRAME_NUMBER%.jpeg",
-        { "a04_b005.jpeg", "a04_b004.jpeg", "a00_b001.jpeg" },
-        true,
-        { 0, 4 },
-        4,
-        "a04_b005.jpeg" },
-      { "TimecodeOnlyThroughDescriptor",
-        "tc%TIMECODE%.jpg",
-        8,
-        8,
-        4,
-        "tc.lumekimagesequence",
-        "tc.lumekimagesequence",
-        { "tc0102030400.jpg", "tc0102030450.jpg", "tc0102030550.jpg", "tc0102030425.jpg" },
-        true,
-        { 0, 1, 3 },
-        1,
-        "tc0102030450.jpg",
-        true },
-      { "PathWithoutExtension",
-        "clip%FRAME%.png",
-        1,
-        1,
-        2,
-        "clip.lumekimagesequence",
-        "clip",
-        { "clip1.png" },
-        true,
-        { 1 },
-        1,
-        "clip1.png" },
-      { "LastFrameMissing",
-        "f%FRAME%.png",
-        1,
-        1,
-        10,
-        "f.lumekimagesequence",
-        "f%FRAME%.png",
-        { "f0.png", "f1.png", "f2.png", "f3.png", "f4.png", "f5.png", "f6.png", "f7.png", "f8.png" },
-        true,
-        { 0, 1, 2, 3, 4, 5, 6, 7, 8 },
-        9,
-        "f9.png" },
-      { "EmptyPatternRefused", "", 8, 8, 1, "x.lumekimagesequence", "x.lumekimagesequence", {}, false, {}, 0, "" },
-      { "NoDescriptorRefused",
-        "take_%FRAME%.jpg",
-        8,
-        8,
-        1,
-        "other.lumekimagesequence",
-        "take_%FRAME%.jpg",
-        { "take_00000000.jpg" },
-        false,
-        {},
-        0,
-        "" },
+      { "DashDroppedSpelling", "take-%FRAME%.tiff", 1, 1, 3, "take", "take-%FRAME%.tiff", true,
+        "take-0.tiff take-2.tiff", "0 2", 2, "take-2.tiff" },
+      { "PadNarrowerThanNumber", "p%FRAME%.png", 3, 8, 1235, "p", "p%FRAME%.png", true,
+        "p000.png p999.png p1234.png p01234.png p1235.png", "0 999 1234", 1234, "p1234.png" },
+      { "NoPlaceholderOneFileForAll", "still.png", 8, 8, 3, "still", "still.lumekimagesequence", true, "still.png",
+        "0 1 2", 2, "still.png" },
+      { "BothIndexPlaceholders", "a%FRAME%_b%FRAME_NUMBER%.jpeg", 2, 3, 6, "a_b", "a%FRAME%_b%FRAME_NUMBER%.jpeg", true,
+        "a04_b005.jpeg a04_b004.jpeg a00_b001.jpeg", "0 4", 4, "a04_b005.jpeg" },
+      // Frames at 60 Hz from 01:02:03:04 at 30 fps.
+      { "TimecodeOnlyThroughDescriptor", "tc%TIMECODE%.jpg", 8, 8, 4, "tc", "tc.lumekimagesequence", true,
+        "tc0102030400.jpg tc0102030450.jpg tc0102030550.jpg tc0102030425.jpg", "0 1 3", 1, "tc0102030450.jpg" },
+      { "PathWithoutExtension", "clip%FRAME%.png", 1, 1, 2, "clip", "clip", true, "clip1.png", "1", 1, "clip1.png" },
+      { "LastFrameMissing", "f%FRAME%.png", 1, 1, 10, "f", "f%FRAME%.png", true,
+        "f0.png f1.png f2.png f3.png f4.png f5.png f6.png f7.png f8.png", "0 1 2 3 4 5 6 7 8", 9, "f9.png" },
+      { "UpperCaseExtensionRefused", "IMG_%FRAME%.JPG", 8, 8, 1, "IMG_", "IMG_%FRAME%.JPG", false, "IMG_00000000.JPG",
+        "", 0, "" },
+      { "EmptyPatternRefused", "", 8, 8, 1, "x", "x.lumekimagesequence", false, "", "", 0, "" },
+      { "NoDescriptorRefused", "take_%FRAME%.jpg", 8, 8, 1, "other", "take_%FRAME%.jpg", false, "take_00000000.jpg", "",
+        0, "" },
   };
 
-  class SequencePattern : public testing::TestWithParam< VPatternCase >
+  TEST( SequencePattern, FindsAndReadsTheFramesThatExist )
   {
-  protected:
-    void SetUp() override
+    for( const VPatternCase& rCase : s_Patterns )
     {
-      const VPatternCase& rCase = GetParam();
+      SCOPED_TRACE( rCase.Name );
+      VTempFolder Folder;
       ImageSequenceIO::VDescriptor Descriptor =
           MakeDescriptor( rCase.Pattern, rCase.FrameCount, rCase.IndexPad, rCase.NumberPad );
-      if( rCase.bTimecode )
+      if( std::string( rCase.Pattern ).find( "%TIMECODE%" ) != std::string::npos )
+        SetHalfFrameTimecode( Descriptor.Timecode, Descriptor.Timing );
+      ASSERT_TRUE(
+          WriteDescriptor( Folder / ( std::string( rCase.Descriptor ) + ".lumekimagesequence" ), Descriptor ) );
+      for( const std::string& rFile : Words( rCase.Files ) )
+        WriteFile( Folder / rFile, rFile );
+      const bool bOpens = rCase.bOpens;
+      const std::string Opened = rCase.Opened;
+      // Names with a placeholder choose the sequence reader, whether or not they then open.
+      if( Opened.find( "%FRAME" ) != std::string::npos )
       {
-        Descriptor.Timing.FramePeriodInTicks = Descriptor.Timing.TicksPerSecond / 60;
-        Descriptor.Timecode.Standards = ZOL::TimecodeStandard_30;
-        Descriptor.Timecode.Hours = 1;
-        Descriptor.Timecode.Minutes = 2;
-        Descriptor.Timecode.Seconds = 3;
-        Descriptor.Timecode.Frames = 4;
+        const auto pReader = CreateVideoReader( Folder / Opened );
+        ASSERT_TRUE( dynamic_cast< VImageSequenceReader* >( pReader.get() ) );
+        EXPECT_EQ( bOpens, pReader->Open( Folder / Opened ) );
       }
-      ASSERT_TRUE( ImageSequenceIO::WriteDescriptor( m_Folder / rCase.DescriptorName, Descriptor ) );
-      for( const std::string& rFile : rCase.Files )
-        WriteFile( m_Folder / rFile, rFile );
-    }
-
-    VTempFolder m_Folder;
-  };
-
-  TEST_P( SequencePattern, FindsTheFramesThatExist )
-  {
-    const VPatternCase& rCase = GetParam();
-    ImageSequenceIO::VImageSequenceReader Reader;
-    ASSERT_EQ( rCase.bOpens, Reader.Open( m_Folder / rCase.OpenName ) );
-    if( !rCase.bOpens )
-      return;
-    EXPECT_EQ( rCase.FrameCount, Reader.GetFrameCount() );
-    EXPECT_EQ( m_Folder / rCase.SampleName, Reader.ExpandFileName( rCase.SampleIndex ) );
-
-    // The index answers and the disk answers agree, frame by frame.
-    std::set< std::uint64_t > ByDisk, ByIndex;
-    for( std::uint64_t i = 0; i < rCase.FrameCount; ++i )
-    {
-      if( Reader.HasFrame( i ) )
-        ByDisk.insert( i );
-      if( Reader.FindStoredFrameAtOrAfter( i ) == i )
-        ByIndex.insert( i );
-    }
-    EXPECT_EQ( rCase.Stored, ByDisk );
-    EXPECT_EQ( rCase.Stored, ByIndex );
-    EXPECT_EQ( rCase.Stored.size(), Reader.GetStoredFrameCount() );
-  }
-
-  TEST_P( SequencePattern, ReadsEachFrameFromItsOwnFile )
-  {
-    const VPatternCase& rCase = GetParam();
-    ImageSequenceIO::VImageSequenceReader Reader;
-    if( !Reader.Open( m_Folder / rCase.OpenName ) )
-      return;
-    const VQuietLog Quiet;
-    for( std::uint64_t i = 0; i < rCase.FrameCount; ++i )
-    {
-      std::shared_ptr< ZOL::IBuffer > pVideo;
-      ZOL::IAudioBuffers Audio;
-      VLogCapture Log( "ImageSequenceIO" );
-      const bool bRead = Reader.ReadFrameData( i, pVideo, Audio, true, true );
-      ASSERT_EQ( rCase.Stored.count( i ) != 0, bRead ) << i;
-      if( bRead )
+      VImageSequenceReader Reader;
+      ASSERT_EQ( bOpens, Reader.Open( Folder / Opened ) );
+      if( !bOpens )
+        continue;
+      EXPECT_EQ( rCase.FrameCount, Reader.GetFrameCount() );
+      EXPECT_EQ( Folder / rCase.SampleName, Reader.ExpandFileName( rCase.SampleIndex ) );
+      EXPECT_EQ( Frames( rCase.Stored ), StoredFrames( Reader, rCase.FrameCount ) );
+      for( std::uint64_t i = 0; i < rCase.FrameCount; ++i )
       {
-        ASSERT_TRUE( pVideo );
-        const std::string Expected = Reader.ExpandFileName( i ).substr( m_Folder.Path().size() + 1 );
-        EXPECT_EQ( Expected, std::string( pVideo->GetData(), pVideo->GetData() + pVideo->GetSize() ) );
-        EXPECT_TRUE( Audio.empty() );
-      }
-      else
-      {
-        ASSERT_EQ( 1u, Log.Records().size() );
-        EXPECT_EQ( "Could not determine file size for file " + Reader.ExpandFileName( i ) + ".",
-                   Log.Records()[0].Message );
-        EXPECT_EQ( 2, Log.Records()[0].Level );
+        std::shared_ptr< ZOL::IBuffer > pVideo;
+        ZOL::IAudioBuffers Audio;
+        VLogCapture Log( "ImageSequenceIO" );
+        const bool bRead = Reader.ReadFrameData( i, pVideo, Audio, true, true );
+        ASSERT_EQ( Frames( rCase.Stored ).count( i ) != 0, bRead ) << i;
+        if( bRead )
+        {
+          const std::string Expected = Reader.ExpandFileName( i ).substr( Folder.Path().size() + 1 );
+          EXPECT_EQ( Expected, std::string( pVideo->GetData(), pVideo->GetData() + pVideo->GetSize() ) );
+          EXPECT_TRUE( Audio.empty() );
+        }
+        else
+          EXPECT_EQ( Log.Lines(), std::vector< std::string >{ "2 Could not determine file size for file " +
+                                                              Reader.ExpandFileName( i ) + "." } );
       }
     }
   }
 
-  TEST_P( SequencePattern, FactoryChoosesTheSequenceReaderForPlaceholderNames )
-  {
-    const VPatternCase& rCase = GetParam();
-    const std::string Name = rCase.OpenName;
-    if( Name.find( "%FRAME" ) == std::string::npos )
-      return;
-    const auto pReader = CreateVideoReader( m_Folder / Name );
-    ASSERT_TRUE( dynamic_cast< ImageSequenceIO::VImageSequenceReader* >( pReader.get() ) );
-    EXPECT_EQ( rCase.bOpens, pReader->Open( m_Folder / Name ) );
-  }
-
-  INSTANTIATE_TEST_SUITE_P( Patterns, SequencePattern, testing::ValuesIn( s_Cases ),
-                            []( const testing::TestParamInfo< VPatternCase >& i_rInfo )
-                            { return i_rInfo.param.Label; } );
-
-  TEST( SequenceReadFrameData, AllOnesIndexIsRefusedWithItsLine )
+  TEST( SequencePattern, AllOnesIndexIsRefusedWithItsLine )
   {
     VTempFolder Folder;
-    ASSERT_TRUE(
-        ImageSequenceIO::WriteDescriptor( Folder / "a.lumekimagesequence", MakeDescriptor( "a%FRAME%.png", 1 ) ) );
-    ImageSequenceIO::VImageSequenceReader Reader;
+    ASSERT_TRUE( WriteDescriptor( Folder / "a.lumekimagesequence", MakeDescriptor( "a%FRAME%.png", 1 ) ) );
+    VImageSequenceReader Reader;
     ASSERT_TRUE( Reader.Open( Folder / "a.lumekimagesequence" ) );
     VLogCapture Log( "ImageSequenceIO" );
     std::shared_ptr< ZOL::IBuffer > pVideo;
     ZOL::IAudioBuffers Audio;
     EXPECT_FALSE( Reader.ReadFrameData( ~std::uint64_t( 0 ), pVideo, Audio, true, false ) );
-    ASSERT_EQ( 1u, Log.Records().size() );
-    EXPECT_EQ( "Frame index must be set.", Log.Records()[0].Message );
+    EXPECT_EQ( Log.Messages, std::vector< std::string >{ "Frame index must be set." } );
     // Nothing asked, nothing read, and no failure.
     EXPECT_TRUE( Reader.ReadFrameData( ~std::uint64_t( 0 ), pVideo, Audio, false, true ) );
   }
 
-  TEST( SequenceTimecodeNames, FiftyPercentIntoATimecodeFrame )
+  TEST( SequencePattern, TimecodeNamesAtHalfFrames )
   {
-    // 01:02:03:04 with a frame half a timecode frame long: frame 1 is "+50".
     ZOL::ITimecode Start;
-    Start.Standards = ZOL::TimecodeStandard_30;
-    Start.Hours = 1;
-    Start.Minutes = 2;
-    Start.Seconds = 3;
-    Start.Frames = 4;
     ZOL::IVideoTiming Timing;
-    Timing.FramePeriodInTicks = Timing.TicksPerSecond / 60;
+    SetHalfFrameTimecode( Start, Timing );
     const ImageSequenceIO::VFileNameExpander Expander( "%TIMECODE%", 8, 8, Start, Timing );
     EXPECT_EQ( "0102030400", Expander.TimecodeText( 0 ) );
     EXPECT_EQ( "0102030450", Expander.TimecodeText( 1 ) );
@@ -333,16 +175,14 @@ namespace
     EXPECT_EQ( "x0102030400.png", Still.Expand( 12345 ) );
   }
 
-  TEST( SequenceIndexQueries, LongGapIsAnsweredFromTheListing )
+  TEST( SequencePattern, LongGapIsAnsweredFromTheListing )
   {
     VTempFolder Folder;
-    constexpr std::uint32_t Count = 4000000000u;
-    ASSERT_TRUE( ImageSequenceIO::WriteDescriptor( Folder / "g.lumekimagesequence",
-                                                   MakeDescriptor( "g%FRAME%.png", Count, 1 ) ) );
+    ASSERT_TRUE( WriteDescriptor( Folder / "g.lumekimagesequence", MakeDescriptor( "g%FRAME%.png", 4000000000u, 1 ) ) );
     WriteFile( Folder / "g5.png", "g5.png" );
     WriteFile( Folder / "g3999999998.png", "g3999999998.png" );
     WriteFile( Folder / "g4000000000.png", "beyond the count" );
-    ImageSequenceIO::VImageSequenceReader Reader;
+    VImageSequenceReader Reader;
     ASSERT_TRUE( Reader.Open( Folder / "g.lumekimagesequence" ) );
     EXPECT_EQ( 2u, Reader.GetStoredFrameCount() );
     EXPECT_EQ( std::nullopt, Reader.FindStoredFrameAtOrBefore( 4 ) );
@@ -351,34 +191,162 @@ namespace
     EXPECT_EQ( std::nullopt, Reader.FindStoredFrameAtOrAfter( 3999999999u ) );
   }
 
-  struct VCandidateCase
+  TEST( SequencePattern, DescriptorCandidatesRuleNameFirstThenWithoutSeparator )
   {
-    const char* Label;
-    const char* Name;
-    std::vector< std::string > Expected;
-  };
-
-  class DescriptorCandidates : public testing::TestWithParam< VCandidateCase >
-  {
-  };
-
-  TEST_P( DescriptorCandidates, RuleNameFirstThenWithoutSeparator )
-  {
-    EXPECT_EQ( GetParam().Expected, ImageSequenceIO::DescriptorCandidates( "/d", GetParam().Name ) );
+    const std::pair< const char*, std::vector< std::string > > Cases[] = {
+        { "take_%FRAME%.jpg", { "/d/take_.lumekimagesequence", "/d/take.lumekimagesequence" } },
+        { "take.%FRAME_NUMBER%.png", { "/d/take..lumekimagesequence", "/d/take.lumekimagesequence" } },
+        { "take%TIMECODE%.tif", { "/d/take.lumekimagesequence" } },
+        { "a_%FRAME%-%TIMECODE%.jpg", { "/d/a_-.lumekimagesequence", "/d/a.lumekimagesequence" } },
+        { "take.lumekimagesequence", { "/d/take.lumekimagesequence" } },
+        { "take", { "/d/take.lumekimagesequence" } },
+    };
+    for( const auto& rCase : Cases )
+      EXPECT_EQ( rCase.second, ImageSequenceIO::DescriptorCandidates( "/d", rCase.first ) ) << rCase.first;
   }
 
-  INSTANTIATE_TEST_SUITE_P(
-      Names, DescriptorCandidates,
-      testing::Values(
-          VCandidateCase{
-              "Underscore", "take_%FRAME%.jpg", { "/d/take_.lumekimagesequence", "/d/take.lumekimagesequence" } },
-          VCandidateCase{
-              "Dot", "take.%FRAME_NUMBER%.png", { "/d/take..lumekimagesequence", "/d/take.lumekimagesequence" } },
-          VCandidateCase{ "NoSeparator", "take%TIMECODE%.tif", { "/d/take.lumekimagesequence" } },
-          VCandidateCase{ "TwoPlaceholders",
-                          "a_%FRAME%-%TIMECODE%.jpg",
-                          { "/d/a_-.lumekimagesequence", "/d/a.lumekimagesequence" } },
-          VCandidateCase{ "DescriptorItself", "take.lumekimagesequence", { "/d/take.lumekimagesequence" } },
-          VCandidateCase{ "NoExtension", "take", { "/d/take.lumekimagesequence" } } ),
-      []( const testing::TestParamInfo< VCandidateCase >& i_rInfo ) { return i_rInfo.param.Label; } );
+  // Opening one numbered image opens the run of files it belongs to.
+  TEST( NumberedRun, OpensTheWholeRun )
+  {
+    struct VCase
+    {
+      const char* Name;
+      const char* Files;
+      const char* Opened;
+      std::uint64_t FrameCount;
+      const char* FirstFile;
+      const char* Stored;
+      std::uint32_t PadWidth;
+    };
+    const VCase Cases[] = {
+        { "MiddleOfPaddedRunWithGap",
+          "take_000100.png take_000101.png take_000102.png take_000104.png take_000105.png take_00099.png "
+          "other_000050.png take_000106.jpg",
+          "take_000102.png", 6, "take_000100.png", "0 1 2 4 5", 6 },
+        { "UnpaddedRun", "n9.png n10.png n11.png n011.png", "n10.png", 3, "n9.png", "0 1 2", 1 },
+        { "NumberOutgrowsItsPad", "r998.png r999.png r1000.png r01000.png", "r999.png", 3, "r998.png", "0 1 2", 3 },
+        { "DigitsNearestTheEnd", "cam2_take7_0001.png cam2_take7_0003.png cam3_take7_0002.png", "cam2_take7_0003.png",
+          3, "cam2_take7_0001.png", "0 2", 4 },
+        { "StartsAtZero", "z0.png z1.png", "z1.png", 2, "z0.png", "0 1", 1 },
+        { "NoDigitsOneFrame", "still.png still2.png", "still.png", 1, "still.png", "0", 8 },
+    };
+    for( const VCase& rCase : Cases )
+    {
+      SCOPED_TRACE( rCase.Name );
+      VTempFolder Folder;
+      for( const std::string& rFile : Words( rCase.Files ) )
+        WriteFile( Folder / rFile, PngHeader() );
+      const auto pReader = CreateVideoReader( Folder / rCase.Opened );
+      auto* pSequence = dynamic_cast< VImageSequenceReader* >( pReader.get() );
+      ASSERT_TRUE( pSequence );
+      ASSERT_TRUE( pSequence->Open( Folder / rCase.Opened ) );
+      EXPECT_EQ( rCase.FrameCount, pSequence->GetFrameCount() );
+      EXPECT_EQ( Folder / rCase.FirstFile, pSequence->ExpandFileName( 0 ) );
+      EXPECT_EQ( rCase.PadWidth, pSequence->GetSequenceInfo().FrameIndexPadWidth );
+      EXPECT_EQ( ZOL::VideoPayload_ImagePNG, pSequence->GetVideoPayload() );
+      EXPECT_EQ( 40, pSequence->GetVideoFrameInfo().ImageWidth );
+      EXPECT_EQ( 30, pSequence->GetVideoFrameInfo().ImageHeight );
+      EXPECT_EQ( ZOL::PixelFormat_R8G8B8, pSequence->GetVideoFrameInfo().PixelFormat );
+      EXPECT_DOUBLE_EQ( 30.0, pSequence->GetVideoTiming().GetFrameRate() );
+      EXPECT_EQ( Frames( rCase.Stored ), StoredFrames( *pSequence, rCase.FrameCount ) );
+    }
+
+    // An image without a readable size, or none at all, opens nothing.
+    VTempFolder Folder;
+    WriteFile( Folder / "bad_01.png", std::string( "not a png" ) );
+    VImageSequenceReader Reader;
+    for( const std::string& rPath :
+         { Folder / "bad_01.png", Folder / "absent_01.png", std::string( "/no/such/x_01.png" ) } )
+      EXPECT_FALSE( Reader.Open( rPath ) ) << rPath;
+  }
+
+  TEST( NumberedRun, ADescriptorBesideTheRunIsUsedWhenItDescribesTheRun )
+  {
+    VTempFolder Folder;
+    for( const char* pFile : { "shot_0001.png", "shot_0002.png", "shot_0004.png" } )
+      WriteFile( Folder / pFile, PngHeader() );
+    ASSERT_TRUE(
+        WriteDescriptor( Folder / "shot.lumekimagesequence", MakeDescriptor( "shot_%FRAME_NUMBER%.png", 10, 8, 4 ) ) );
+    VImageSequenceReader Reader;
+    ASSERT_TRUE( Reader.Open( Folder / "shot_0002.png" ) );
+    EXPECT_EQ( Folder / "shot.lumekimagesequence", Reader.GetDescriptorPath() );
+    EXPECT_EQ( 10u, Reader.GetFrameCount() );
+    EXPECT_EQ( 48, Reader.GetVideoFrameInfo().ImageWidth );
+    EXPECT_DOUBLE_EQ( 25.0, Reader.GetVideoTiming().GetFrameRate() );
+    EXPECT_EQ( 3u, Reader.GetStoredFrameCount() );
+
+    // A descriptor of other files is not the run's.
+    ASSERT_TRUE( WriteDescriptor( Folder / "shot.lumekimagesequence", MakeDescriptor( "shot_%FRAME%.jpg", 10 ) ) );
+    ASSERT_TRUE( Reader.Open( Folder / "shot_0002.png" ) );
+    EXPECT_EQ( "", Reader.GetDescriptorPath() );
+    EXPECT_EQ( 4u, Reader.GetFrameCount() );
+    EXPECT_EQ( 40, Reader.GetVideoFrameInfo().ImageWidth );
+  }
+
+  TEST( NumberedRun, ImageExtensionsChooseTheSequenceReaderCaseAndAll )
+  {
+    for( const char* pName : { "a_1.jpg", "a_1.jpeg", "a_1.png", "a_1.tif", "a_1.tiff", "noDigits.png" } )
+      EXPECT_TRUE( dynamic_cast< VImageSequenceReader* >( CreateVideoReader( pName ).get() ) ) << pName;
+    for( const char* pName : { "a_1.JPG", "a_1.Png", "a_1.gif", "a_1.bmp" } )
+      EXPECT_FALSE( CreateVideoReader( pName ) ) << pName;
+    // Every image name the factory accepts has a payload.
+    for( const char* pExtension : { ".jpg", ".jpeg", ".png", ".tif", ".tiff" } )
+      EXPECT_NE( ZOL::VideoPayload_None, ImageSequenceIO::PayloadForExtension( pExtension ) ) << pExtension;
+  }
+
+  TEST( ImageHeader, ReadsTheStatedSizeAndSurvivesEveryCut )
+  {
+    struct VCase
+    {
+      const char* Name;
+      ZOL::EVideoPayload Payload;
+      VBytes Bytes;
+      std::int32_t Width, Height; // 0: no size
+    };
+    const VCase Cases[] = {
+        { "Png", ZOL::VideoPayload_ImagePNG, PngHeader(), 40, 30 },
+        // SOI, an APP0 of 4 bytes, fill bytes, then SOF2 (progressive) of 0x123 x 0x45.
+        { "JpegAfterApp0AndFill",
+          ZOL::VideoPayload_ImageJPEG,
+          { 0xFF, 0xD8, 0xFF, 0xE0, 0, 4, 1, 2, 0xFF, 0xFF, 0xC2, 0, 11, 8, 0, 0x45, 0x01, 0x23, 1, 1, 0x11, 0 },
+          0x123,
+          0x45 },
+        { "JpegScanBeforeFrameHeader",
+          ZOL::VideoPayload_ImageJPEG,
+          { 0xFF, 0xD8, 0xFF, 0xDA, 0, 2, 0xFF, 0xC0, 0, 11, 8, 0, 1, 0, 1, 1, 1, 0x11, 0 },
+          0,
+          0 },
+        // Little-endian: width as SHORT 640, length as LONG 480.
+        { "TiffLittleEndian",
+          ZOL::VideoPayload_ImageTIFF,
+          { 'I', 'I',  0x2A, 0, 8, 0,    0,    0, 2, 0, 0x00, 0x01, 3, 0,    1,    0, 0,
+            0,   0x80, 0x02, 0, 0, 0x01, 0x01, 4, 0, 1, 0,    0,    0, 0xE0, 0x01, 0, 0 },
+          640,
+          480 },
+        { "TiffBigEndian",
+          ZOL::VideoPayload_ImageTIFF,
+          { 'M', 'M',  0,    0x2A, 0, 0,    0,    8, 0, 2, 0x01, 0x00, 0, 3, 0, 0, 0,
+            1,   0x00, 0x07, 0,    0, 0x01, 0x01, 0, 4, 0, 0,    0,    1, 0, 0, 0, 0x05 },
+          7,
+          5 },
+        { "TiffDirectoryBeyondEnd", ZOL::VideoPayload_ImageTIFF, { 'I', 'I', 0x2A, 0, 0xFF, 0xFF, 0xFF, 0xFF }, 0, 0 },
+    };
+    for( const VCase& rCase : Cases )
+    {
+      SCOPED_TRACE( rCase.Name );
+      const auto Size = ImageSequenceIO::ReadImageSize( rCase.Payload, rCase.Bytes.data(), rCase.Bytes.size() );
+      ASSERT_EQ( rCase.Width != 0, Size.has_value() );
+      if( Size )
+      {
+        EXPECT_EQ( rCase.Width, Size->Width );
+        EXPECT_EQ( rCase.Height, Size->Height );
+      }
+      // Every cut of the header fails or reads nothing beyond its end.
+      for( std::size_t Cut = 0; Cut < rCase.Bytes.size(); ++Cut )
+      {
+        const VBytes Part( rCase.Bytes.begin(), rCase.Bytes.begin() + static_cast< std::ptrdiff_t >( Cut ) );
+        (void)ImageSequenceIO::ReadImageSize( rCase.Payload, Part.data(), Part.size() );
+      }
+    }
+  }
 } // namespace

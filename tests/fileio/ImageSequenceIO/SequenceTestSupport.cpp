@@ -40,9 +40,11 @@ namespace ImageSequenceTest
     return VBytes( std::istreambuf_iterator< char >( File ), std::istreambuf_iterator< char >() );
   }
 
-  void CopyFile( const std::string& i_rFrom, const std::string& i_rTo )
+  VBytes PngHeader()
   {
-    WriteFile( i_rTo, ReadFile( i_rFrom ) );
+    // Big-endian, as PNG stores its numbers: width 40, height 30, 8 bits, colour type 2.
+    return { 0x89, 'P', 'N', 'G', 0x0D, 0x0A, 0x1A, 0x0A, 0, 0, 0, 13, 'I', 'H', 'D', 'R', 0,
+             0,    0,   40,  0,   0,    0,    30,   8,    2, 0, 0, 0,  0,   0,   0,   0 };
   }
 
   ImageSequenceIO::VDescriptor MakeDescriptor( const std::string& i_rPattern, std::uint32_t i_FrameCount,
@@ -61,29 +63,17 @@ namespace ImageSequenceTest
     return Descriptor;
   }
 
-  VQuietLog::VQuietLog() : m_Level( ZOL::GlobalLog().GetStandardErrorLevel() )
+  std::set< std::uint64_t > StoredFrames( const ImageSequenceIO::VImageSequenceReader& i_rReader,
+                                          std::uint64_t i_Count )
   {
-    ZOL::GlobalLog().SetStandardErrorLevel( 1 );
-  }
-
-  VQuietLog::~VQuietLog()
-  {
-    ZOL::GlobalLog().SetStandardErrorLevel( m_Level );
-  }
-
-  VLogCapture::VLogCapture( std::string i_Category ) : m_Category( std::move( i_Category ) )
-  {
-    m_Handle = ZOL::GlobalLog().AddSink(
-        [this]( const ZOL::ILogRecord& i_rRecord )
-        {
-          if( i_rRecord.Category == m_Category )
-            m_Records.push_back( i_rRecord );
-        },
-        6 );
-  }
-
-  VLogCapture::~VLogCapture()
-  {
-    ZOL::GlobalLog().RemoveSink( m_Handle );
+    std::set< std::uint64_t > Stored;
+    for( std::uint64_t i = 0; i < i_Count; ++i )
+    {
+      EXPECT_EQ( i_rReader.HasFrame( i ), i_rReader.FindStoredFrameAtOrAfter( i ) == i ) << "frame " << i;
+      if( i_rReader.HasFrame( i ) )
+        Stored.insert( i );
+    }
+    EXPECT_EQ( Stored.size(), i_rReader.GetStoredFrameCount() );
+    return Stored;
   }
 } // namespace ImageSequenceTest

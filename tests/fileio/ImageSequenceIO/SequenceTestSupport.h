@@ -4,9 +4,10 @@
 // descriptors written by the project's own writer.
 
 #include "fileio/ImageSequenceIO/SequenceDescriptor.h"
-#include "services/ILogCategorised.h"
+#include "fileio/ImageSequenceIO/VImageSequenceReader.h"
 
 #include <cstdint>
+#include <set>
 #include <string>
 #include <vector>
 
@@ -33,38 +34,16 @@ namespace ImageSequenceTest
   void WriteFile( const std::string& i_rPath, const VBytes& i_rBytes );
   void WriteFile( const std::string& i_rPath, const std::string& i_rText );
   VBytes ReadFile( const std::string& i_rPath );
-  void CopyFile( const std::string& i_rFrom, const std::string& i_rTo );
+
+  // A PNG signature and IHDR of a 40 x 30 RGB image: all a reader takes from an image to open.
+  VBytes PngHeader();
 
   // A descriptor of a 48 x 32 sequence at 25 frames a second with this pattern and count.
   ImageSequenceIO::VDescriptor MakeDescriptor( const std::string& i_rPattern, std::uint32_t i_FrameCount,
                                                std::uint32_t i_IndexPad = 8, std::uint32_t i_NumberPad = 8 );
 
-  // Keeps the expected failure lines of a damage test off standard error while it lives.
-  class VQuietLog
-  {
-  public:
-    VQuietLog();
-    ~VQuietLog();
-    VQuietLog( const VQuietLog& ) = delete;
-    VQuietLog& operator=( const VQuietLog& ) = delete;
-
-  private:
-    int m_Level;
-  };
-
-  // Every message of one category while it lives.
-  class VLogCapture
-  {
-  public:
-    explicit VLogCapture( std::string i_Category );
-    ~VLogCapture();
-    VLogCapture( const VLogCapture& ) = delete;
-    VLogCapture& operator=( const VLogCapture& ) = delete;
-    const std::vector< ZOL::ILogRecord >& Records() const { return m_Records; }
-
-  private:
-    std::string m_Category;
-    int m_Handle;
-    std::vector< ZOL::ILogRecord > m_Records;
-  };
+  // The frames below i_Count that the reader says are on disk, asserting that its index says
+  // the same of each.
+  std::set< std::uint64_t > StoredFrames( const ImageSequenceIO::VImageSequenceReader& i_rReader,
+                                          std::uint64_t i_Count );
 } // namespace ImageSequenceTest
