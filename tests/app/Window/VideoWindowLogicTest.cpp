@@ -2,8 +2,6 @@
 
 #include "app/Window/VideoWindowLogic.h"
 
-#include "services/IApplicationVersion.h"
-#include "tests/support/TestNames.h"
 #include "videointerface/BufferAllocators.h"
 #include "videointerface/IBuffer.h"
 
@@ -14,16 +12,12 @@
 #include <gtest/gtest.h>
 
 #include <set>
+#include <tuple>
 
 using namespace LumekVideoViewer;
 
 namespace
 {
-  QString StorePath( const QTemporaryDir& i_rDir )
-  {
-    return i_rDir.filePath( "viewer.ini" );
-  }
-
   // A recording whose frames exist only at the given indices.
   VFrameReader GappyFile( std::set< std::uint64_t > i_Present, std::vector< std::uint64_t >* o_pReads = nullptr )
   {
@@ -40,20 +34,6 @@ namespace
   }
 } // namespace
 
-TEST( ViewerSettings, EmptyStoreGivesFirstStartDefaults )
-{
-  QTemporaryDir Dir;
-  QSettings Store( StorePath( Dir ), QSettings::IniFormat );
-  const VViewerSettings Settings = ReadViewerSettings( Store );
-  EXPECT_TRUE( Settings.Looping );
-  EXPECT_TRUE( Settings.SkipFrames );
-  EXPECT_FALSE( Settings.SoftwareDecoder );
-  EXPECT_TRUE( Settings.FullScreen );
-  EXPECT_TRUE( Settings.ControlsVisible );
-  EXPECT_TRUE( Settings.VideoInfoVisible );
-  EXPECT_TRUE( Settings.CorrectLensDistortion );
-}
-
 // Each value flipped alone must come back alone: a swapped key or a shared member shows here.
 TEST( ViewerSettings, EachValueSurvivesARestartOnItsOwn )
 {
@@ -64,26 +44,27 @@ TEST( ViewerSettings, EachValueSurvivesARestartOnItsOwn )
     VViewerSettings Written;
     Written.*rRow.pValue = !( Written.*rRow.pValue );
     {
-      QSettings Store( StorePath( Dir ), QSettings::IniFormat );
+      QSettings Store( Dir.filePath( "viewer.ini" ), QSettings::IniFormat );
       WriteViewerSettings( Store, Written );
     }
-    QSettings Store( StorePath( Dir ), QSettings::IniFormat );
+    QSettings Store( Dir.filePath( "viewer.ini" ), QSettings::IniFormat );
     const VViewerSettings Read = ReadViewerSettings( Store );
     for( const VSettingRow& rOther : ViewerSettingRows() )
       EXPECT_EQ( Read.*rOther.pValue, Written.*rOther.pValue ) << rOther.Key;
   }
 }
 
+// The store written by earlier releases: the keys in the group "General", any boolean text.
 TEST( ViewerSettings, KeysLiveInTheGeneralGroupAndReadAnyBooleanText )
 {
   QTemporaryDir Dir;
   {
-    QSettings Store( StorePath( Dir ), QSettings::IniFormat );
+    QSettings Store( Dir.filePath( "viewer.ini" ), QSettings::IniFormat );
     Store.setValue( "General/ControlsVisible", "false" );
     Store.setValue( "General/SoftwareDecoder", 1 );
     Store.setValue( "Looping", false ); // outside the group: not ours
   }
-  QSettings Store( StorePath( Dir ), QSettings::IniFormat );
+  QSettings Store( Dir.filePath( "viewer.ini" ), QSettings::IniFormat );
   const VViewerSettings Settings = ReadViewerSettings( Store );
   EXPECT_FALSE( Settings.ControlsVisible );
   EXPECT_TRUE( Settings.SoftwareDecoder );
@@ -95,49 +76,38 @@ TEST( ViewerSettings, KeysLiveInTheGeneralGroupAndReadAnyBooleanText )
   EXPECT_EQ( Store.childKeys().size(), 7 );
 }
 
-struct VChoiceCase
+// Frames 0, 1, 2 and 5 of 8 exist: a gap falls back to the nearest earlier frame, and warns only
+// while paused.
+TEST( FrameChoice, FallsBackToTheNearestEarlierFrame )
 {
-  const char* Name;
-  int Asked;
-  bool bPlaying;
-  int Shown;
-  bool bWarning;
-};
+  const struct
+  {
+    const char* Name;
+    int Asked;
+    bool bPlaying;
+    int Shown;
+    bool bWarning;
+  } Rows[] = { { "PresentPaused", 2, false, 2, false },   { "PresentPlaying", 5, true, 5, false },
+               { "GapPausedWarns", 4, false, 2, true },   { "GapPlayingIsQuiet", 3, true, 2, false },
+               { "AfterLastPresent", 7, false, 5, true }, { "PastTheEndWhilePlaying", 11, true, 5, false },
+               { "Negative", -1, false, -1, false } };
+  for( const auto& rRow : Rows )
+  {
+    SCOPED_TRACE( rRow.Name );
+    const VFrameChoice Choice = ChooseFrame( rRow.Asked, 8, rRow.bPlaying, GappyFile( { 0, 1, 2, 5 } ) );
+    EXPECT_EQ( Choice.ShownIndex, rRow.Shown );
+    EXPECT_EQ( Choice.bMissingWarning, rRow.bWarning );
+    EXPECT_EQ( IsEmptyFrame( Choice.Frame ), rRow.Shown < 0 );
+  }
 
-class FrameChoice : public testing::TestWithParam< VChoiceCase >
-{
-};
-
-// Frames 0, 1, 2 and 5 of 8 exist.
-TEST_P( FrameChoice, FallsBackToTheNearestEarlierFrame )
-{
-  const VChoiceCase& rCase = GetParam();
-  const VFrameChoice Choice = ChooseFrame( rCase.Asked, 8, rCase.bPlaying, GappyFile( { 0, 1, 2, 5 } ) );
-  EXPECT_EQ( Choice.ShownIndex, rCase.Shown );
-  EXPECT_EQ( Choice.bMissingWarning, rCase.bWarning );
-  EXPECT_EQ( IsEmptyFrame( Choice.Frame ), rCase.Shown < 0 );
-}
-
-INSTANTIATE_TEST_SUITE_P( GappyFile, FrameChoice,
-                          testing::Values( VChoiceCase{ "PresentPaused", 2, false, 2, false },
-                                           VChoiceCase{ "PresentPlaying", 5, true, 5, false },
-                                           VChoiceCase{ "GapPausedWarns", 4, false, 2, true },
-                                           VChoiceCase{ "GapPlayingIsQuiet", 3, true, 2, false },
-                                           VChoiceCase{ "AfterLastPresent", 7, false, 5, true },
-                                           VChoiceCase{ "PastTheEndWhilePlaying", 11, true, 5, false },
-                                           VChoiceCase{ "Negative", -1, false, -1, false } ),
-                          LumekTest::VCaseName() );
-
-TEST( FrameChoiceEdges, NothingBeforeAMissingFirstFrame )
-{
-  const VFrameChoice Choice = ChooseFrame( 3, 10, false, GappyFile( { 4, 5 } ) );
-  EXPECT_EQ( Choice.ShownIndex, -1 );
-  EXPECT_TRUE( Choice.bMissingWarning );
-  EXPECT_TRUE( IsEmptyFrame( Choice.Frame ) );
+  const VFrameChoice NothingBefore = ChooseFrame( 3, 10, false, GappyFile( { 4, 5 } ) );
+  EXPECT_EQ( NothingBefore.ShownIndex, -1 );
+  EXPECT_TRUE( NothingBefore.bMissingWarning );
+  EXPECT_TRUE( IsEmptyFrame( NothingBefore.Frame ) );
 }
 
 // The clock overshoots the end; a wild index must not walk billions of empty indices.
-TEST( FrameChoiceEdges, IndicesPastTheEndAreNotRead )
+TEST( FrameChoice, IndicesPastTheEndAreNotRead )
 {
   std::vector< std::uint64_t > Reads;
   const VFrameChoice Choice = ChooseFrame( 2000000000, 3, true, GappyFile( { 0, 1, 2 }, &Reads ) );
@@ -146,7 +116,7 @@ TEST( FrameChoiceEdges, IndicesPastTheEndAreNotRead )
 }
 
 // A damaged index may leave a gap of billions of numbers below the asked frame.
-TEST( FrameChoiceEdges, AGapIsCrossedInOneStep )
+TEST( FrameChoice, AGapIsCrossedInOneStep )
 {
   std::vector< std::uint64_t > Reads;
   const auto FindEarlier = []( std::uint64_t i_Index ) -> std::optional< std::uint64_t >
@@ -161,22 +131,13 @@ TEST( SurfaceGeometry, OffsetsNeedASensorToBeMeasuredOn )
 {
   ZOL::IVideoFrameInfo Info;
   Info.TwiceOffsetX = 20;
-  Info.TwiceOffsetY = 0;
   Info.ImageWidth = 64;
-  CoreLumekTypes::VCameraHardware NoSensor;
-  EXPECT_EQ( SurfaceGeometry( Info, NoSensor ).TwiceOffsetX, 0 );
-  EXPECT_EQ( SurfaceGeometry( Info, NoSensor ).ImageWidth, 64 );
-
+  EXPECT_EQ( SurfaceGeometry( Info, {} ).TwiceOffsetX, 0 );
+  EXPECT_EQ( SurfaceGeometry( Info, {} ).ImageWidth, 64 );
   CoreLumekTypes::VCameraHardware Camera;
   Camera.SensorWidthInPixels = 128;
   Camera.SensorHeightInPixels = 96;
   EXPECT_EQ( SurfaceGeometry( Info, Camera ).TwiceOffsetX, 20 );
-}
-
-TEST( WindowTexts, TitleNamesTheFileOnly )
-{
-  EXPECT_EQ( WindowTitle( "/tmp/some folder/take 3.lvid" ), "take 3.lvid - Lumek Video Viewer" );
-  EXPECT_EQ( WindowTitle( QString() ), "Lumek Video Viewer" );
 }
 
 TEST( Timebar, TickIntervalGuardsAnEmptyFile )
@@ -200,21 +161,14 @@ TEST( DisplaySettings, OnlyUncompressedBayerFrames )
   }
 }
 
-struct VAudioCase
-{
-  ZOL::EAudioSampleFormat Format;
-  int SampleSize;
-  QAudioFormat::SampleType Type;
-};
-
+// The sample layout follows the file; rate and channels too, and the rest stays the device's.
 TEST( AudioOutput, FormatFollowsTheFileAndKeepsTheDeviceForTheRest )
 {
   QAudioFormat Preferred;
   Preferred.setSampleType( QAudioFormat::Float );
   Preferred.setSampleRate( 44100 );
   Preferred.setByteOrder( QAudioFormat::BigEndian );
-
-  const VAudioCase Cases[] = {
+  const std::tuple< ZOL::EAudioSampleFormat, int, QAudioFormat::SampleType > Rows[] = {
       { ZOL::AudioSampleFormat_Int8, 8, QAudioFormat::SignedInt },
       { ZOL::AudioSampleFormat_UInt8, 8, QAudioFormat::UnSignedInt },
       { ZOL::AudioSampleFormat_Int16, 16, QAudioFormat::SignedInt },
@@ -224,18 +178,13 @@ TEST( AudioOutput, FormatFollowsTheFileAndKeepsTheDeviceForTheRest )
       { ZOL::AudioSampleFormat_Int32, 32, QAudioFormat::SignedInt },
       { ZOL::AudioSampleFormat_UInt32, 32, QAudioFormat::UnSignedInt },
       { ZOL::AudioSampleFormat_Float32, 32, QAudioFormat::Float },
-      { ZOL::AudioSampleFormat_Unspecified, 0, QAudioFormat::Float },
-  };
-  for( const VAudioCase& rCase : Cases )
+      { ZOL::AudioSampleFormat_Unspecified, 0, QAudioFormat::Float } };
+  for( const auto& [SampleFormat, Size, Type] : Rows )
   {
-    SCOPED_TRACE( ZOL::ToString( rCase.Format ) );
-    ZOL::IAudioFrameInfo Info;
-    Info.SampleFormat = rCase.Format;
-    Info.SampleRate = 48000;
-    Info.Channels = 2;
-    const QAudioFormat Format = AudioOutputFormat( Info, Preferred );
-    EXPECT_EQ( Format.sampleSize(), rCase.SampleSize );
-    EXPECT_EQ( Format.sampleType(), rCase.Type );
+    SCOPED_TRACE( ZOL::ToString( SampleFormat ) );
+    const QAudioFormat Format = AudioOutputFormat( { SampleFormat, 48000, 2 }, Preferred );
+    EXPECT_EQ( Format.sampleSize(), Size );
+    EXPECT_EQ( Format.sampleType(), Type );
     EXPECT_EQ( Format.sampleRate(), 48000 );
     EXPECT_EQ( Format.channelCount(), 2 );
     EXPECT_EQ( Format.byteOrder(), QAudioFormat::LittleEndian );
@@ -249,13 +198,11 @@ TEST( AudioOutput, OnlyTheFirstBlockOfAUsableFrameIsWritten )
   ZOL::IVideoFrame Frame;
   Frame.AudioFrameInfo = { ZOL::AudioSampleFormat_Int16, 48000, 2 };
   EXPECT_EQ( AudioBlockToWrite( Frame ), nullptr );
-
   std::shared_ptr< ZOL::IBuffer > pFirst, pSecond;
   pAllocator->Allocate( pFirst, 16 );
   pAllocator->Allocate( pSecond, 16 );
   Frame.Audio = { pFirst, pSecond };
   EXPECT_EQ( AudioBlockToWrite( Frame ), pFirst.get() );
-
   Frame.AudioFrameInfo.Channels = 0;
   EXPECT_EQ( AudioBlockToWrite( Frame ), nullptr );
   Frame.AudioFrameInfo = { ZOL::AudioSampleFormat_Unspecified, 48000, 2 };
