@@ -2,9 +2,7 @@
 // files beside the fuzzer, and this test holds them to the writer: a change of the binary form
 // shows here as a changed golden file. Run with LUMEK_UPDATE_SEEDS=1 to write them afresh.
 
-#include "tests/support/TestNames.h"
-#include "utils/MemoryStream.h"
-#include "videointerface/AttributeRecords.h"
+#include "tests/videointerface/AttributeTestSupport.h"
 
 #include <gtest/gtest.h>
 
@@ -19,32 +17,14 @@ namespace
   IVideoAttributes RecordingStore()
   {
     IVideoAttributes Store;
-    IVideoFrameInfo Frame;
-    Frame.ImageWidth = 1280;
-    Frame.ImageHeight = 1024;
-    Frame.PixelFormat = PixelFormat_BayerGB8;
+    IVideoFrameInfo Frame = LumekTest::Frame( 1280, 1024, PixelFormat_BayerGB8 );
     Frame.TwiceOffsetX = 3;
-    Frame.PixelAspectRatio = 1.0;
     WriteVideoFrameInfo( Store, Frame );
     WriteAudioFrameInfo( Store, "", { AudioSampleFormat_Int24, 48000, 2 } );
     WriteVideoTiming( Store, { 135000000, 1125000, 0 } );
     WriteVideoSettings( Store, "", { 1.0f, 2.2f } );
-    ITimecode Timecode;
-    Timecode.Standards = TimecodeStandard_29_97_DF;
-    Timecode.Hours = 10;
-    Timecode.Minutes = 1;
-    Timecode.Frames = 2;
-    Timecode.UserBits = 7;
-    Timecode.SubFramePeriod = 1126125;
-    WriteTimecode( Store, Timecode );
-    CoreLumekTypes::VCameraHardware Camera;
-    Camera.DeviceURN = "urn:lumek:cam:1";
-    Camera.SerialNumber = "1";
-    Camera.Type = "V5";
-    Camera.DisplayType = "Vantage 5";
-    Camera.SensorWidthInPixels = 2048;
-    Camera.SensorHeightInPixels = 2048;
-    WriteCameraHardware( Store, Camera );
+    WriteTimecode( Store, { TimecodeStandard_29_97_DF, 10, 1, 0, 2, 7, 0, 0, 1126125 } );
+    WriteCameraHardware( Store, { "urn:lumek:cam:1", "1", "V5", "Vantage 5", 2048, 2048, 1.0 } );
     return Store;
   }
 
@@ -55,15 +35,10 @@ namespace
     Record.Container = VideoContainer_MOV;
     Record.VideoPayload = VideoPayload_VideoH264;
     Record.PixelFormat = PixelFormat_PlanarY8U8V8;
-    Record.LensDistortionCalibration.RadialModel = RadialModel_Lumek3Parameter;
-    Record.LensDistortionCalibration.RadialDistortionParameters = { -0.1, 0.01, 0.0 };
+    Record.LensDistortionCalibration = LumekTest::Lens( RadialModel_Lumek3Parameter, { -0.1, 0.01, 0.0 } );
     WriteConversionRecords( Store, { Record, VConversionRecord() } );
-    CoreLumekTypes::VLensDistortionCalibration Lens;
-    Lens.RadialModel = RadialModel_Lumek2Parameter;
-    Lens.RadialDistortionParameters = { 0.2, -0.05 };
-    Lens.RadialDistortionCentre_X = 640;
-    Lens.RadialDistortionCentre_Y = 512;
-    WriteLensDistortionCalibration( Store, "", Lens );
+    WriteLensDistortionCalibration( Store, "",
+                                    LumekTest::Lens( RadialModel_Lumek2Parameter, { 0.2, -0.05 }, 640, 512 ) );
     return Store;
   }
 
@@ -84,48 +59,27 @@ namespace
     Store.Set( "str", std::string( "a\0b", 3 ) );
     return Store;
   }
-
-  struct VSeedCase
-  {
-    const char* Name;
-    IVideoAttributes ( *Make )();
-  };
-
-  std::vector< std::uint8_t > Serialise( const IVideoAttributes& i_rStore )
-  {
-    UtilsIO::VMemoryStream Stream;
-    EXPECT_TRUE( i_rStore.WriteTo( Stream ) );
-    return Stream.GetData();
-  }
 } // namespace
 
-class AttributeSeedTest : public testing::TestWithParam< VSeedCase >
+TEST( AttributeSeeds, EachSeedFileIsTheWritersOutput )
 {
-};
-
-TEST_P( AttributeSeedTest, SeedFileIsTheWritersOutput )
-{
-  const std::string Path = std::string( LUMEK_SOURCE_DIR ) + "/fuzz/seeds/attributes/" + GetParam().Name + ".bin";
-  const std::vector< std::uint8_t > Expected = Serialise( GetParam().Make() );
-  if( std::getenv( "LUMEK_UPDATE_SEEDS" ) != nullptr )
+  const std::pair< const char*, IVideoAttributes > Seeds[] = {
+      { "recording", RecordingStore() }, { "history", HistoryStore() }, { "everytype", EveryTypeStore() } };
+  for( const auto& [pName, Store] : Seeds )
   {
-    std::ofstream Out( Path, std::ios::binary );
-    Out.write( reinterpret_cast< const char* >( Expected.data() ), static_cast< std::streamsize >( Expected.size() ) );
+    const std::string Path = std::string( LUMEK_SOURCE_DIR ) + "/fuzz/seeds/attributes/" + pName + ".bin";
+    SCOPED_TRACE( Path );
+    const std::vector< std::uint8_t > Expected = LumekTest::Serialise( Store );
+    if( std::getenv( "LUMEK_UPDATE_SEEDS" ) != nullptr )
+      std::ofstream( Path, std::ios::binary ) << std::string( Expected.begin(), Expected.end() );
+    std::ifstream In( Path, std::ios::binary );
+    ASSERT_TRUE( In );
+    const std::vector< std::uint8_t > Stored( ( std::istreambuf_iterator< char >( In ) ),
+                                              std::istreambuf_iterator< char >() );
+    EXPECT_EQ( Expected, Stored );
+    UtilsIO::VMemoryInputStream Input( Stored.data(), Stored.size() );
+    IVideoAttributes Read;
+    ASSERT_TRUE( Read.ReadFrom( Input ) );
+    EXPECT_TRUE( Read == Store );
   }
-  std::ifstream In( Path, std::ios::binary );
-  ASSERT_TRUE( In ) << Path;
-  const std::vector< std::uint8_t > Stored( ( std::istreambuf_iterator< char >( In ) ),
-                                            std::istreambuf_iterator< char >() );
-  EXPECT_EQ( Expected, Stored );
-
-  UtilsIO::VMemoryInputStream Input( Stored.data(), Stored.size() );
-  IVideoAttributes Read;
-  ASSERT_TRUE( Read.ReadFrom( Input ) );
-  EXPECT_TRUE( Read == GetParam().Make() );
 }
-
-INSTANTIATE_TEST_SUITE_P( Seeds, AttributeSeedTest,
-                          testing::Values( VSeedCase{ "recording", &RecordingStore },
-                                           VSeedCase{ "history", &HistoryStore },
-                                           VSeedCase{ "everytype", &EveryTypeStore } ),
-                          LumekTest::VCaseName() );
