@@ -7,6 +7,7 @@
 #include "fileio/ImageSequenceIO/VImageSequenceReader.h"
 #include "fileio/LumekVideo/VReader.h"
 #include "tests/support/FfmpegFixtures.h"
+#include "tests/support/TestNames.h"
 #include "tools/LumekVideoTool/SampleScene.h"
 
 #include <gtest/gtest.h>
@@ -38,11 +39,6 @@ namespace
     double MaxFfmpegDifference;
   };
 
-  void PrintTo( const VSequenceCase& i_rCase, std::ostream* o_pStream )
-  {
-    *o_pStream << i_rCase.Name;
-  }
-
   const VSequenceCase s_Cases[] = {
       { "Png", "png", "take_00000000.png", ZOL::VideoPayload_ImagePNG, 0.0, 0.0 },
       { "Jpeg", "jpeg", "take_00000000.jpg", ZOL::VideoPayload_ImageJPEG, 8.0, 2.5 },
@@ -67,8 +63,8 @@ namespace
   {
     const std::string Path = i_rScratch.Path( "take.lumekimagesequence" );
     const VRun Make =
-        RunTool( { "make-sample", Path, "--width", std::to_string( Width ), "--height", std::to_string( Height ),
-                   "--frames", std::to_string( Frames ), "--fps", "50", "--frame-format", i_pFrameFormat } );
+        RunInProcess( { "make-sample", Path, "--width", std::to_string( Width ), "--height", std::to_string( Height ),
+                        "--frames", std::to_string( Frames ), "--fps", "50", "--frame-format", i_pFrameFormat } );
     EXPECT_EQ( Make.ExitCode, 0 ) << Make.Err;
     return Path;
   }
@@ -116,16 +112,14 @@ namespace
     }
   }
 
-  INSTANTIATE_TEST_SUITE_P( FrameFormats, SampleImageSequence, ::testing::ValuesIn( s_Cases ),
-                            []( const ::testing::TestParamInfo< VSequenceCase >& i_rInfo )
-                            { return std::string( i_rInfo.param.Name ); } );
+  INSTANTIATE_TEST_SUITE_P( FrameFormats, SampleImageSequence, ::testing::ValuesIn( s_Cases ), LumekTest::VCaseName() );
 
   TEST( SampleImageSequenceConvert, LvidKeepsPixelsGapsAndTimecode )
   {
     VScratch Scratch;
     const std::string Sequence = MakeSequence( Scratch, "png" );
     const std::string Output = Scratch.Path( "take.lvid" );
-    const VRun Convert = RunTool( { "convert", Sequence, Output } );
+    const VRun Convert = RunInProcess( { "convert", Sequence, Output } );
     ASSERT_EQ( Convert.ExitCode, 0 ) << Convert.Err;
 
     LumekVideo::VReader Reader;
@@ -148,44 +142,4 @@ namespace
     }
   }
 
-  struct VRefusedCase
-  {
-    const char* Name;
-    std::vector< std::string > Arguments;
-  };
-
-  void PrintTo( const VRefusedCase& i_rCase, std::ostream* o_pStream )
-  {
-    *o_pStream << i_rCase.Name;
-  }
-
-  class SampleRefusal : public ::testing::TestWithParam< VRefusedCase >
-  {
-  };
-
-  // Each is a usage error with the command's message, and nothing is written.
-  TEST_P( SampleRefusal, ExitsWithUsageAndWritesNothing )
-  {
-    VScratch Scratch;
-    std::vector< std::string > Arguments = {
-        "make-sample", Scratch.Path( GetParam().Arguments[0] ), "--frames", "2", "--width", "8", "--height", "8" };
-    Arguments.insert( Arguments.end(), GetParam().Arguments.begin() + 1, GetParam().Arguments.end() );
-    const VRun Run = RunTool( Arguments );
-    EXPECT_EQ( Run.ExitCode, 2 ) << Run.Err;
-    EXPECT_EQ( Run.Err.rfind( "lumekvideotool make-sample: ", 0 ), 0u ) << Run.Err;
-    EXPECT_TRUE( boost::filesystem::is_empty( boost::filesystem::path( Scratch.Path( "" ) ) ) );
-  }
-
-  const VRefusedCase s_Refused[] = {
-      { "NoWriterForAvi", { "take.avi" } },
-      { "ExtensionsCompareExactly", { "take.LVID" } },
-      { "NoExtension", { "take" } },
-      { "FrameFormatOnLvid", { "take.lvid", "--frame-format", "png" } },
-      { "UnknownFrameFormat", { "take.lumekimagesequence", "--frame-format", "gif" } },
-      { "BayerImageSequence", { "take.lumekimagesequence", "--format", "BayerGB8" } },
-  };
-
-  INSTANTIATE_TEST_SUITE_P( Names, SampleRefusal, ::testing::ValuesIn( s_Refused ),
-                            []( const ::testing::TestParamInfo< VRefusedCase >& i_rInfo )
-                            { return std::string( i_rInfo.param.Name ); } );
 } // namespace

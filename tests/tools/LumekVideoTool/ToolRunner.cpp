@@ -1,6 +1,9 @@
 #include "ToolRunner.h"
 
 #include "fileio/LumekVideo/VWriter.h"
+#include "tests/support/FfmpegFixtures.h"
+#include "tests/support/LogCapture.h"
+#include "tools/LumekVideoTool/ToolCommands.h"
 #include "videointerface/AttributeRecords.h"
 
 #include <boost/property_tree/json_parser.hpp>
@@ -16,47 +19,33 @@ namespace fs = boost::filesystem;
 
 namespace LumekVideoToolTest
 {
-  namespace
-  {
-    std::string ShellQuote( const std::string& i_rText )
-    {
-      std::string Quoted = "'";
-      for( char c : i_rText )
-        Quoted += c == '\'' ? std::string( "'\\''" ) : std::string( 1, c );
-      return Quoted + "'";
-    }
-
-    std::string ReadText( const fs::path& i_rPath )
-    {
-      std::ifstream File( i_rPath.string(), std::ios::binary );
-      std::stringstream Text;
-      Text << File.rdbuf();
-      return Text.str();
-    }
-  } // namespace
-
   VRun RunTool( const std::vector< std::string >& i_rArguments )
   {
-    const fs::path Out = fs::temp_directory_path() / fs::unique_path( "lvtool-out-%%%%%%%%" );
-    const fs::path Err = fs::temp_directory_path() / fs::unique_path( "lvtool-err-%%%%%%%%" );
-    std::string Command = ShellQuote( LUMEK_TOOL_PATH );
+    const VScratch Streams;
+    std::string Command = LumekTest::ShellQuote( LUMEK_TOOL_PATH );
     for( const std::string& rArgument : i_rArguments )
-      Command += " " + ShellQuote( rArgument );
-    Command += " >" + ShellQuote( Out.string() ) + " 2>" + ShellQuote( Err.string() ) + " </dev/null";
+      Command += " " + LumekTest::ShellQuote( rArgument );
+    Command += " >" + LumekTest::ShellQuote( Streams.Path( "out" ) ) + " 2>" +
+               LumekTest::ShellQuote( Streams.Path( "err" ) ) + " </dev/null";
     // The shell reports a child killed by a signal as 128 + the signal.
     const int Status = std::system( Command.c_str() );
     VRun Run;
-    if( WIFEXITED( Status ) )
-    {
-      Run.ExitCode = WEXITSTATUS( Status );
-      Run.bSignalled = Run.ExitCode > 128;
-    }
-    else
-      Run.bSignalled = true;
-    Run.Out = ReadText( Out );
-    Run.Err = ReadText( Err );
-    fs::remove( Out );
-    fs::remove( Err );
+    Run.ExitCode = WIFEXITED( Status ) ? WEXITSTATUS( Status ) : -1;
+    Run.bSignalled = !WIFEXITED( Status ) || Run.ExitCode > 128;
+    const VBytes Out = ReadFileBytes( Streams.Path( "out" ) ), Err = ReadFileBytes( Streams.Path( "err" ) );
+    Run.Out.assign( Out.begin(), Out.end() );
+    Run.Err.assign( Err.begin(), Err.end() );
+    return Run;
+  }
+
+  VRun RunInProcess( const std::vector< std::string >& i_rArguments )
+  {
+    const LumekTest::VLogCapture Quiet;
+    std::ostringstream Out, Err;
+    VRun Run;
+    Run.ExitCode = LumekVideoTool::RunTool( i_rArguments, Out, Err );
+    Run.Out = Out.str();
+    Run.Err = Err.str();
     return Run;
   }
 
@@ -84,6 +73,14 @@ namespace LumekVideoToolTest
   {
     boost::system::error_code Error;
     fs::remove_all( m_Folder, Error );
+  }
+
+  bool VScratch::HasPartial() const
+  {
+    for( const auto& rEntry : fs::directory_iterator( m_Folder ) )
+      if( rEntry.path().filename().string().find( ".partial" ) != std::string::npos )
+        return true;
+    return false;
   }
 
   LumekVideoTool::VRGBImage PictureFor( std::uint64_t i_Frame, int i_Width, int i_Height )
@@ -130,9 +127,7 @@ namespace LumekVideoToolTest
     {
       const auto Bytes =
           LumekVideoTool::EncodeFrame( PictureFor( Frame, i_rSpec.Width, i_rSpec.Height ), i_rSpec.Format );
-      std::vector< std::uint8_t > Tone;
-      if( i_rSpec.bAudio )
-        Tone.assign( 1920 * 4, static_cast< std::uint8_t >( Frame ) );
+      const VBytes Tone( i_rSpec.bAudio ? 1920 * 4 : 0, static_cast< std::uint8_t >( Frame ) );
       EXPECT_TRUE(
           Writer.AppendFrame( Frame, Bytes.data(), Bytes.size(), Tone.empty() ? nullptr : Tone.data(), Tone.size() ) );
     }
@@ -140,13 +135,13 @@ namespace LumekVideoToolTest
     return Path;
   }
 
-  std::vector< std::uint8_t > ReadFileBytes( const std::string& i_rPath )
+  VBytes ReadFileBytes( const std::string& i_rPath )
   {
     std::ifstream File( i_rPath, std::ios::binary );
-    return std::vector< std::uint8_t >( std::istreambuf_iterator< char >( File ), std::istreambuf_iterator< char >() );
+    return VBytes( std::istreambuf_iterator< char >( File ), std::istreambuf_iterator< char >() );
   }
 
-  void WriteFileBytes( const std::string& i_rPath, const std::vector< std::uint8_t >& i_rBytes )
+  void WriteFileBytes( const std::string& i_rPath, const VBytes& i_rBytes )
   {
     std::ofstream File( i_rPath, std::ios::binary );
     File.write( reinterpret_cast< const char* >( i_rBytes.data() ), static_cast< std::streamsize >( i_rBytes.size() ) );

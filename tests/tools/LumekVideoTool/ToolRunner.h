@@ -1,5 +1,8 @@
 #pragma once
 
+// Runs lumekvideotool, as a program the way scripts do or in this process where only the
+// command's answer matters, on recordings written here.
+
 #include "tools/LumekVideoTool/FrameEncoding.h"
 #include "videointerface/IVideoAttributes.h"
 #include "videointerface/IVideoFrameInfo.h"
@@ -12,6 +15,8 @@
 
 namespace LumekVideoToolTest
 {
+  using VBytes = std::vector< std::uint8_t >;
+
   struct VRun
   {
     int ExitCode = -1;
@@ -20,10 +25,12 @@ namespace LumekVideoToolTest
     std::string Err;
   };
 
-  // Runs the real lumekvideotool binary with the arguments.
+  // Runs the real lumekvideotool program with the arguments.
   VRun RunTool( const std::vector< std::string >& i_rArguments );
+  // Runs the command in this process, with the log kept off standard error.
+  VRun RunInProcess( const std::vector< std::string >& i_rArguments );
 
-  // Parses JSON text; fails the test on bad JSON.
+  // Parses JSON text with a parser other than the tool's; fails the test on bad JSON.
   boost::property_tree::ptree ParseJson( const std::string& i_rText );
 
   // A folder of its own for each test, removed at the end.
@@ -33,6 +40,8 @@ namespace LumekVideoToolTest
     VScratch();
     ~VScratch();
     std::string Path( const std::string& i_rName ) const { return ( m_Folder / i_rName ).string(); }
+    // Whether a conversion left a temporary file here.
+    bool HasPartial() const;
 
   private:
     boost::filesystem::path m_Folder;
@@ -49,10 +58,11 @@ namespace LumekVideoToolTest
     ZOL::IVideoSettings Settings;
   };
 
-  // A recording whose frame n is PictureFor( n ), written with the .lvid writer.
+  // A recording whose frame n is PictureFor( n ), written with the .lvid writer, with 25 fps
+  // timing, a timecode from 01:00:00:00 and a key of its own.
   std::string WriteRecording( const VScratch& i_rScratch, const std::string& i_rName, const VRecordingSpec& i_rSpec );
   LumekVideoTool::VRGBImage PictureFor( std::uint64_t i_Frame, int i_Width, int i_Height );
 
-  std::vector< std::uint8_t > ReadFileBytes( const std::string& i_rPath );
-  void WriteFileBytes( const std::string& i_rPath, const std::vector< std::uint8_t >& i_rBytes );
+  VBytes ReadFileBytes( const std::string& i_rPath );
+  void WriteFileBytes( const std::string& i_rPath, const VBytes& i_rBytes );
 } // namespace LumekVideoToolTest
