@@ -8,81 +8,51 @@
 #include <sstream>
 #include <vector>
 
-using LumekVideoViewer::VCommandLine;
-
 namespace
 {
-  const std::string DefaultServer = "https://versions.lumek.example/";
+  std::string ErrorText( const std::string& i_rReason )
+  {
+    return "Error parsing command line: " + i_rReason + "\nUse --help for more information.\n";
+  }
 
-  int Parse( std::vector< std::string > i_Arguments, VCommandLine& o_rCommandLine, std::string& o_rErrors )
+  // The exit code, then the server, the spoofed version and the file, or the error's two lines.
+  std::string Outcome( std::vector< std::string > i_Arguments )
   {
     i_Arguments.insert( i_Arguments.begin(), "lumekvideoviewer" );
     std::vector< const char* > Pointers;
     for( const std::string& rArgument : i_Arguments )
       Pointers.push_back( rArgument.c_str() );
+    LumekVideoViewer::VCommandLine Parsed;
     std::ostringstream Errors;
     const int Result = LumekVideoViewer::ParseCommandLine( static_cast< int >( Pointers.size() ), Pointers.data(),
-                                                           DefaultServer, o_rCommandLine, Errors );
-    o_rErrors = Errors.str();
-    return Result;
-  }
-
-  std::string ErrorText( const std::string& i_rReason )
-  {
-    return "Error parsing command line: " + i_rReason + "\nUse --help for more information.\n";
+                                                           "https://versions.lumek.example/", Parsed, Errors );
+    if( Result != 0 || !Errors.str().empty() )
+      return std::to_string( Result ) + " " + Errors.str();
+    return "0 " + Parsed.VersionServer + " | " + Parsed.SpoofVersion + " | " + Parsed.InputFile +
+           ( Parsed.bDeveloper ? " | developer" : "" );
   }
 } // namespace
 
-TEST( CommandLine, GoodCommandLines )
-{
-  struct VRow
-  {
-    std::vector< std::string > Arguments;
-    std::string Server, Spoof, Input;
-  };
-  const VRow Rows[] = {
-      { {}, DefaultServer, "", "" },
-      { { "--version-server", "http://127.0.0.1:9/", "--spoof-version=0.3.0.55914h", "clip.lvid" },
-        "http://127.0.0.1:9/",
-        "0.3.0.55914h",
-        "clip.lvid" },
-      { { "--input-file", "other.lvid" }, DefaultServer, "", "other.lvid" },
-      { { "--version-server=" }, "", "", "" },
-      // Accepted, but nothing can reach the developer mode.
-      { { "--developer", "clip.lvid" }, DefaultServer, "", "clip.lvid" },
-  };
-  for( const VRow& rRow : Rows )
-  {
-    SCOPED_TRACE( testing::PrintToString( rRow.Arguments ) );
-    VCommandLine CommandLine;
-    std::string Errors;
-    EXPECT_EQ( Parse( rRow.Arguments, CommandLine, Errors ), 0 );
-    EXPECT_EQ( Errors, "" );
-    EXPECT_EQ( CommandLine.VersionServer, rRow.Server );
-    EXPECT_EQ( CommandLine.SpoofVersion, rRow.Spoof );
-    EXPECT_EQ( CommandLine.InputFile, rRow.Input );
-    EXPECT_FALSE( CommandLine.bDeveloper );
-  }
-}
-
-TEST( CommandLine, ErrorsGiveTwoLinesAndExitCode255 )
+TEST( CommandLine, GoodAndBadCommandLines )
 {
   const std::pair< std::vector< std::string >, std::string > Rows[] = {
-      { { "--help" }, "unrecognised option '--help'" },
-      { { "--bogus" }, "unrecognised option '--bogus'" },
-      { { "a.lvid", "b.lvid" }, "option '--input-file' cannot be specified more than once" },
-      { { "--version-server" }, "the required argument for option '--version-server' is missing" },
+      { {}, "0 https://versions.lumek.example/ |  | " },
+      { { "--version-server", "http://127.0.0.1:9/", "--spoof-version=0.3.0.55914h", "clip.lvid" },
+        "0 http://127.0.0.1:9/ | 0.3.0.55914h | clip.lvid" },
+      { { "--input-file", "other.lvid" }, "0 https://versions.lumek.example/ |  | other.lvid" },
+      { { "--version-server=" }, "0  |  | " },
+      // Accepted, but nothing can reach the developer mode.
+      { { "--developer", "clip.lvid" }, "0 https://versions.lumek.example/ |  | clip.lvid" },
+      // There is no --help: asking for it is an error like any unknown option.
+      { { "--help" }, "255 " + ErrorText( "unrecognised option '--help'" ) },
+      { { "--bogus" }, "255 " + ErrorText( "unrecognised option '--bogus'" ) },
+      { { "a.lvid", "b.lvid" }, "255 " + ErrorText( "option '--input-file' cannot be specified more than once" ) },
+      { { "--version-server" },
+        "255 " + ErrorText( "the required argument for option '--version-server' is missing" ) },
       { { "--version-server=a", "--version-server=b" },
-        "option '--version-server' cannot be specified more than once" },
-  };
-  for( const auto& rRow : Rows )
-  {
-    SCOPED_TRACE( testing::PrintToString( rRow.first ) );
-    VCommandLine CommandLine;
-    std::string Errors;
-    EXPECT_EQ( Parse( rRow.first, CommandLine, Errors ), 255 );
-    EXPECT_EQ( Errors, ErrorText( rRow.second ) );
-  }
+        "255 " + ErrorText( "option '--version-server' cannot be specified more than once" ) } };
+  for( const auto& [Arguments, Expected] : Rows )
+    EXPECT_EQ( Outcome( Arguments ), Expected ) << testing::PrintToString( Arguments );
 }
 
 TEST( CommandLine, TheProgramItselfAnswersOnStandardError )
