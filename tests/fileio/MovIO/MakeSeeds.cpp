@@ -4,7 +4,6 @@
 #include "MovTestSupport.h"
 
 #include <fstream>
-#include <functional>
 #include <iostream>
 #include <string>
 
@@ -15,31 +14,21 @@ int main( int i_Count, char** i_ppArguments )
     std::cerr << "usage: mov_make_seeds FOLDER\n";
     return 1;
   }
-  const std::pair< const char*, std::function< void( MovTest::VMovSpec& ) > > Seeds[] = {
-      { "plain.mov", []( MovTest::VMovSpec& ) {} },
-      { "audio-timecode.mov",
-        []( MovTest::VMovSpec& s )
-        {
-          s.AudioRate = 8000;
-          s.TimecodeFrame = 1234;
-          s.SamplesPerChunk = 2;
-        } },
-      { "large-mdat-co64.mov",
-        []( MovTest::VMovSpec& s )
-        {
-          s.bLargeMdatFirst = true;
-          s.bCo64Only = true;
-          s.bTwoMdiaFirstEmpty = true;
-        } },
-  };
-  for( const auto& rSeed : Seeds )
+  MovTest::VMovSpec Plain;
+  Plain.Width = 8;
+  Plain.Height = 4;
+  Plain.Frames = 3;
+  MovTest::VMovSpec AudioTimecode = Plain;
+  AudioTimecode.AudioRate = 8000;
+  AudioTimecode.TimecodeFrame = 1234;
+  AudioTimecode.SamplesPerChunk = 2;
+  MovTest::VMovSpec LargeMdat = Plain;
+  LargeMdat.bLargeMdatFirst = LargeMdat.bCo64Only = LargeMdat.bTwoMdiaFirstEmpty = true;
+  for( const auto& rSeed :
+       { std::make_pair( "plain.mov", Plain ), std::make_pair( "audio-timecode.mov", AudioTimecode ),
+         std::make_pair( "large-mdat-co64.mov", LargeMdat ) } )
   {
-    MovTest::VMovSpec Spec;
-    Spec.Width = 8;
-    Spec.Height = 4;
-    Spec.Frames = 3;
-    rSeed.second( Spec );
-    const std::vector< std::uint8_t > Bytes = MovTest::WriteMov( Spec );
+    const std::vector< std::uint8_t > Bytes = MovTest::WriteMov( rSeed.second );
     std::ofstream Out( std::string( i_ppArguments[1] ) + "/" + rSeed.first, std::ios::binary );
     Out.write( reinterpret_cast< const char* >( Bytes.data() ), static_cast< std::streamsize >( Bytes.size() ) );
   }
