@@ -1,9 +1,9 @@
 #pragma once
 
-// What the still-image decoder tests share: a capture of one log category, frame allocators,
-// and files read whole.
+// What the still-image decoder tests share: frame allocators, files read whole, the committed
+// seeds, and the frame a container would declare.
 
-#include "services/Log.h"
+#include "tests/support/LogCapture.h"
 #include "videointerface/BufferAllocators.h"
 #include "videointerface/IVideoFrameInfo.h"
 
@@ -14,31 +14,24 @@
 
 namespace LumekTest
 {
-  // Log lines of one category, as "LEVEL MESSAGE", while it lives.
-  class VCategoryLog
+  using VBytes = std::vector< std::uint8_t >;
+
+  inline std::shared_ptr< ZOL::IBufferAllocator > MakeFrameAllocator()
   {
-  public:
-    explicit VCategoryLog( std::string i_Category );
-    ~VCategoryLog();
-    VCategoryLog( const VCategoryLog& ) = delete;
-    VCategoryLog& operator=( const VCategoryLog& ) = delete;
-    const std::vector< std::string >& Lines() const { return m_Lines; }
-    // True when some line holds i_rText.
-    bool Contains( const std::string& i_rText ) const;
+    return std::make_shared< ZOL::VFrameBufferAllocator >();
+  }
 
-  private:
-    std::string m_Category;
-    std::vector< std::string > m_Lines;
-    int m_Handle = 0;
-  };
-
-  std::shared_ptr< ZOL::IBufferAllocator > MakeFrameAllocator();
-
-  std::vector< std::uint8_t > ReadWholeFile( const std::string& i_rPath );
-  void WriteWholeFile( const std::string& i_rPath, const std::vector< std::uint8_t >& i_rBytes );
+  VBytes ReadWholeFile( const std::string& i_rPath );
+  void WriteWholeFile( const std::string& i_rPath, const VBytes& i_rBytes );
 
   // A file of the committed fuzz seeds, by its path below fuzz/seeds.
-  std::string SeedPath( const std::string& i_rName );
+  inline std::string SeedPath( const std::string& i_rName )
+  {
+    return std::string( LUMEK_SEED_DIR ) + "/" + i_rName;
+  }
+
+  // True when a line of the capture, as "LEVEL MESSAGE", holds i_rText.
+  bool Logged( const VLogCapture& i_rLog, const std::string& i_rText );
 
   ZOL::IVideoFrameInfo FrameInfo( std::int32_t i_Width, std::int32_t i_Height, ZOL::EPixelFormat i_Format );
 } // namespace LumekTest
