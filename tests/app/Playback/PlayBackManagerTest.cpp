@@ -13,28 +13,26 @@ using LumekVideoViewer::VPlayBackManager;
 
 namespace
 {
-  AppTest::VRecordingSpec Frames( std::uint64_t i_Count, std::uint32_t i_FramePeriodInTicks )
-  {
-    AppTest::VRecordingSpec Spec;
-    Spec.Width = Spec.Height = 2;
-    Spec.Frames = AppTest::FramesWithout( i_Count, {} );
-    Spec.FramePeriodInTicks = i_FramePeriodInTicks;
-    return Spec;
-  }
-
-  // A recording of i_Count frames at i_FramesPerSecond, and a manager whose clock the test moves,
-  // with every signal recorded.
+  // A recording of i_Count frames at i_FramesPerSecond (0: no rate), and a manager whose clock
+  // the test moves, with every signal recorded.
   struct VClock
   {
     VClock( std::uint64_t i_Count, double i_FramesPerSecond )
-        : Recording( Frames( i_Count, i_FramesPerSecond > 0 ? AppTest::TicksAt( i_FramesPerSecond ) : 0 ) ),
-          Manager( &Source, [this] { return Now; } )
+        : Recording( Spec( i_Count, i_FramesPerSecond ) ), Manager( &Source, [this] { return Now; } )
     {
       EXPECT_TRUE( Source.Open( Recording.Path ) );
       QObject::connect( &Manager, &VPlayBackManager::FrameUpdated,
                         [this]( int i_Frame ) { Shown.push_back( i_Frame ); } );
-      QObject::connect( &Manager, &VPlayBackManager::Stopped, [this] { ++Stopped; } );
+      QObject::connect( &Manager, &VPlayBackManager::Stopped, [this] { ++Stops; } );
       QObject::connect( &Manager, &VPlayBackManager::End, [this] { ++Ends; } );
+    }
+    static AppTest::VRecordingSpec Spec( std::uint64_t i_Count, double i_FramesPerSecond )
+    {
+      AppTest::VRecordingSpec Spec;
+      Spec.Width = Spec.Height = 2;
+      Spec.Frames = AppTest::FramesWithout( i_Count, {} );
+      Spec.FramePeriodInTicks = i_FramesPerSecond > 0 ? AppTest::TicksAt( i_FramesPerSecond ) : 0;
+      return Spec;
     }
 
     void TickAt( double i_Milliseconds )
@@ -48,9 +46,17 @@ namespace
     double Now = 0.0;
     VPlayBackManager Manager;
     std::vector< int > Shown;
-    int Stopped = 0;
+    int Stops = 0;
     int Ends = 0;
   };
+
+  std::vector< double > Steady( double i_First, double i_Last )
+  {
+    std::vector< double > Ticks;
+    for( double t = i_First; t <= i_Last; t += VPlayBackManager::TimerIntervalMilliseconds )
+      Ticks.push_back( t );
+    return Ticks;
+  }
 
   std::vector< int > Range( int i_First, int i_Last )
   {
@@ -61,63 +67,56 @@ namespace
   }
 } // namespace
 
-TEST( PlayBackManager, RoundsHalfAFrameAheadOfTheClock )
+// From Start, the clock ticks at the given times (while playing, as the timer would); the frames
+// announced, the ends and stops, and where it is left, worked out from the frame rate by hand.
+TEST( PlayBackManager, ScriptedClocks )
 {
-  VClock Clock( 10, 10 );
-  Clock.Manager.Start();
-  Clock.TickAt( 49.0 );
-  Clock.TickAt( 50.0 ); // exactly one half stays on the lower frame
-  EXPECT_TRUE( Clock.Shown.empty() );
-  Clock.TickAt( 50.5 );
-  Clock.TickAt( 100.0 ); // still frame 1: a tick that changes nothing emits nothing
-  EXPECT_EQ( Clock.Shown, std::vector< int >{ 1 } );
-}
-
-TEST( PlayBackManager, EveryFrameOnceAtSteadyTicksAndLoopingOffStops )
-{
-  VClock Clock( 50, 25 );
-  Clock.Manager.Loop( true ); // connected twice now, as at start-up
-  Clock.Manager.Loop( false );
-  Clock.Manager.Start();
-  for( double t = 5.0; t <= 2100.0 && Clock.Stopped == 0; t += 5.0 )
-    Clock.TickAt( t );
-  EXPECT_EQ( Clock.Shown, Range( 1, 50 ) ); // the clock reaches the frame count, which announces the end
-  EXPECT_EQ( Clock.Ends, 1 );
-  EXPECT_EQ( Clock.Stopped, 1 );
-  EXPECT_FALSE( Clock.Manager.IsPlaying() );
-  EXPECT_EQ( Clock.Manager.GetCurrentFrame(), 0u );
-}
-
-TEST( PlayBackManager, SingleFrameFileEndsAtTheNextTickAndLoops )
-{
-  VClock Clock( 1, 10 );
-  Clock.Manager.Start();
-  Clock.TickAt( 60.0 );
-  EXPECT_EQ( Clock.Ends, 0 );
-  Clock.TickAt( 65.0 );
-  EXPECT_EQ( Clock.Ends, 1 );
-  // Looping is the default: the end restarts at frame 0 without announcing it.
-  EXPECT_TRUE( Clock.Manager.IsPlaying() );
-  EXPECT_EQ( Clock.Manager.GetCurrentFrame(), 0u );
-  EXPECT_EQ( Clock.Shown, std::vector< int >{ 1 } );
-  EXPECT_EQ( Clock.Stopped, 0 );
-}
-
-// A frame that took 100 ms at 100 fps: dropping jumps to the clock, otherwise one frame a tick
-// until the position meets the clock (at 160 ms the clock says 16).
-TEST( PlayBackManager, AStallIsSkippedOnlyWhenDroppingFrames )
-{
-  VClock Dropping( 100, 100 );
-  Dropping.Manager.Start();
-  Dropping.TickAt( 100.0 );
-  EXPECT_EQ( Dropping.Shown, std::vector< int >{ 10 } );
-
-  VClock Every( 100, 100 );
-  Every.Manager.SetDropFrame( false );
-  Every.Manager.Start();
-  for( int i = 0; i <= 12; ++i )
-    Every.TickAt( 100.0 + i * 5.0 );
-  EXPECT_EQ( Every.Shown, Range( 1, 13 ) );
+  const struct
+  {
+    const char* Name;
+    std::uint64_t Frames;
+    double FramesPerSecond;
+    bool bDropFrames, bLoop;
+    std::vector< double > Ticks;
+    std::vector< int > Shown;
+    int Ends, Stops;
+    bool bPlaying;
+    std::uint64_t Current;
+  } Rows[] = {
+      // Exactly one half stays on the lower frame; a tick that changes nothing emits nothing.
+      { "HalfAFrameStaysBelow", 10, 10, true, true, { 49.0, 50.0 }, {}, 0, 0, true, 0 },
+      { "MoreThanHalfRoundsUp", 10, 10, true, true, { 50.5, 100.0 }, { 1 }, 0, 0, true, 1 },
+      // The clock reaches the frame count, which announces the end one tick later.
+      { "EveryFrameOnceThenStops", 50, 25, true, false, Steady( 5, 2100 ), Range( 1, 50 ), 1, 1, false, 0 },
+      { "SingleFrameEndsAtTheNextTick", 1, 10, true, true, { 60.0 }, { 1 }, 0, 0, true, 1 },
+      // Looping is the default: the end restarts at frame 0 without announcing it.
+      { "SingleFrameLoops", 1, 10, true, true, { 60.0, 65.0 }, { 1 }, 1, 0, true, 0 },
+      // A frame that took 100 ms at 100 fps: dropping jumps to the clock, otherwise one frame a
+      // tick until the position meets the clock (at 160 ms the clock says 16).
+      { "StallDropsFrames", 100, 100, true, true, { 100.0 }, { 10 }, 0, 0, true, 10 },
+      { "StallShowsEveryFrame", 100, 100, false, true, Steady( 100, 160 ), Range( 1, 13 ), 0, 0, true, 13 },
+      { "ZeroFrameRateStays", 10, 0, true, true, { 10000.0 }, {}, 0, 0, true, 0 },
+  };
+  for( const auto& rRow : Rows )
+  {
+    SCOPED_TRACE( rRow.Name );
+    VClock Clock( rRow.Frames, rRow.FramesPerSecond );
+    Clock.Manager.SetDropFrame( rRow.bDropFrames );
+    if( !rRow.bLoop )
+    {
+      Clock.Manager.Loop( true ); // connected twice now, as at start-up
+      Clock.Manager.Loop( false );
+    }
+    Clock.Manager.Start();
+    for( double t : rRow.Ticks )
+      if( Clock.Manager.IsPlaying() )
+        Clock.TickAt( t );
+    EXPECT_EQ( Clock.Shown, rRow.Shown );
+    EXPECT_EQ( Clock.Ends, rRow.Ends );
+    EXPECT_EQ( Clock.Stops, rRow.Stops );
+    EXPECT_EQ( Clock.Manager.IsPlaying(), rRow.bPlaying );
+    EXPECT_EQ( Clock.Manager.GetCurrentFrame(), rRow.Current );
+  }
 }
 
 TEST( PlayBackManager, PlayFrameMovesTheAnchorButNotTheTime )
@@ -155,21 +154,13 @@ TEST( PlayBackManager, StopAnnouncesOnceAndResetIsSilent )
   Clock.Manager.Start();
   Clock.TickAt( 500.0 );
   Clock.Manager.Stop();
-  EXPECT_EQ( Clock.Stopped, 1 );
+  EXPECT_EQ( Clock.Stops, 1 );
   EXPECT_EQ( FrameSeenByStopped, 5 ); // listeners see the old position
   EXPECT_EQ( Clock.Manager.GetCurrentFrame(), 0u );
   Clock.Manager.PlayFrame( 7 );
   Clock.Manager.Reset();
-  EXPECT_EQ( Clock.Stopped, 1 );
+  EXPECT_EQ( Clock.Stops, 1 );
   EXPECT_EQ( Clock.Manager.GetCurrentFrame(), 0u );
-}
-
-TEST( PlayBackManager, ZeroFrameRateStaysOnItsFrame )
-{
-  VClock Clock( 10, 0 );
-  Clock.Manager.Start();
-  Clock.TickAt( 10000.0 );
-  EXPECT_TRUE( Clock.Shown.empty() );
 }
 
 int main( int argc, char** argv )
