@@ -1,7 +1,6 @@
 #include "utils/UtilsIO/VLargeFile.h"
 
 #include "tests/utils/FileTestSupport.h"
-#include "videointerface/IVideoAttributes.h"
 
 #include <gtest/gtest.h>
 
@@ -107,31 +106,6 @@ TEST( LargeFile, CachedSizeIsTheSizeAtOpen )
   EXPECT_EQ( 3u, File.GetCachedSize() );
   EXPECT_TRUE( File.GetPosition( Value ) );
   EXPECT_EQ( 1u, Value ) << "GetSize leaves the position";
-}
-
-// The attribute store's bounded reader, on a real file: a key that claims 4 GB of a file that
-// holds 3 bytes more fails as a short read would, without allocating the claim.
-TEST( LargeFile, AttributeStoreThroughAFileAndALyingLength )
-{
-  const LumekTest::VTemporaryFolder Folder;
-  const std::string Path = Folder.File( "store.bin" );
-  ZOL::IVideoAttributes Store;
-  Store.Set( "VideoFrameInfo.PixelFormat", "BayerGB8" );
-  Store.Set( "TicksPerSecond", 135000000u );
-  {
-    VLargeFile File;
-    ASSERT_TRUE( File.Open( Path, UtilsIO::OpenMode_Create ) );
-    ASSERT_TRUE( Store.WriteTo( File ) );
-    ASSERT_TRUE( ZOL::WriteLE( File, 1u ) && ZOL::WriteLE( File, 0xFFFFFFF0u ) && File.Write( "abc", 3 ) );
-  }
-  VLargeFile File;
-  ASSERT_TRUE( File.Open( Path, UtilsIO::OpenMode_Read ) );
-  ZOL::IVideoAttributes Read;
-  ASSERT_TRUE( Read.ReadFrom( File ) );
-  EXPECT_TRUE( Read == Store );
-  EXPECT_FALSE( Read.ReadFrom( File ) );
-  EXPECT_FALSE( File.IsGood() );
-  EXPECT_TRUE( File.IsAtEnd() );
 }
 
 TEST( LargeFile, OpenTwiceKeepsTheFirstFileAndAClosedFileFailsEverything )

@@ -5,6 +5,7 @@
 #include <gtest/gtest.h>
 
 #include <limits>
+#include <tuple>
 
 using UtilsIO::VMemoryInputStream;
 using UtilsIO::VMemoryStream;
@@ -12,11 +13,9 @@ using UtilsIO::VMemoryStream;
 TEST( MemoryStream, LittleEndianValuesRoundTripAndHaveTheirByteLayout )
 {
   VMemoryStream Stream;
-  ASSERT_TRUE( ZOL::WriteLE( Stream, std::uint16_t( 0x0102 ) ) );
-  ASSERT_TRUE( ZOL::WriteLE( Stream, std::int32_t( -2 ) ) );
-  ASSERT_TRUE( ZOL::WriteLE( Stream, 1.0f ) );
-  ASSERT_TRUE( ZOL::WriteLE( Stream, -2.0 ) );
-  ASSERT_TRUE( ZOL::WriteLE( Stream, std::numeric_limits< std::uint64_t >::max() - 1 ) );
+  ASSERT_TRUE( ZOL::WriteLE( Stream, std::uint16_t( 0x0102 ) ) && ZOL::WriteLE( Stream, std::int32_t( -2 ) ) &&
+               ZOL::WriteLE( Stream, 1.0f ) && ZOL::WriteLE( Stream, -2.0 ) &&
+               ZOL::WriteLE( Stream, std::numeric_limits< std::uint64_t >::max() - 1 ) );
   const std::vector< std::uint8_t > Expected = { 0x02, 0x01, 0xFE, 0xFF, 0xFF, 0xFF, 0x00, 0x00, 0x80,
                                                  0x3F, 0x00, 0x00, 0x00, 0x00, 0x00, 0x00, 0x00, 0xC0,
                                                  0xFE, 0xFF, 0xFF, 0xFF, 0xFF, 0xFF, 0xFF, 0xFF };
@@ -30,11 +29,8 @@ TEST( MemoryStream, LittleEndianValuesRoundTripAndHaveTheirByteLayout )
   std::uint64_t E = 0;
   ASSERT_TRUE( ZOL::ReadLE( Input, A ) && ZOL::ReadLE( Input, B ) && ZOL::ReadLE( Input, C ) &&
                ZOL::ReadLE( Input, D ) && ZOL::ReadLE( Input, E ) );
-  EXPECT_EQ( 0x0102, A );
-  EXPECT_EQ( -2, B );
-  EXPECT_EQ( 1.0f, C );
-  EXPECT_EQ( -2.0, D );
-  EXPECT_EQ( std::numeric_limits< std::uint64_t >::max() - 1, E );
+  EXPECT_EQ( std::make_tuple( 0x0102, -2, 1.0f, -2.0, std::numeric_limits< std::uint64_t >::max() - 1 ),
+             std::make_tuple( A, B, C, D, E ) );
   EXPECT_FALSE( Input.IsAtEnd() );
   std::uint8_t Extra = 0;
   EXPECT_FALSE( ZOL::ReadLE( Input, Extra ) );
@@ -44,27 +40,22 @@ TEST( MemoryStream, LittleEndianValuesRoundTripAndHaveTheirByteLayout )
 TEST( MemoryStream, ReadAndWriteShareOnePosition )
 {
   VMemoryStream Stream;
-  ASSERT_TRUE( Stream.Write( "abcdef", 6 ) );
-  ASSERT_TRUE( Stream.Seek( 2 ) );
-  ASSERT_TRUE( Stream.Write( "XY", 2 ) );
-  char Two[2] = {};
-  ASSERT_TRUE( Stream.Read( Two, 2 ) );
-  EXPECT_EQ( "ef", std::string( Two, 2 ) );
-  ASSERT_TRUE( ZOL::Skip( Stream, -6 ) );
-  char All[6] = {};
-  ASSERT_TRUE( Stream.Read( All, 6 ) );
-  EXPECT_EQ( "abXYef", std::string( All, 6 ) );
+  ASSERT_TRUE( Stream.Write( "abcdef", 6 ) && Stream.Seek( 2 ) && Stream.Write( "XY", 2 ) );
+  char Text[6] = {};
+  ASSERT_TRUE( Stream.Read( Text, 2 ) );
+  EXPECT_EQ( "ef", std::string( Text, 2 ) );
+  ASSERT_TRUE( ZOL::Skip( Stream, -6 ) && Stream.Read( Text, 6 ) );
+  EXPECT_EQ( "abXYef", std::string( Text, 6 ) );
   EXPECT_FALSE( ZOL::Skip( Stream, -7 ) );
   // Writing past the end after a seek fills the gap with zeros.
-  ASSERT_TRUE( Stream.Seek( 8 ) );
-  ASSERT_TRUE( Stream.Write( "!", 1 ) );
+  ASSERT_TRUE( Stream.Seek( 8 ) && Stream.Write( "!", 1 ) );
   std::uint64_t Size = 0;
   ASSERT_TRUE( Stream.GetSize( Size ) );
   EXPECT_EQ( 9u, Size );
   EXPECT_EQ( 0, Stream.GetData()[6] );
 }
 
-TEST( MemoryStream, BlocksStopAtTheFirstFailure )
+TEST( MemoryStream, BlocksStopAtTheFirstFailureAndReadsBeyondTheEndFailWithoutOverrun )
 {
   const char Data[] = "0123456789";
   VMemoryInputStream Input( Data, 10 );
@@ -81,18 +72,12 @@ TEST( MemoryStream, BlocksStopAtTheFirstFailure )
   EXPECT_TRUE( Output.WriteAll( { { "ab", 2 }, { "", 0 } } ) );
   EXPECT_TRUE( Output.WriteBuffer( Buffer ) );
   EXPECT_EQ( ( std::vector< std::uint8_t >{ 'a', 'b', 'x', 0, 0 } ), Output.GetData() );
-}
 
-TEST( MemoryStream, ReadsBeyondTheEndFailWithoutOverrun )
-{
-  const std::uint8_t Data[4] = { 1, 2, 3, 4 };
-  VMemoryInputStream Input( Data, 4 );
-  ASSERT_TRUE( Input.Seek( 100 ) );
-  std::uint8_t Byte = 0;
-  EXPECT_FALSE( Input.Read( &Byte, 1 ) );
-  ASSERT_TRUE( Input.Seek( 3 ) );
-  std::uint8_t Huge[2];
-  EXPECT_FALSE( Input.Read( Huge, std::numeric_limits< std::uint64_t >::max() ) );
-  EXPECT_FALSE( Input.Seek( -1 ) );
-  EXPECT_TRUE( Input.Read( Huge, 0 ) );
+  VMemoryInputStream Short( Data, 4 );
+  ASSERT_TRUE( Short.Seek( 100 ) );
+  EXPECT_FALSE( Short.Read( C, 1 ) );
+  ASSERT_TRUE( Short.Seek( 3 ) );
+  EXPECT_FALSE( Short.Read( A, std::numeric_limits< std::uint64_t >::max() ) );
+  EXPECT_FALSE( Short.Seek( -1 ) );
+  EXPECT_TRUE( Short.Read( A, 0 ) );
 }

@@ -112,39 +112,19 @@ TEST( TimecodeStandards, AddTicksIsTheInverseOfSetFromTicks )
     ITimecode Zero = Label( Standard, 0, 0, 0, 0 );
     Zero.UserBits = 0xCAFEF00D;
     const std::int64_t Day = static_cast< std::int64_t >( Zero.GetTicksPerDay() );
-    std::uniform_int_distribution< std::int64_t > Ticks( -40 * Day, 40 * Day );
+    const std::int64_t Period = static_cast< std::int64_t >( Zero.GetTicksPerFrame() );
+    std::uniform_int_distribution< std::int64_t > Ticks( -40 * Day, 40 * Day ), Near( -3 * Period, 3 * Period );
     for( int i = 0; i < 20000; ++i )
     {
-      const std::int64_t T = Ticks( Random ), Step = Ticks( Random ) / 7;
+      // Half the steps within a few frames, where a carry goes wrong first.
+      const std::int64_t T = Ticks( Random ), Step = i % 2 == 0 ? Near( Random ) : Ticks( Random ) / 7;
       ITimecode Direct = Zero, Moved = Zero;
       ASSERT_TRUE( Direct.SetFromTicks( T + Step ) );
       ASSERT_TRUE( Moved.SetFromTicks( T ) );
       Moved.AddTicks( Step );
       ASSERT_EQ( Direct, Moved ) << T << " + " << Step;
+      ASSERT_EQ( 0xCAFEF00Du, Moved.UserBits );
     }
-  }
-}
-
-TEST( TimecodeStandards, OneFramePeriodStepsToTheNextLabel )
-{
-  for( std::uint32_t Standard = 0; Standard < 6; ++Standard )
-  {
-    SCOPED_TRACE( s_Standards[Standard] );
-    ITimecode Moved = Label( Standard, 23, 59, 59, FramesPerSecond( Standard ) - 1, 12 );
-    Moved.Days = 4;
-    Moved.UserBits = 0x01020304;
-    ITimecode Counted = Moved;
-    for( int i = 0; i < 5000; ++i )
-    {
-      Moved.AddTicks( static_cast< std::int64_t >( Moved.GetTicksPerFrame() ) );
-      Step( Counted );
-      ASSERT_EQ( Counted, Moved ) << i;
-    }
-    for( int i = 0; i < 5000; ++i )
-      Moved.AddTicks( -static_cast< std::int64_t >( Moved.GetTicksPerFrame() ) );
-    EXPECT_EQ( "23:59:59", Text( Moved ).substr( 0, 8 ) );
-    EXPECT_EQ( 4, Moved.Days );
-    EXPECT_EQ( 0x01020304u, Moved.UserBits );
   }
 }
 
