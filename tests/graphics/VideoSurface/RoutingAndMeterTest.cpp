@@ -10,7 +10,7 @@ namespace
 {
   using namespace VideoGraphics;
 
-  TEST( PixelFormatRouting, SwizzleIsTheBlueFirstAndUYVYFormats )
+  TEST( PixelFormatRouting, SwizzlesWidensAndPairs )
   {
     // The byte orders that differ from their program's natural one: 8, 10, 11 and 13.
     for( std::uint32_t Format = 1; Format <= 17; ++Format )
@@ -19,42 +19,37 @@ namespace
       ASSERT_NE( pRoute, nullptr ) << Format;
       EXPECT_EQ( pRoute->Swizzle, ( ( 0x2D00u >> Format ) & 1u ) != 0 ) << Format;
     }
-    EXPECT_EQ( FindPixelFormatRoute( 0 ), nullptr );
-    EXPECT_EQ( FindPixelFormatRoute( ZOL::PixelFormat_PlanarY8U8V8 ), nullptr );
-    EXPECT_EQ( FindPixelFormatRoute( ZOL::PixelFormat_PlanarR8G8B8 ), nullptr );
-    EXPECT_EQ( FindPixelFormatRoute( 1000 ), nullptr );
-  }
+    for( std::uint32_t Format :
+         { 0u, std::uint32_t( ZOL::PixelFormat_PlanarY8U8V8 ), std::uint32_t( ZOL::PixelFormat_PlanarR8G8B8 ), 1000u } )
+      EXPECT_EQ( FindPixelFormatRoute( Format ), nullptr ) << Format;
 
-  TEST( PixelFormatRouting, PackedFormatsWidenBeforeUploadAndYUVPairsPixels )
-  {
+    // Packed formats widen before the upload.
     EXPECT_EQ( FindPixelFormatRoute( ZOL::PixelFormat_BayerGB7 )->UploadFormat(), ZOL::PixelFormat_BayerGB8 );
     EXPECT_EQ( FindPixelFormatRoute( ZOL::PixelFormat_Luminance6 )->UploadFormat(), ZOL::PixelFormat_Luminance8 );
     EXPECT_EQ( FindPixelFormatRoute( ZOL::PixelFormat_U10Y10V10Y10 )->UploadFormat(), ZOL::PixelFormat_U8Y8V8Y8 );
-    // An odd width loses its last pixel to the halving.
+    // YUV pairs pixels, and an odd width loses its last pixel to the halving.
     EXPECT_EQ( TextureSize( *FindPixelFormatRoute( ZOL::PixelFormat_U8Y8V8Y8 ), 33, 7 ), QSize( 16, 7 ) );
     EXPECT_EQ( TextureSize( *FindPixelFormatRoute( ZOL::PixelFormat_BayerRG8 ), 33, 7 ), QSize( 33, 7 ) );
     EXPECT_STREQ( VideoProgramStage( FindPixelFormatRoute( ZOL::PixelFormat_Luminance7 )->Program ), "VideoLuminance" );
   }
-
-  struct VMeterStep
-  {
-    std::int64_t Time;
-    int FramesBefore;
-    double Expected;
-  };
 
   TEST( FrameRateMeter, AveragesOverTwoBucketsAndHoldsBetweenComputations )
   {
     std::int64_t Now = 0;
     LumekVideoViewer::VFrameRateMeter Meter( [&] { return Now; } );
     // 10 frames every 100 ms is 100 frames a second once both buckets are full.
-    const VMeterStep Steps[] = {
+    const struct
+    {
+      std::int64_t Time;
+      int FramesBefore;
+      double Expected;
+    } Steps[] = {
         { 1000, 100, 100.0 }, // bucket 0..1000 closes; (0 + 100) / 1000 ms
         { 1200, 20, 100.0 },  // less than 401 ms since the last computation: held
         { 1500, 30, 100.0 },  // 0..1500: (100 + 50) / 1.5 s
         { 2000, 20, 70.0 },   // 1000..2000: (50 + 20) / 1.0 s, the buckets having moved on at 1500
     };
-    for( const VMeterStep& rStep : Steps )
+    for( const auto& rStep : Steps )
     {
       for( int i = 0; i < rStep.FramesBefore; ++i )
         Meter.CountFrame();

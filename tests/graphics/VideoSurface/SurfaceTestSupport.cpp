@@ -2,7 +2,6 @@
 
 #include "graphics/CoreVideoUtils/PixelFormatConverter.h"
 
-#include <QApplication>
 #include <QTest>
 
 #include <algorithm>
@@ -11,22 +10,15 @@
 
 namespace SurfaceTest
 {
-  ZOL::IVideoFrameInfo FrameInfo( ZOL::EPixelFormat i_Format, int i_Width, int i_Height )
-  {
-    ZOL::IVideoFrameInfo Info;
-    Info.ImageWidth = i_Width;
-    Info.ImageHeight = i_Height;
-    Info.PixelFormat = i_Format;
-    Info.PixelAspectRatio = 1.0;
-    return Info;
-  }
-
   namespace
   {
     ZOL::IVideoFrame MakeFrame( ZOL::EPixelFormat i_Format, int i_Width, int i_Height )
     {
       ZOL::IVideoFrame Frame;
-      Frame.VideoFrameInfo = FrameInfo( i_Format, i_Width, i_Height );
+      Frame.VideoFrameInfo.ImageWidth = i_Width;
+      Frame.VideoFrameInfo.ImageHeight = i_Height;
+      Frame.VideoFrameInfo.PixelFormat = i_Format;
+      Frame.VideoFrameInfo.PixelAspectRatio = 1.0;
       auto pBuffer = std::make_shared< ZOL::IStandardBuffer >();
       pBuffer->Resize( ZOL::GetVideoFrameSizeInBytes64( Frame.VideoFrameInfo ) );
       Frame.Video = pBuffer;
@@ -37,36 +29,58 @@ namespace SurfaceTest
     {
       return int( std::lround( std::min( std::max( i_Value, 0.0 ), 255.0 ) ) );
     }
+
+    // The colours of the mosaic's 2 by 2 tile, row by row.
+    const char* BayerTile( ZOL::EPixelFormat i_Format )
+    {
+      switch( i_Format )
+      {
+      case ZOL::PixelFormat_BayerRG8:
+        return "RGGB";
+      case ZOL::PixelFormat_BayerGR8:
+        return "GRBG";
+      case ZOL::PixelFormat_BayerBG8:
+        return "BGGR";
+      default: // BayerGB8 and its packed forms
+        return "GBRG";
+      }
+    }
+
+    std::vector< std::uint8_t > Convert( const ZOL::IVideoFrame& i_rFrame, ZOL::EPixelFormat i_To, int i_Bytes )
+    {
+      const ZOL::IVideoFrameInfo& rInfo = i_rFrame.VideoFrameInfo;
+      std::vector< std::uint8_t > Result( std::size_t( rInfo.ImageWidth ) * rInfo.ImageHeight * i_Bytes );
+      EXPECT_TRUE( CoreVideoUtils::ConvertFrame( rInfo.ImageWidth, rInfo.ImageHeight, rInfo.PixelFormat,
+                                                 i_rFrame.Video->GetData(), i_rFrame.Video->GetSize(), i_To,
+                                                 Result.data(), Result.size() ) )
+          << "format " << rInfo.PixelFormat << " to " << i_To;
+      return Result;
+    }
   } // namespace
 
-  ZOL::IVideoFrame RandomFrame( ZOL::EPixelFormat i_Format, int i_Width, int i_Height, std::uint32_t i_Seed )
+  ZOL::IVideoFrame RandomFrame( ZOL::EPixelFormat i_Format, int i_Width, int i_Height, std::uint32_t i_Seed,
+                                int i_Fill )
   {
     ZOL::IVideoFrame Frame = MakeFrame( i_Format, i_Width, i_Height );
     std::mt19937 Random( i_Seed );
     std::uint8_t* p = Frame.Video->GetData();
     for( std::uint64_t i = 0; i < Frame.Video->GetSize(); ++i )
-      p[i] = std::uint8_t( Random() >> 24 );
+      p[i] = std::uint8_t( i_Fill >= 0 ? i_Fill : Random() >> 24 );
     return Frame;
   }
 
   ZOL::IVideoFrame SmoothBayerFrame( ZOL::EPixelFormat i_Format, int i_Width, int i_Height )
   {
     ZOL::IVideoFrame Frame = MakeFrame( i_Format, i_Width, i_Height );
-    // Which colour each site of the 2 by 2 tile holds, by format: 0 red, 1 green, 2 blue.
-    int Tile[4] = { 0, 1, 1, 2 };
-    if( i_Format == ZOL::PixelFormat_BayerGB8 )
-      Tile[0] = 1, Tile[1] = 2, Tile[2] = 0, Tile[3] = 1;
-    else if( i_Format == ZOL::PixelFormat_BayerGR8 )
-      Tile[0] = 1, Tile[1] = 0, Tile[2] = 2, Tile[3] = 1;
-    else if( i_Format == ZOL::PixelFormat_BayerBG8 )
-      Tile[0] = 2, Tile[1] = 1, Tile[2] = 1, Tile[3] = 0;
+    const char* pTile = BayerTile( i_Format );
     std::uint8_t* p = Frame.Video->GetData();
     for( int y = 0; y < i_Height; ++y )
       for( int x = 0; x < i_Width; ++x )
       {
         const double Channels[3] = { 128 + 60 * std::sin( x / 9.0 ) * std::cos( y / 11.0 ), 100 + x * 2.0 + y,
                                      150 - 50 * std::cos( ( x + y ) / 13.0 ) };
-        p[y * i_Width + x] = std::uint8_t( Clamp8( Channels[Tile[( y & 1 ) * 2 + ( x & 1 )]] ) );
+        const char Site = pTile[( y & 1 ) * 2 + ( x & 1 )];
+        p[y * i_Width + x] = std::uint8_t( Clamp8( Channels[Site == 'R' ? 0 : Site == 'G' ? 1 : 2] ) );
       }
     return Frame;
   }
@@ -75,103 +89,69 @@ namespace SurfaceTest
   {
     const ZOL::IVideoFrameInfo& rInfo = i_rFrame.VideoFrameInfo;
     VRGBImage Picture( rInfo.ImageWidth, rInfo.ImageHeight );
-    const bool bConverted = CoreVideoUtils::ConvertFrame(
-        rInfo.ImageWidth, rInfo.ImageHeight, rInfo.PixelFormat, i_rFrame.Video->GetData(), i_rFrame.Video->GetSize(),
-        ZOL::PixelFormat_R8G8B8, Picture.Bytes.data(), Picture.Bytes.size() );
-    EXPECT_TRUE( bConverted ) << "format " << rInfo.PixelFormat;
+    if( rInfo.PixelFormat != ZOL::PixelFormat_PlanarY8U8V8 )
+    {
+      Picture.Bytes = Convert( i_rFrame, ZOL::PixelFormat_R8G8B8, 3 );
+      return Picture;
+    }
+    const std::vector< std::uint8_t > RGBA = Convert( i_rFrame, ZOL::PixelFormat_R8G8B8u8, 4 );
+    for( std::size_t i = 0; i < Picture.Bytes.size() / 3; ++i )
+      std::copy( &RGBA[i * 4], &RGBA[i * 4] + 3, &Picture.Bytes[i * 3] );
     return Picture;
   }
 
-  VRGBImage MalvarPicture( const ZOL::IVideoFrameInfo& i_rInfo, const std::uint8_t* i_pMosaic, float i_Gamma,
-                           float i_Saturation )
+  VRGBImage MalvarPicture( const ZOL::IVideoFrame& i_rFrame, float i_Gamma, float i_Saturation )
   {
-    const int W = i_rInfo.ImageWidth;
-    const int H = i_rInfo.ImageHeight;
-    // The colour of the site at (0, 0) and whether red shares rows with it.
-    int RedX = 0, RedY = 0;
-    switch( i_rInfo.PixelFormat )
-    {
-    case ZOL::PixelFormat_BayerGB8:
-      RedX = 0, RedY = 1;
-      break;
-    case ZOL::PixelFormat_BayerGR8:
-      RedX = 1, RedY = 0;
-      break;
-    case ZOL::PixelFormat_BayerBG8:
-      RedX = 1, RedY = 1;
-      break;
-    default:
-      break;
-    }
-    auto P = [&]( int x, int y )
-    {
-      x = std::min( std::max( x, 0 ), W - 1 );
-      y = std::min( std::max( y, 0 ), H - 1 );
-      return i_pMosaic[y * W + x] / 255.0;
-    };
+    const int W = i_rFrame.VideoFrameInfo.ImageWidth;
+    const int H = i_rFrame.VideoFrameInfo.ImageHeight;
+    const ZOL::EPixelFormat Format = i_rFrame.VideoFrameInfo.PixelFormat;
+    const bool bPacked = Format == ZOL::PixelFormat_BayerGB7 || Format == ZOL::PixelFormat_BayerGB6;
+    const std::vector< std::uint8_t > Mosaic =
+        bPacked ? Convert( i_rFrame, ZOL::PixelFormat_BayerGB8, 1 )
+                : std::vector< std::uint8_t >( i_rFrame.Video->GetData(), i_rFrame.Video->GetData() + W * H );
+    // Where red sits in the tile.
+    const int Red = int( std::string( BayerTile( Format ) ).find( 'R' ) );
+    auto P = [&]( int x, int y ) { return Mosaic[std::clamp( y, 0, H - 1 ) * W + std::clamp( x, 0, W - 1 )] / 255.0; };
     VRGBImage Picture( W, H );
     for( int y = 0; y < H; ++y )
       for( int x = 0; x < W; ++x )
       {
         const double C = P( x, y );
-        const double Axial = P( x - 1, y ) + P( x + 1, y ) + P( x, y - 1 ) + P( x, y + 1 );
-        const double Far = P( x - 2, y ) + P( x + 2, y ) + P( x, y - 2 ) + P( x, y + 2 );
         const double Diagonal = P( x - 1, y - 1 ) + P( x + 1, y - 1 ) + P( x - 1, y + 1 ) + P( x + 1, y + 1 );
-        const double Horizontal = P( x - 1, y ) + P( x + 1, y );
-        const double Vertical = P( x, y - 1 ) + P( x, y + 1 );
-        const double FarHorizontal = P( x - 2, y ) + P( x + 2, y );
-        const double FarVertical = P( x, y - 2 ) + P( x, y + 2 );
+        const double Horizontal = P( x - 1, y ) + P( x + 1, y ), Vertical = P( x, y - 1 ) + P( x, y + 1 );
+        const double FarHorizontal = P( x - 2, y ) + P( x + 2, y ), FarVertical = P( x, y - 2 ) + P( x, y + 2 );
+        const double Far = FarHorizontal + FarVertical;
 
         // Green at a red or blue site; the other chroma at a chroma site; a chroma at a green site
         // from the neighbours in its row (or its column).
-        const double GreenAtChroma = ( 4 * C + 2 * Axial - Far ) / 8;
+        const double GreenAtChroma = ( 4 * C + 2 * ( Horizontal + Vertical ) - Far ) / 8;
         const double ChromaAtChroma = ( 6 * C + 2 * Diagonal - 1.5 * Far ) / 8;
         const double FromRow = ( 5 * C + 4 * Horizontal - FarHorizontal + 0.5 * FarVertical - Diagonal ) / 8;
         const double FromColumn = ( 5 * C + 4 * Vertical - FarVertical + 0.5 * FarHorizontal - Diagonal ) / 8;
 
-        const bool bRedRow = ( ( y + RedY ) & 1 ) == 0;
-        const bool bRedColumn = ( ( x + RedX ) & 1 ) == 0;
-        double R, G, B;
+        const bool bRedRow = ( ( y + ( Red >> 1 ) ) & 1 ) == 0;
+        const bool bRedColumn = ( ( x + ( Red & 1 ) ) & 1 ) == 0;
+        double Colour[3];
         if( bRedRow && bRedColumn )
-          R = C, G = GreenAtChroma, B = ChromaAtChroma;
+          Colour[0] = C, Colour[1] = GreenAtChroma, Colour[2] = ChromaAtChroma;
         else if( !bRedRow && !bRedColumn )
-          R = ChromaAtChroma, G = GreenAtChroma, B = C;
+          Colour[0] = ChromaAtChroma, Colour[1] = GreenAtChroma, Colour[2] = C;
         else if( bRedRow )
-          R = FromRow, G = C, B = FromColumn;
+          Colour[0] = FromRow, Colour[1] = C, Colour[2] = FromColumn;
         else
-          R = FromColumn, G = C, B = FromRow;
+          Colour[0] = FromColumn, Colour[1] = C, Colour[2] = FromRow;
 
-        double Colour[3] = { R, G, B };
+        double Grey = 0;
         for( double& rValue : Colour )
+        {
           rValue = std::copysign( std::pow( std::abs( rValue ), 1.0 / i_Gamma ), rValue );
-        const double Grey =
-            ( std::max( Colour[0], 0.0 ) + std::max( Colour[1], 0.0 ) + std::max( Colour[2], 0.0 ) ) / 3;
+          Grey += std::max( rValue, 0.0 ) / 3;
+        }
         const double Amount = std::min( 1.0 - i_Saturation, 1.0 );
-        std::uint8_t* pOut = Picture.At( x, y );
         for( int i = 0; i < 3; ++i )
-          pOut[i] = std::uint8_t( Clamp8( ( Colour[i] + ( Grey - Colour[i] ) * Amount ) * 255.0 ) );
+          Picture.At( x, y )[i] = std::uint8_t( Clamp8( ( Colour[i] + ( Grey - Colour[i] ) * Amount ) * 255.0 ) );
       }
     return Picture;
-  }
-
-  std::unique_ptr< LumekVideoViewer::VGLWidget > MakeWidget( int i_Width, int i_Height )
-  {
-    auto pWidget = std::make_unique< LumekVideoViewer::VGLWidget >();
-    pWidget->setFixedSize( i_Width, i_Height );
-    pWidget->show();
-    EXPECT_TRUE( QTest::qWaitForWindowExposed( pWidget.get() ) );
-    return pWidget;
-  }
-
-  QImage Grab( LumekVideoViewer::VGLWidget& io_rWidget )
-  {
-    return io_rWidget.grabFramebuffer().convertToFormat( QImage::Format_RGB32 );
-  }
-
-  int Difference( QRgb i_Colour, int i_R, int i_G, int i_B )
-  {
-    return std::max( { std::abs( qRed( i_Colour ) - i_R ), std::abs( qGreen( i_Colour ) - i_G ),
-                       std::abs( qBlue( i_Colour ) - i_B ) } );
   }
 
   void SavePictures( const QImage& i_rActual, const VRGBImage& i_rExpected, QPoint i_Origin )
@@ -195,28 +175,26 @@ namespace SurfaceTest
   ::testing::AssertionResult SamePicture( const QImage& i_rActual, const VRGBImage& i_rExpected, QPoint i_Origin,
                                           int i_Tolerance, int i_Inset )
   {
-    int Worst = 0;
-    int Differing = 0;
+    int Worst = 0, Differing = 0;
     QPoint WorstAt;
     for( int y = i_Inset; y < i_rExpected.Height - i_Inset; ++y )
       for( int x = i_Inset; x < i_rExpected.Width - i_Inset; ++x )
       {
-        const QPoint At = i_Origin + QPoint( x, y );
-        if( !i_rActual.rect().contains( At ) )
+        if( !i_rActual.rect().contains( i_Origin + QPoint( x, y ) ) )
           return ::testing::AssertionFailure() << "picture too small for " << x << ", " << y;
         const std::uint8_t* p = i_rExpected.At( x, y );
-        const int D = Difference( i_rActual.pixel( At ), p[0], p[1], p[2] );
-        if( D > i_Tolerance )
-          ++Differing;
+        const QRgb Got = i_rActual.pixel( i_Origin + QPoint( x, y ) );
+        const int D = std::max(
+            { std::abs( qRed( Got ) - p[0] ), std::abs( qGreen( Got ) - p[1] ), std::abs( qBlue( Got ) - p[2] ) } );
+        Differing += D > i_Tolerance ? 1 : 0;
         if( D > Worst )
           Worst = D, WorstAt = QPoint( x, y );
       }
     // LUMEK_SAVE_PICTURES=1 keeps the pictures of passing comparisons too, to look at.
-    if( Differing == 0 && qEnvironmentVariableIsSet( "LUMEK_SAVE_PICTURES" ) )
+    if( Differing != 0 || qEnvironmentVariableIsSet( "LUMEK_SAVE_PICTURES" ) )
       SavePictures( i_rActual, i_rExpected, i_Origin );
     if( Differing == 0 )
       return ::testing::AssertionSuccess() << "largest difference " << Worst;
-    SavePictures( i_rActual, i_rExpected, i_Origin );
     const std::uint8_t* p = i_rExpected.At( WorstAt.x(), WorstAt.y() );
     const QRgb Got = i_rActual.pixel( i_Origin + WorstAt );
     return ::testing::AssertionFailure() << Differing << " pixels differ by more than " << i_Tolerance << "; worst "
@@ -224,5 +202,35 @@ namespace SurfaceTest
                                          << "): got (" << qRed( Got ) << ", " << qGreen( Got ) << ", " << qBlue( Got )
                                          << "), expected (" << int( p[0] ) << ", " << int( p[1] ) << ", " << int( p[2] )
                                          << ")";
+  }
+
+  LumekVideoViewer::VGLWidget& SurfaceDisplayTest::MakeWidget( int i_Width, int i_Height )
+  {
+    m_pWidget = std::make_unique< LumekVideoViewer::VGLWidget >();
+    m_pWidget->setFixedSize( i_Width, i_Height );
+    m_pWidget->show();
+    EXPECT_TRUE( QTest::qWaitForWindowExposed( m_pWidget.get() ) );
+    return *m_pWidget;
+  }
+
+  LumekVideoViewer::VGLWidget& SurfaceDisplayTest::Show( const ZOL::IVideoFrame& i_rFrame,
+                                                         LumekVideoViewer::EDecoder i_Decoder, bool i_bNewWidget )
+  {
+    const ZOL::IVideoFrameInfo& rInfo = i_rFrame.VideoFrameInfo;
+    const QSize Size( rInfo.ImageWidth + 2 * Margin, rInfo.ImageHeight + 2 * Margin );
+    if( !i_bNewWidget && m_pWidget )
+      m_pWidget->setFixedSize( Size );
+    LumekVideoViewer::VGLWidget& rWidget =
+        !i_bNewWidget && m_pWidget ? *m_pWidget : MakeWidget( Size.width(), Size.height() );
+    rWidget.SetScaleMode( LumekVideoViewer::ScaleOneToOne );
+    if( i_Decoder != LumekVideoViewer::Hardware )
+      rWidget.SetDecoder( i_Decoder );
+    rWidget.PrepareFrame( 0, rInfo, i_rFrame, false );
+    return rWidget;
+  }
+
+  QImage SurfaceDisplayTest::Grab()
+  {
+    return m_pWidget->grabFramebuffer().convertToFormat( QImage::Format_RGB32 );
   }
 } // namespace SurfaceTest

@@ -3,6 +3,7 @@
 // Frames made by the test, a widget to show them in, and pictures to compare.
 
 #include "graphics/VideoSurface/VGLWidget.h"
+#include "tests/graphics/CoreGraphics/DisplayTestMain.h"
 #include "videointerface/IVideoFrameInfo.h"
 
 #include <gtest/gtest.h>
@@ -10,9 +11,7 @@
 #include <QImage>
 
 #include <cstdint>
-#include <functional>
 #include <memory>
-#include <string>
 #include <vector>
 
 namespace SurfaceTest
@@ -33,23 +32,39 @@ namespace SurfaceTest
     const std::uint8_t* At( int i_X, int i_Y ) const { return &Bytes[( std::size_t( i_Y ) * Width + i_X ) * 3]; }
   };
 
-  ZOL::IVideoFrameInfo FrameInfo( ZOL::EPixelFormat i_Format, int i_Width, int i_Height );
-  // A frame of random bytes, or of bytes from a function of the byte index.
-  ZOL::IVideoFrame RandomFrame( ZOL::EPixelFormat i_Format, int i_Width, int i_Height, std::uint32_t i_Seed = 1 );
+  inline CoreLumekTypes::VCameraHardware Camera( int i_Width, int i_Height )
+  {
+    CoreLumekTypes::VCameraHardware Hardware;
+    Hardware.DeviceURN = "urn:test:camera";
+    Hardware.SensorWidthInPixels = std::uint32_t( i_Width );
+    Hardware.SensorHeightInPixels = std::uint32_t( i_Height );
+    return Hardware;
+  }
+
+  inline CoreLumekTypes::VLensDistortionCalibration Lens( std::vector< double > i_K, double i_X, double i_Y,
+                                                          ZOL::ERadialModel i_Model = ZOL::RadialModel_Lumek2Parameter )
+  {
+    CoreLumekTypes::VLensDistortionCalibration Calibration;
+    Calibration.RadialModel = i_Model;
+    Calibration.RadialDistortionParameters = std::move( i_K );
+    Calibration.RadialDistortionCentre_X = i_X;
+    Calibration.RadialDistortionCentre_Y = i_Y;
+    return Calibration;
+  }
+
+  // A frame of random bytes; i_Fill, when not negative, sets every byte to it instead.
+  ZOL::IVideoFrame RandomFrame( ZOL::EPixelFormat i_Format, int i_Width, int i_Height, std::uint32_t i_Seed = 1,
+                                int i_Fill = -1 );
   // A Bayer mosaic of a smooth colour picture, so that different demosaics agree closely.
   ZOL::IVideoFrame SmoothBayerFrame( ZOL::EPixelFormat i_Format, int i_Width, int i_Height );
 
-  // The processor's picture of a frame (the converter to R8G8B8).
+  // The processor's picture of a frame (the converter to R8G8B8, or to R8G8B8u8 for planar YUV,
+  // which converts to the four-byte formats only).
   VRGBImage ProcessorPicture( const ZOL::IVideoFrame& i_rFrame );
-  // The 5 by 5 demosaic of Malvar, He and Cutler on an 8-bit mosaic, edges clamped, followed by
-  // gamma and saturation as the display applies them; computed here in double precision.
-  VRGBImage MalvarPicture( const ZOL::IVideoFrameInfo& i_rInfo, const std::uint8_t* i_pMosaic, float i_Gamma = 1.0f,
-                           float i_Saturation = 1.0f );
-
-  // A shown widget of a fixed size; nullptr-free or the test fails.
-  std::unique_ptr< LumekVideoViewer::VGLWidget > MakeWidget( int i_Width, int i_Height );
-  // Paints the widget and reads its picture back, RGB only.
-  QImage Grab( LumekVideoViewer::VGLWidget& io_rWidget );
+  // The 5 by 5 demosaic of Malvar, He and Cutler on a mosaic (widened to 8 bits first if packed),
+  // edges clamped, followed by gamma and saturation as the display applies them; computed here in
+  // double precision.
+  VRGBImage MalvarPicture( const ZOL::IVideoFrame& i_rFrame, float i_Gamma = 1.0f, float i_Saturation = 1.0f );
 
   // Compares the part of the picture at i_Origin with the expected one, leaving i_Inset pixels
   // of the expected picture's border out. On a difference both pictures are saved as PNG files
@@ -58,5 +73,29 @@ namespace SurfaceTest
                                           int i_Tolerance, int i_Inset = 1 );
   void SavePictures( const QImage& i_rActual, const VRGBImage& i_rExpected, QPoint i_Origin );
 
-  int Difference( QRgb i_Colour, int i_R, int i_G, int i_B );
+  // The display tests: a shown widget of a fixed size, skipped when there is no display.
+  class SurfaceDisplayTest : public ::testing::Test
+  {
+  protected:
+    // Room around a picture shown at 1:1, so that its border is seen.
+    static constexpr int Margin = 4;
+
+    void SetUp() override { LUMEK_REQUIRE_DISPLAY(); }
+
+    LumekVideoViewer::VGLWidget& MakeWidget( int i_Width, int i_Height );
+    // A widget Margin larger than the frame on each side, showing it at 1:1; a new one, or the
+    // last one resized, as the viewer's widget is given frames of one format after another.
+    LumekVideoViewer::VGLWidget& Show( const ZOL::IVideoFrame& i_rFrame,
+                                       LumekVideoViewer::EDecoder i_Decoder = LumekVideoViewer::Hardware,
+                                       bool i_bNewWidget = true );
+    // Paints the widget and reads its picture back, RGB only.
+    QImage Grab();
+    // The widget's picture at 1:1 against the expected one.
+    ::testing::AssertionResult Shows( const VRGBImage& i_rExpected, int i_Tolerance, int i_Inset = 1 )
+    {
+      return SamePicture( Grab(), i_rExpected, QPoint( Margin, Margin ), i_Tolerance, i_Inset );
+    }
+
+    std::unique_ptr< LumekVideoViewer::VGLWidget > m_pWidget;
+  };
 } // namespace SurfaceTest

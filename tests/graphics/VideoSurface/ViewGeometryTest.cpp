@@ -1,12 +1,13 @@
 #include "graphics/VideoSurface/VViewGeometry.h"
+#include "tests/graphics/VideoSurface/SurfaceTestSupport.h"
 
 #include <gtest/gtest.h>
-
-#include <cmath>
 
 namespace
 {
   using namespace LumekVideoViewer;
+  using SurfaceTest::Camera;
+  using SurfaceTest::Lens;
 
   ZOL::IVideoFrameInfo Geometry( int i_Width, int i_Height, int i_TwiceOffsetX = 0, int i_TwiceOffsetY = 0,
                                  int i_SensorX = 1, int i_SensorY = 1 )
@@ -22,116 +23,84 @@ namespace
     return Info;
   }
 
-  CoreLumekTypes::VCameraHardware Camera( std::uint32_t i_Width, std::uint32_t i_Height )
-  {
-    CoreLumekTypes::VCameraHardware Hardware;
-    Hardware.DeviceURN = "urn:camera:1";
-    Hardware.SensorWidthInPixels = i_Width;
-    Hardware.SensorHeightInPixels = i_Height;
-    return Hardware;
-  }
-
-  CoreLumekTypes::VLensDistortionCalibration Calibration( ZOL::ERadialModel i_Model, std::vector< double > i_K,
-                                                          double i_X, double i_Y )
-  {
-    CoreLumekTypes::VLensDistortionCalibration Lens;
-    Lens.RadialModel = i_Model;
-    Lens.RadialDistortionParameters = std::move( i_K );
-    Lens.RadialDistortionCentre_X = i_X;
-    Lens.RadialDistortionCentre_Y = i_Y;
-    return Lens;
-  }
-
   // Where the image lies on the sensor: the texture coordinates must run from 0 to 1 exactly
   // over the image rectangle, whatever the offsets and sensor factors.
-  struct VPlacementCase
+  TEST( ViewGeometry, TextureSpansTheImageRectangle )
   {
-    const char* Name;
-    ZOL::IVideoFrameInfo Geometry;
-    QRectF Rectangle;
-    QSize Sensor;
-  };
-
-  class ImagePlacementTest : public ::testing::TestWithParam< VPlacementCase >
-  {
-  };
-
-  TEST_P( ImagePlacementTest, TextureSpansTheImageRectangle )
-  {
-    const VPlacementCase& rCase = GetParam();
-    const QRectF Rect = ImageRectangle( rCase.Geometry );
-    EXPECT_EQ( Rect, rCase.Rectangle );
-    const QSize Sensor = PaintSensorSize( VLensData(), rCase.Geometry );
-    EXPECT_EQ( Sensor, rCase.Sensor );
-
-    const QVector4D ScaleOffset = VideoScaleAndOffset( rCase.Geometry, Sensor );
-    auto U = [&]( double i_SensorX ) { return ( i_SensorX / Sensor.width() + ScaleOffset.z() ) * ScaleOffset.x(); };
-    auto V = [&]( double i_SensorY ) { return ( i_SensorY / Sensor.height() + ScaleOffset.w() ) * ScaleOffset.y(); };
-    EXPECT_NEAR( U( Rect.left() ), 0.0, 1e-6 );
-    EXPECT_NEAR( U( Rect.right() ), 1.0, 1e-6 );
-    EXPECT_NEAR( V( Rect.top() ), 0.0, 1e-6 );
-    EXPECT_NEAR( V( Rect.bottom() ), 1.0, 1e-6 );
+    const struct
+    {
+      const char* Name;
+      ZOL::IVideoFrameInfo Geometry;
+      QRectF Rectangle;
+      QSize Sensor;
+    } Cases[] = {
+        { "FillsTheSensor", Geometry( 64, 48 ), QRectF( 0, 0, 64, 48 ), QSize( 64, 48 ) },
+        { "Offset", Geometry( 20, 10, 10, 6 ), QRectF( 5, 3, 20, 10 ), QSize( 30, 16 ) },
+        // An odd twice-offset states a half pixel.
+        { "HalfPixel", Geometry( 20, 10, 3, 0 ), QRectF( 1.5, 0, 20, 10 ), QSize( 23, 10 ) },
+        // Binned by two: each image pixel covers two sensor pixels.
+        { "Binned", Geometry( 16, 8, 9, 9, 2, 2 ), QRectF( 4, 4, 32, 16 ), QSize( 41, 25 ) },
+    };
+    for( const auto& rCase : Cases )
+    {
+      SCOPED_TRACE( rCase.Name );
+      const QRectF Rect = ImageRectangle( rCase.Geometry );
+      EXPECT_EQ( Rect, rCase.Rectangle );
+      const QSize Sensor = PaintSensorSize( VLensData(), rCase.Geometry );
+      EXPECT_EQ( Sensor, rCase.Sensor );
+      const QVector4D ScaleOffset = VideoScaleAndOffset( rCase.Geometry, Sensor );
+      auto U = [&]( double i_X ) { return ( i_X / Sensor.width() + ScaleOffset.z() ) * ScaleOffset.x(); };
+      auto V = [&]( double i_Y ) { return ( i_Y / Sensor.height() + ScaleOffset.w() ) * ScaleOffset.y(); };
+      EXPECT_NEAR( U( Rect.left() ), 0.0, 1e-6 );
+      EXPECT_NEAR( U( Rect.right() ), 1.0, 1e-6 );
+      EXPECT_NEAR( V( Rect.top() ), 0.0, 1e-6 );
+      EXPECT_NEAR( V( Rect.bottom() ), 1.0, 1e-6 );
+    }
   }
 
-  INSTANTIATE_TEST_SUITE_P(
-      Geometry, ImagePlacementTest,
-      ::testing::Values(
-          VPlacementCase{ "FillsTheSensor", Geometry( 64, 48 ), QRectF( 0, 0, 64, 48 ), QSize( 64, 48 ) },
-          VPlacementCase{ "Offset", Geometry( 20, 10, 10, 6 ), QRectF( 5, 3, 20, 10 ), QSize( 30, 16 ) },
-          // An odd twice-offset states a half pixel.
-          VPlacementCase{ "HalfPixel", Geometry( 20, 10, 3, 0 ), QRectF( 1.5, 0, 20, 10 ), QSize( 23, 10 ) },
-          // Binned by two: each image pixel covers two sensor pixels.
-          VPlacementCase{ "Binned", Geometry( 16, 8, 9, 9, 2, 2 ), QRectF( 4, 4, 32, 16 ), QSize( 41, 25 ) } ),
-      []( const ::testing::TestParamInfo< VPlacementCase >& i_rInfo ) { return i_rInfo.param.Name; } );
-
-  TEST( LensData, DefaultRecordsOrUnfittingModelsGiveNoLens )
+  TEST( LensData, TakesCentreAndParametersInSensorPixelsOrNothing )
   {
-    const VLensData None;
-    auto Same = []( const VLensData& i_rA, const VLensData& i_rB )
-    { return i_rA.Centre == i_rB.Centre && i_rA.Parameters == i_rB.Parameters && i_rA.SensorSize == i_rB.SensorSize; };
-    const auto Good = Calibration( ZOL::RadialModel_Lumek2Parameter, { 1e-7, 2e-13 }, 320, 240 );
-    EXPECT_TRUE( Same( LensDataFrom( CoreLumekTypes::VCameraHardware(), Good ), None ) );
-    EXPECT_TRUE( Same( LensDataFrom( Camera( 640, 480 ), CoreLumekTypes::VLensDistortionCalibration() ), None ) );
-    EXPECT_TRUE( Same(
-        LensDataFrom( Camera( 640, 480 ), Calibration( ZOL::RadialModel_Lumek2Parameter, { 1, 2, 3 }, 320, 240 ) ),
-        None ) );
-    EXPECT_TRUE(
-        Same( LensDataFrom( Camera( 640, 480 ), Calibration( ZOL::RadialModel_Lumek3Parameter, { 1, 2 }, 320, 240 ) ),
-              None ) );
-    EXPECT_TRUE( Same(
-        LensDataFrom( Camera( 640, 480 ), Calibration( ZOL::RadialModel_Lumek0Parameter, {}, 320, 240 ) ), None ) );
-  }
-
-  TEST( LensData, TakesCentreAndParametersInSensorPixels )
-  {
-    const VLensData Two = LensDataFrom(
-        Camera( 640, 480 ), Calibration( ZOL::RadialModel_Lumek2Parameter, { 1.5e-7, -2.5e-13 }, 321.5, 239.25 ) );
+    const VLensData Two = LensDataFrom( Camera( 640, 480 ), Lens( { 1.5e-7, -2.5e-13 }, 321.5, 239.25 ) );
     EXPECT_EQ( Two.Centre, QVector2D( 321.5f, 239.25f ) );
     EXPECT_EQ( Two.Parameters, QVector3D( 1.5e-7f, -2.5e-13f, 0.0f ) );
     EXPECT_EQ( Two.SensorSize, QSize( 640, 480 ) );
+    EXPECT_EQ(
+        LensDataFrom( Camera( 64, 48 ), Lens( { 1, 2, 3 }, 32, 24, ZOL::RadialModel_Lumek3Parameter ) ).Parameters,
+        QVector3D( 1, 2, 3 ) );
 
-    const VLensData Three =
-        LensDataFrom( Camera( 64, 48 ), Calibration( ZOL::RadialModel_Lumek3Parameter, { 1, 2, 3 }, 32, 24 ) );
-    EXPECT_EQ( Three.Parameters, QVector3D( 1, 2, 3 ) );
+    // A default record, or parameters that do not fit the model, give no lens.
+    const std::pair< CoreLumekTypes::VCameraHardware, CoreLumekTypes::VLensDistortionCalibration > NoLens[] = {
+        { CoreLumekTypes::VCameraHardware(), Lens( { 1e-7, 2e-13 }, 320, 240 ) },
+        { Camera( 640, 480 ), CoreLumekTypes::VLensDistortionCalibration() },
+        { Camera( 640, 480 ), Lens( { 1, 2, 3 }, 320, 240 ) },
+        { Camera( 640, 480 ), Lens( { 1, 2 }, 320, 240, ZOL::RadialModel_Lumek3Parameter ) },
+        { Camera( 640, 480 ), Lens( {}, 320, 240, ZOL::RadialModel_Lumek0Parameter ) },
+    };
+    const VLensData None;
+    for( const auto& [Hardware, Calibration] : NoLens )
+    {
+      const VLensData Data = LensDataFrom( Hardware, Calibration );
+      EXPECT_TRUE( Data.Centre == None.Centre && Data.Parameters == None.Parameters &&
+                   Data.SensorSize == None.SensorSize )
+          << "model " << Calibration.RadialModel << ", " << Calibration.RadialDistortionParameters.size()
+          << " parameters, sensor " << Hardware.SensorWidthInPixels;
+    }
   }
 
-  TEST( DistortedBounds, WithoutDistortionSpreadsUpAndLeftAndLeavesTheLastElevenths )
+  TEST( DistortedBounds, SpreadUpAndLeftAndGrowWithBarrelDistortion )
   {
     // Ten points a side at steps of an eleventh: x reaches 0 + 9/11 of the width on the top
     // side, and the union of (-1, -1) rectangles spreads everything by one pixel up and left.
-    const QRectF Bounds = DistortedBounds( QRectF( 0, 0, 110, 55 ), QVector2D( 0, 0 ), QVector3D() );
-    EXPECT_NEAR( Bounds.left(), -1.0, 1e-4 );
-    EXPECT_NEAR( Bounds.top(), -1.0, 1e-4 );
-    EXPECT_NEAR( Bounds.right(), 110.0, 1e-4 );
-    EXPECT_NEAR( Bounds.bottom(), 55.0, 1e-4 );
-  }
+    const QRectF Plain = DistortedBounds( QRectF( 0, 0, 110, 55 ), QVector2D( 0, 0 ), QVector3D() );
+    EXPECT_NEAR( Plain.left(), -1.0, 1e-4 );
+    EXPECT_NEAR( Plain.top(), -1.0, 1e-4 );
+    EXPECT_NEAR( Plain.right(), 110.0, 1e-4 );
+    EXPECT_NEAR( Plain.bottom(), 55.0, 1e-4 );
 
-  TEST( DistortedBounds, BarrelDistortionGrowsTheBoundsSymmetrically )
-  {
     // A positive k1 moves points away from the centre by a factor 1 + k1 r^2: the corner of a
     // 100 by 100 square around the centre (r^2 = 5000) moves out by 5 % at k1 = 1e-5.
-    const QRectF Square( 50, 50, 100, 100 );
-    const QRectF Bounds = DistortedBounds( Square, QVector2D( 100, 100 ), QVector3D( 1e-5f, 0, 0 ) );
+    const QRectF Bounds =
+        DistortedBounds( QRectF( 50, 50, 100, 100 ), QVector2D( 100, 100 ), QVector3D( 1e-5f, 0, 0 ) );
     EXPECT_NEAR( Bounds.left(), 100 - 50 * 1.05 - 1.0, 1e-3 );
     EXPECT_NEAR( Bounds.top(), 100 - 50 * 1.05 - 1.0, 1e-3 );
     EXPECT_NEAR( Bounds.right(), 100 + 50 * 1.05, 1e-3 );
@@ -160,10 +129,8 @@ namespace
     View.SetScaleMode( ScaleToWindow );
     EXPECT_FLOAT_EQ( View.GetZoom(), 0.5f );
     EXPECT_EQ( View.GetViewCentre(), QVector2D( 0.5f, 0.5f ) );
-  }
 
-  TEST_F( VViewFixture, ScaleWindowToVideoAsksForTheImageSize )
-  {
+    // Scale window to video asks for the image's size.
     const ZOL::IVideoFrameInfo Big = Geometry( 1920, 1080 );
     View.Update( Big, Big, VLensData(), QSize( 400, 400 ) );
     EXPECT_EQ( View.MinimumSizeHint(), QSize( 900, 505 ) );
@@ -183,8 +150,7 @@ namespace
 
   TEST_F( VViewFixture, CorrectionCentresOnTheDistortedBounds )
   {
-    VLensData Lens =
-        LensDataFrom( Camera( 400, 200 ), Calibration( ZOL::RadialModel_Lumek2Parameter, { 1e-5, 0 }, 300, 100 ) );
+    VLensData Lens = LensDataFrom( Camera( 400, 200 ), SurfaceTest::Lens( { 1e-5, 0 }, 300, 100 ) );
     Lens.CorrectionEnabled = true;
     const ZOL::IVideoFrameInfo Geo = Geometry( 200, 100, 200, 100 );
     View.Update( Pixels, Geo, Lens, QSize( 400, 400 ) );
@@ -201,63 +167,45 @@ namespace
     EXPECT_EQ( View.GetViewCentre(), QVector2D( 0.5f, 0.5f ) );
   }
 
-  struct VMouseCase
-  {
-    const char* Name;
-    Qt::MouseButtons Buttons;
-    QPoint To;
-    float Zoom;
-    QVector2D Centre;
-    bool ZoomDrag;
-  };
-
-  class MouseTest : public ::testing::TestWithParam< VMouseCase >
-  {
-  };
-
   // A drag from (100, 100) in a 200 by 100 widget, starting at zoom 1 and centre (0.5, 0.5).
-  TEST_P( MouseTest, DragChangesZoomOrCentreAndFreesTheView )
+  TEST( Mouse, DragChangesZoomOrCentreAndFreesTheView )
   {
-    const VMouseCase& rCase = GetParam();
-    VVideoView View;
-    View.SetScaleMode( ScaleOneToOne );
-    View.MousePress( QPoint( 100, 100 ), rCase.Buttons );
-    EXPECT_EQ( View.IsZoomDragging(), rCase.ZoomDrag );
-    EXPECT_TRUE( View.MouseMove( rCase.To, rCase.Buttons, QSize( 200, 100 ) ) );
-    EXPECT_EQ( View.GetScaleMode(), ScaleFreely );
-    EXPECT_NEAR( View.GetZoom(), rCase.Zoom, 1e-6 );
-    EXPECT_NEAR( View.GetViewCentre().x(), rCase.Centre.x(), 1e-6 );
-    EXPECT_NEAR( View.GetViewCentre().y(), rCase.Centre.y(), 1e-6 );
-    View.MouseRelease( rCase.To, Qt::NoButton );
-    EXPECT_FALSE( View.IsZoomDragging() );
-  }
+    const struct
+    {
+      const char* Name;
+      Qt::MouseButtons Buttons;
+      QPoint To;
+      float Zoom;
+      QVector2D Centre;
+      bool ZoomDrag;
+    } Cases[] = {
+        { "RightUpZooms", Qt::RightButton, QPoint( 100, 50 ), 1.5f, { 0.5f, 0.5f }, true },
+        { "RightFarUpStopsAtTwo", Qt::RightButton, QPoint( 100, -500 ), 2.0f, { 0.5f, 0.5f }, true },
+        { "RightFarDownStopsAtOneFifth", Qt::RightButton, QPoint( 100, 190 ), 0.2f, { 0.5f, 0.5f }, true },
+        // A widget width of dragging moves the view by the whole sensor, whatever the zoom.
+        { "LeftPans", Qt::LeftButton, QPoint( 50, 75 ), 1.0f, { 0.75f, 0.75f }, false },
+        { "MiddlePans", Qt::MiddleButton, QPoint( 150, 100 ), 1.0f, { 0.25f, 0.5f }, false },
+        // The zoom step has already taken the position, so the pan finds nothing to move.
+        { "RightAndMiddleOnlyZoom", Qt::RightButton | Qt::MiddleButton, QPoint( 100, 50 ), 1.5f, { 0.5f, 0.5f }, true },
+        { "LeftAndRightOnlyPan", Qt::LeftButton | Qt::RightButton, QPoint( 50, 100 ), 1.0f, { 0.75f, 0.5f }, false },
+    };
+    for( const auto& rCase : Cases )
+    {
+      SCOPED_TRACE( rCase.Name );
+      VVideoView View;
+      View.SetScaleMode( ScaleOneToOne );
+      View.MousePress( QPoint( 100, 100 ), rCase.Buttons );
+      EXPECT_EQ( View.IsZoomDragging(), rCase.ZoomDrag );
+      EXPECT_TRUE( View.MouseMove( rCase.To, rCase.Buttons, QSize( 200, 100 ) ) );
+      EXPECT_EQ( View.GetScaleMode(), ScaleFreely );
+      EXPECT_NEAR( View.GetZoom(), rCase.Zoom, 1e-6 );
+      EXPECT_NEAR( View.GetViewCentre().x(), rCase.Centre.x(), 1e-6 );
+      EXPECT_NEAR( View.GetViewCentre().y(), rCase.Centre.y(), 1e-6 );
+      View.MouseRelease( rCase.To, Qt::NoButton );
+      EXPECT_FALSE( View.IsZoomDragging() );
+    }
 
-  INSTANTIATE_TEST_SUITE_P(
-      Mouse, MouseTest,
-      ::testing::Values(
-          VMouseCase{ "RightUpZooms", Qt::RightButton, QPoint( 100, 50 ), 1.5f, { 0.5f, 0.5f }, true },
-          VMouseCase{ "RightFarUpStopsAtTwo", Qt::RightButton, QPoint( 100, -500 ), 2.0f, { 0.5f, 0.5f }, true },
-          VMouseCase{ "RightFarDownStopsAtOneFifth", Qt::RightButton, QPoint( 100, 190 ), 0.2f, { 0.5f, 0.5f }, true },
-          // A widget width of dragging moves the view by the whole sensor, whatever the zoom.
-          VMouseCase{ "LeftPans", Qt::LeftButton, QPoint( 50, 75 ), 1.0f, { 0.75f, 0.75f }, false },
-          VMouseCase{ "MiddlePans", Qt::MiddleButton, QPoint( 150, 100 ), 1.0f, { 0.25f, 0.5f }, false },
-          // The zoom step has already taken the position, so the pan finds nothing to move.
-          VMouseCase{ "RightAndMiddleOnlyZoom",
-                      Qt::RightButton | Qt::MiddleButton,
-                      QPoint( 100, 50 ),
-                      1.5f,
-                      { 0.5f, 0.5f },
-                      true },
-          VMouseCase{ "LeftAndRightOnlyPan",
-                      Qt::LeftButton | Qt::RightButton,
-                      QPoint( 50, 100 ),
-                      1.0f,
-                      { 0.75f, 0.5f },
-                      false } ),
-      []( const ::testing::TestParamInfo< VMouseCase >& i_rInfo ) { return i_rInfo.param.Name; } );
-
-  TEST( Mouse, MoveWithoutButtonsChangesNothing )
-  {
+    // A move without buttons changes nothing.
     VVideoView View;
     View.MousePress( QPoint( 10, 10 ), Qt::NoButton );
     EXPECT_FALSE( View.MouseMove( QPoint( 50, 50 ), Qt::NoButton, QSize( 100, 100 ) ) );
