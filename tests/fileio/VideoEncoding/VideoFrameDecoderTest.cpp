@@ -1,7 +1,10 @@
+// What the frame decoder makes of each payload: raw frames used where they lie when they hold
+// their description, H.264 through the decoder it is given, still images checked by their
+// signature before anything is allocated for them.
+
 #include "fileio/VideoEncoding/VideoFrameDecoder.h"
 
 #include "tests/support/LogCapture.h"
-#include "tests/support/TestNames.h"
 #include "videointerface/BufferAllocators.h"
 
 #include <gtest/gtest.h>
@@ -13,7 +16,6 @@
 namespace
 {
   using namespace ZOL;
-  using VideoEncoding::VideoFrameDecoder;
 
   IVideoFrameInfo Info( std::int32_t i_Width, std::int32_t i_Height, EPixelFormat i_Format )
   {
@@ -39,7 +41,8 @@ namespace
     bool Decode( EVideoPayload i_Payload, IVideoFrameInfo& io_rInfo, std::shared_ptr< IBuffer >& io_rBuffer,
                  const std::shared_ptr< IH264Decoder >& i_pH264 = nullptr )
     {
-      return VideoFrameDecoder( i_Payload, io_rInfo, io_rBuffer, m_pFrameAllocator, m_pTemporaryAllocator, i_pH264 );
+      return VideoEncoding::VideoFrameDecoder( i_Payload, io_rInfo, io_rBuffer, m_pFrameAllocator,
+                                               m_pTemporaryAllocator, i_pH264 );
     }
 
     std::shared_ptr< IBufferAllocator > m_pReaderAllocator = std::make_shared< VReaderBufferAllocator >();
@@ -55,18 +58,17 @@ namespace
     EXPECT_TRUE( Decode( VideoPayload_Uncompressed, FrameInfo, pBuffer ) );
     EXPECT_EQ( pBuffer.get(), pBefore );
     EXPECT_EQ( FrameInfo, Info( 4, 3, PixelFormat_B8G8R8 ) );
+    // No buffer is no frame, whatever the payload.
+    std::shared_ptr< IBuffer > pNone;
+    for( EVideoPayload Payload : { VideoPayload_Uncompressed, VideoPayload_ImageJPEG, VideoPayload_VideoH264 } )
+      EXPECT_FALSE( Decode( Payload, FrameInfo, pNone ) );
   }
 
   // A description that promises more bytes than the buffer holds would have the surface read
   // past its end: it is refused.
   TEST_F( FrameDecoder, UncompressedFrameSmallerThanItsDescriptionFails )
   {
-    struct VCase
-    {
-      IVideoFrameInfo FrameInfo;
-      std::size_t Bytes;
-    };
-    const VCase Cases[] = {
+    const std::pair< IVideoFrameInfo, std::size_t > Cases[] = {
         { Info( 4, 3, PixelFormat_R8G8B8 ), 35 },
         { Info( 64, 2, PixelFormat_U10Y10V10Y10 ), 2 * 128 * 2 - 1 },
         { Info( 9, 1, PixelFormat_Luminance7 ), 7 },
@@ -74,45 +76,22 @@ namespace
         { Info( 0x7FFFFFFF, 0x7FFFFFFF, PixelFormat_R8G8B8u8 ), 100 },
         { Info( -4, 3, PixelFormat_Luminance8 ), 100 },
     };
-    for( const VCase& rCase : Cases )
+    for( const auto& [rFrameInfo, Bytes] : Cases )
     {
       LumekTest::VLogCapture Log( "VideoEncoding" );
-      auto pBuffer = Payload( std::vector< std::uint8_t >( rCase.Bytes ) );
-      IVideoFrameInfo FrameInfo = rCase.FrameInfo;
-      EXPECT_FALSE( Decode( VideoPayload_Uncompressed, FrameInfo, pBuffer ) ) << rCase.Bytes;
+      auto pBuffer = Payload( std::vector< std::uint8_t >( Bytes ) );
+      IVideoFrameInfo FrameInfo = rFrameInfo;
+      EXPECT_FALSE( Decode( VideoPayload_Uncompressed, FrameInfo, pBuffer ) ) << Bytes;
       EXPECT_EQ( Log.Lines().size(), 1u );
+      if( Bytes == 35 )
+      {
+        EXPECT_EQ( Log.Lines().at( 0 ), "2 Uncompressed frame of 35 bytes does not hold a 4 x 3 frame of pixel format "
+                                        "'R8G8B8' (36 bytes)." );
+      }
     }
-    auto pBuffer = Payload( std::vector< std::uint8_t >( 35 ) );
-    LumekTest::VLogCapture Log( "VideoEncoding" );
-    IVideoFrameInfo FrameInfo = Info( 4, 3, PixelFormat_R8G8B8 );
-    Decode( VideoPayload_Uncompressed, FrameInfo, pBuffer );
-    EXPECT_EQ( Log.Lines(),
-               std::vector< std::string >{ "2 Uncompressed frame of 35 bytes does not hold a 4 x 3 frame of "
-                                           "pixel format 'R8G8B8' (36 bytes)." } );
   }
 
-  TEST_F( FrameDecoder, NoBufferIsNoFrame )
-  {
-    std::shared_ptr< IBuffer > pNone;
-    IVideoFrameInfo FrameInfo = Info( 4, 3, PixelFormat_R8G8B8 );
-    for( EVideoPayload Payload : { VideoPayload_Uncompressed, VideoPayload_ImageJPEG, VideoPayload_VideoH264 } )
-      EXPECT_FALSE( Decode( Payload, FrameInfo, pNone ) );
-  }
-
-  TEST_F( FrameDecoder, H264WithoutDecoderLogsEveryFrameAndKeepsTheBuffer )
-  {
-    LumekTest::VLogCapture Log( "VideoEncoding" );
-    auto pBuffer = Payload( { 0, 0, 0, 1, 0x65 } );
-    IBuffer* pBefore = pBuffer.get();
-    IVideoFrameInfo FrameInfo = Info( 16, 16, PixelFormat_U8Y8V8Y8 );
-    EXPECT_FALSE( Decode( VideoPayload_VideoH264, FrameInfo, pBuffer ) );
-    EXPECT_FALSE( Decode( VideoPayload_VideoH264, FrameInfo, pBuffer ) );
-    EXPECT_EQ( pBuffer.get(), pBefore );
-    EXPECT_EQ( Log.Lines(),
-               std::vector< std::string >( 2, "2 H.264 video for decoding but no H.264 decoder provided." ) );
-  }
-
-  // A stand-in decoder: checks what it is given and answers as told.
+  // A stand-in decoder: notes what it is given and answers as told.
   class VFakeH264Decoder : public IH264Decoder
   {
   public:
@@ -127,9 +106,7 @@ namespace
       Wished = i_PixelFormat;
       if( m_bGiveFrame )
       {
-        io_VideoFrameInfo.ImageWidth = 2;
-        io_VideoFrameInfo.ImageHeight = 2;
-        io_VideoFrameInfo.PixelFormat = PixelFormat_U8Y8V8Y8;
+        io_VideoFrameInfo = Info( 2, 2, PixelFormat_U8Y8V8Y8 );
         m_pAllocator->Allocate( o_rOutput, 8 );
       }
       return m_bSucceed;
@@ -142,84 +119,82 @@ namespace
     bool m_bSucceed, m_bGiveFrame;
   };
 
-  TEST_F( FrameDecoder, H264DecoderOutputReplacesTheStoredBytes )
+  TEST_F( FrameDecoder, H264GoesThroughTheDecoder )
   {
-    auto pDecoder = std::make_shared< VFakeH264Decoder >( m_pFrameAllocator, true, true );
-    auto pBuffer = Payload( { 0, 0, 0, 1, 0x65, 0x88 } );
-    IVideoFrameInfo FrameInfo = Info( 640, 480, PixelFormat_Y8U8Y8V8 );
-    EXPECT_TRUE( Decode( VideoPayload_VideoH264, FrameInfo, pBuffer, pDecoder ) );
-    EXPECT_EQ( pDecoder->InputSize, 6u );
-    EXPECT_EQ( pDecoder->Wished, PixelFormat_Y8U8Y8V8 );
-    ASSERT_TRUE( pBuffer );
-    EXPECT_EQ( pBuffer->GetSize(), 8u );
-    EXPECT_EQ( FrameInfo, Info( 2, 2, PixelFormat_U8Y8V8Y8 ) );
-  }
-
-  TEST_F( FrameDecoder, H264SuccessWithoutAFrameIsAFailure )
-  {
-    for( const auto& [bSucceed, bGiveFrame] :
-         { std::make_pair( true, false ), std::make_pair( false, true ), std::make_pair( false, false ) } )
     {
-      auto pDecoder = std::make_shared< VFakeH264Decoder >( m_pFrameAllocator, bSucceed, bGiveFrame );
-      auto pBuffer = Payload( { 0, 0, 1, 0x67 } );
-      IVideoFrameInfo FrameInfo = Info( 640, 480, PixelFormat_U8Y8V8Y8 );
-      EXPECT_FALSE( Decode( VideoPayload_VideoH264, FrameInfo, pBuffer, pDecoder ) );
-      // The stored bytes are released either way; what the decoder gave, if anything, is kept.
-      EXPECT_EQ( pBuffer != nullptr, bGiveFrame );
+      // Without a decoder every frame says so, and the stored bytes stay.
+      LumekTest::VLogCapture Log( "VideoEncoding" );
+      auto pBuffer = Payload( { 0, 0, 0, 1, 0x65 } );
+      IBuffer* pBefore = pBuffer.get();
+      IVideoFrameInfo FrameInfo = Info( 16, 16, PixelFormat_U8Y8V8Y8 );
+      EXPECT_FALSE( Decode( VideoPayload_VideoH264, FrameInfo, pBuffer ) );
+      EXPECT_FALSE( Decode( VideoPayload_VideoH264, FrameInfo, pBuffer ) );
+      EXPECT_EQ( pBuffer.get(), pBefore );
+      EXPECT_EQ( Log.Lines(),
+                 std::vector< std::string >( 2, "2 H.264 video for decoding but no H.264 decoder provided." ) );
     }
+    // Only success with a picture is a frame. The stored bytes are released either way; what the
+    // decoder gave, if anything, is kept.
+    for( const bool bSucceed : { true, false } )
+      for( const bool bGiveFrame : { true, false } )
+      {
+        SCOPED_TRACE( std::string( bSucceed ? "succeeds" : "fails" ) + ( bGiveFrame ? " with" : " without" ) );
+        auto pDecoder = std::make_shared< VFakeH264Decoder >( m_pFrameAllocator, bSucceed, bGiveFrame );
+        auto pBuffer = Payload( { 0, 0, 0, 1, 0x65, 0x88 } );
+        IVideoFrameInfo FrameInfo = Info( 640, 480, PixelFormat_Y8U8Y8V8 );
+        EXPECT_EQ( Decode( VideoPayload_VideoH264, FrameInfo, pBuffer, pDecoder ), bSucceed && bGiveFrame );
+        EXPECT_EQ( pDecoder->InputSize, 6u );
+        EXPECT_EQ( pDecoder->Wished, PixelFormat_Y8U8Y8V8 );
+        EXPECT_EQ( pBuffer != nullptr, bGiveFrame );
+        if( bGiveFrame )
+        {
+          EXPECT_EQ( pBuffer->GetSize(), 8u );
+          EXPECT_EQ( FrameInfo, Info( 2, 2, PixelFormat_U8Y8V8Y8 ) );
+        }
+      }
   }
 
   // Payloads that are no image of their kind are missing frames; PNG and TIFF signatures are
   // checked before anything is allocated for them.
-  struct VStillImage
+  TEST_F( FrameDecoder, StillImagesAreMissingFramesWithTheirSignatureChecked )
   {
-    const char* Name;
-    EVideoPayload Payload;
-    std::vector< std::uint8_t > Bytes;
-    const char* Assertion; // expected log line of the failed signature check, or null
-  };
-
-  std::ostream& operator<<( std::ostream& o, const VStillImage& i_rCase )
-  {
-    return o << i_rCase.Name;
-  }
-
-  class StillImages : public FrameDecoder, public ::testing::WithParamInterface< VStillImage >
-  {
-  };
-
-  TEST_P( StillImages, AreMissingFramesWithTheirSignatureChecked )
-  {
-    const VStillImage& rCase = GetParam();
-    LumekTest::VLogCapture Log( "VideoEncoding" );
-    auto pBuffer = Payload( rCase.Bytes );
-    IVideoFrameInfo FrameInfo = Info( 8, 8, PixelFormat_R8G8B8 );
-    EXPECT_FALSE( Decode( rCase.Payload, FrameInfo, pBuffer ) );
-    if( rCase.Assertion == nullptr )
-      EXPECT_TRUE( Log.Lines().empty() );
-    else
+    const std::string PNGCheck = "2 PNG frame does not start with the PNG signature.";
+    const std::string TIFFCheck = "2 TIFF frame does not start with the little-endian TIFF mark.";
+    struct VStillImage
     {
-      ASSERT_EQ( Log.Lines().size(), 1u );
-      EXPECT_NE( Log.Lines()[0].find( rCase.Assertion ), std::string::npos ) << Log.Lines()[0];
+      const char* Name;
+      EVideoPayload Payload;
+      std::vector< std::uint8_t > Bytes;
+      std::string LogLine; // of the failed signature check, if one fails
+    };
+    const VStillImage Cases[] = {
+        { "JPEG", VideoPayload_ImageJPEG, { 0xFF, 0xD8, 0xFF, 0xE0, 0, 0x10 }, "" },
+        { "EmptyJPEG", VideoPayload_ImageJPEG, {}, "" },
+        { "PNG", VideoPayload_ImagePNG, { 0x89, 'P', 'N', 'G', 0x0D, 0x0A, 0x1A, 0x0A, 0, 0, 0, 13 }, "" },
+        { "PNGWithBadSignature", VideoPayload_ImagePNG, { 0x89, 'P', 'N', 'G', 0x0D, 0x0A, 0x1A, 0x0B, 0 }, PNGCheck },
+        { "PNGCutInsideSignature", VideoPayload_ImagePNG, { 0x89, 'P', 'N' }, PNGCheck },
+        { "EmptyPNG", VideoPayload_ImagePNG, {}, PNGCheck },
+        { "LittleEndianTIFF", VideoPayload_ImageTIFF, { 0x49, 0x49, 0x2A, 0x00, 8, 0, 0, 0 }, "" },
+        { "BigEndianTIFF", VideoPayload_ImageTIFF, { 0x4D, 0x4D, 0x00, 0x2A, 0, 0, 0, 8 }, TIFFCheck },
+        { "TIFFCutInsideSignature", VideoPayload_ImageTIFF, { 0x49, 0x49 }, TIFFCheck },
+        { "PayloadNone", VideoPayload_None, { 1, 2, 3 }, "" },
+        { "PayloadOutOfRange", static_cast< EVideoPayload >( 6 ), { 1, 2, 3 }, "" },
+    };
+    for( const VStillImage& rCase : Cases )
+    {
+      SCOPED_TRACE( rCase.Name );
+      LumekTest::VLogCapture Log( "VideoEncoding" );
+      auto pBuffer = Payload( rCase.Bytes );
+      IVideoFrameInfo FrameInfo = Info( 8, 8, PixelFormat_R8G8B8 );
+      EXPECT_FALSE( Decode( rCase.Payload, FrameInfo, pBuffer ) );
+      if( rCase.LogLine.empty() )
+      {
+        EXPECT_TRUE( Log.Lines().empty() );
+      }
+      else
+      {
+        EXPECT_EQ( Log.Lines(), std::vector< std::string >{ rCase.LogLine } );
+      }
     }
   }
-
-  const char* const s_PNGCheck = "2 PNG frame does not start with the PNG signature.";
-  const char* const s_TIFFCheck = "2 TIFF frame does not start with the little-endian TIFF mark.";
-
-  const VStillImage s_StillImages[] = {
-      { "JPEG", VideoPayload_ImageJPEG, { 0xFF, 0xD8, 0xFF, 0xE0, 0, 0x10 }, nullptr },
-      { "EmptyJPEG", VideoPayload_ImageJPEG, {}, nullptr },
-      { "PNG", VideoPayload_ImagePNG, { 0x89, 'P', 'N', 'G', 0x0D, 0x0A, 0x1A, 0x0A, 0, 0, 0, 13 }, nullptr },
-      { "PNGWithBadSignature", VideoPayload_ImagePNG, { 0x89, 'P', 'N', 'G', 0x0D, 0x0A, 0x1A, 0x0B, 0 }, s_PNGCheck },
-      { "PNGCutInsideSignature", VideoPayload_ImagePNG, { 0x89, 'P', 'N' }, s_PNGCheck },
-      { "EmptyPNG", VideoPayload_ImagePNG, {}, s_PNGCheck },
-      { "LittleEndianTIFF", VideoPayload_ImageTIFF, { 0x49, 0x49, 0x2A, 0x00, 8, 0, 0, 0 }, nullptr },
-      { "BigEndianTIFF", VideoPayload_ImageTIFF, { 0x4D, 0x4D, 0x00, 0x2A, 0, 0, 0, 8 }, s_TIFFCheck },
-      { "TIFFCutInsideSignature", VideoPayload_ImageTIFF, { 0x49, 0x49 }, s_TIFFCheck },
-      { "PayloadNone", VideoPayload_None, { 1, 2, 3 }, nullptr },
-      { "PayloadOutOfRange", static_cast< EVideoPayload >( 6 ), { 1, 2, 3 }, nullptr },
-  };
-
-  INSTANTIATE_TEST_SUITE_P( Payloads, StillImages, ::testing::ValuesIn( s_StillImages ), LumekTest::VCaseName() );
 } // namespace

@@ -9,75 +9,42 @@
 
 #include <gtest/gtest.h>
 
+#include <typeinfo>
+
 namespace
 {
-  enum EExpected
+  TEST( CreateVideoReader, PicksTheReaderByTheName )
   {
-    NoReader,
-    LumekVideoReader,
-    MovReader,
-    AviReader,
-    MkvReader,
-    ImageSequence,
-  };
-
-  EExpected KindOf( const ZOL::IVideoReader* i_pReader )
-  {
-    if( !i_pReader )
-      return NoReader;
-    if( dynamic_cast< const LumekVideo::VReader* >( i_pReader ) )
-      return LumekVideoReader;
-    if( dynamic_cast< const MovIO::VMovReader* >( i_pReader ) )
-      return MovReader;
-    if( dynamic_cast< const RapidAVI::VRapidAVIReader* >( i_pReader ) )
-      return AviReader;
-    if( dynamic_cast< const MkvIO::VMkvReader* >( i_pReader ) )
-      return MkvReader;
-    if( dynamic_cast< const ImageSequenceIO::VImageSequenceReader* >( i_pReader ) )
-      return ImageSequence;
-    ADD_FAILURE() << "a reader of no known kind";
-    return NoReader;
+    const std::type_info* const None = nullptr;
+    const std::type_info* const Lvid = &typeid( LumekVideo::VReader );
+    const std::type_info* const Mov = &typeid( MovIO::VMovReader );
+    const std::type_info* const Images = &typeid( ImageSequenceIO::VImageSequenceReader );
+    const std::pair< const char*, const std::type_info* > Cases[] = {
+        { "x.lvid", Lvid },
+        { "/captures/day 1/take.2.lvid", Lvid },
+        { "clip.mov", Mov },
+        { "clip.mp4", Mov },
+        { "clip.avi", &typeid( RapidAVI::VRapidAVIReader ) },
+        { "clip.mkv", &typeid( MkvIO::VMkvReader ) },
+        { "take.lumekimagesequence", Images },
+        // One numbered image stands for its sequence.
+        { "take_000123.jpg", Images },
+        { "take_000123.tiff", Images },
+        { "clip.MOV", None },
+        { "clip.LVID", None },
+        { "take_0001.JPG", None },
+        { "notes.txt", None },
+        { "clip", Images },
+        { "/data.lvid/readme", Images },
+        { "shot_%FRAME%.lvid", Images },
+        { "shot_%FRAME_NUMBER%.lvid", Images },
+    };
+    for( const auto& [pName, pExpected] : Cases )
+    {
+      const auto pReader = CreateVideoReader( pName );
+      EXPECT_EQ( pReader ? &typeid( *pReader ) : nullptr, pExpected ) << pName;
+    }
   }
-
-  struct VNameCase
-  {
-    const char* Label;
-    const char* FileName;
-    EExpected Expected;
-  };
-
-  const VNameCase s_Cases[] = {
-      { "LowerCaseLvid", "x.lvid", LumekVideoReader },
-      { "LvidInAFolder", "/captures/day 1/take.2.lvid", LumekVideoReader },
-      { "Mov", "clip.mov", MovReader },
-      { "Mp4", "clip.mp4", MovReader },
-      { "Avi", "clip.avi", AviReader },
-      { "Mkv", "clip.mkv", MkvReader },
-      { "Descriptor", "take.lumekimagesequence", ImageSequence },
-      { "NumberedJpeg", "take_000123.jpg", ImageSequence },
-      { "NumberedTiff", "take_000123.tiff", ImageSequence },
-      { "UpperCaseMov", "clip.MOV", NoReader },
-      { "UpperCaseLvid", "clip.LVID", NoReader },
-      { "UpperCaseJpeg", "take_0001.JPG", NoReader },
-      { "UnknownExtension", "notes.txt", NoReader },
-      { "NoExtension", "clip", ImageSequence },
-      { "LvidOnlyInTheFolderName", "/data.lvid/readme", ImageSequence },
-      { "FramePlaceholder", "shot_%FRAME%.lvid", ImageSequence },
-      { "FrameNumberPlaceholder", "shot_%FRAME_NUMBER%.lvid", ImageSequence },
-  };
-
-  class CreateVideoReaderByName : public testing::TestWithParam< VNameCase >
-  {
-  };
-
-  TEST_P( CreateVideoReaderByName, PicksTheReader )
-  {
-    const VNameCase& rCase = GetParam();
-    EXPECT_EQ( KindOf( CreateVideoReader( rCase.FileName ).get() ), rCase.Expected );
-  }
-
-  INSTANTIATE_TEST_SUITE_P( Names, CreateVideoReaderByName, testing::ValuesIn( s_Cases ),
-                            []( const testing::TestParamInfo< VNameCase >& i_rInfo ) { return i_rInfo.param.Label; } );
 
   TEST( CreateVideoReader, EachCallGivesANewUnopenedReader )
   {
