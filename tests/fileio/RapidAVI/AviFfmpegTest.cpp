@@ -120,7 +120,7 @@ TEST( AviFfmpeg, VideoMatchesFfprobeAndFfmpegDecodeAfterEachSeek )
     for( const std::uint64_t i : Order )
     {
       const auto Want = Expected.begin() + static_cast< std::ptrdiff_t >( i * FrameBytes );
-      VBytes Got = DecodeVideo( *pReader, i );
+      VBytes Got = ReadVideo( *pReader, i, true );
       ASSERT_EQ( Got.size(), FrameBytes ) << "frame " << i;
       // Stored bottom row first; ffmpeg gives the picture top row first.
       for( std::size_t y = 0; rCase.bInverted && y < Height / 2; ++y )
@@ -274,14 +274,14 @@ TEST( AviMJPEG, AVI1FramesRebuiltWithTheTypicalTablesAndTheOnesRefused )
   ASSERT_TRUE( Avi.bOpened );
   for( std::uint64_t i = 0; i < Spec.Frames.size(); ++i )
   {
-    const VBytes Rebuilt = DecodeVideo( *Avi.pReader, i );
+    const VBytes Rebuilt = ReadVideo( *Avi.pReader, i, true );
     if( i >= Frames || i == 2 )
     {
       // The refused frames fail alone; their neighbours decode.
       EXPECT_TRUE( Rebuilt.empty() ) << "frame " << i;
       continue;
     }
-    const VBytes Whole = DecodeVideo( *pWhole, i );
+    const VBytes Whole = ReadVideo( *pWhole, i, true );
     ASSERT_EQ( Whole.size(), std::size_t( Width * Height * 3 ) );
     EXPECT_TRUE( Rebuilt == Whole ) << "frame " << i;
   }

@@ -15,12 +15,27 @@ namespace AviTest
 {
   using VBytes = std::vector< std::uint8_t >;
 
-  void AppendLE( VBytes& io_rBytes, std::uint64_t i_Value, int i_Width );
-  VBytes Text( const std::string& i_rText );
+  // Little-endian fields, one after another.
+  struct VLE
+  {
+    VLE& U( std::uint64_t i_Value, int i_Width );
+    VLE& U16( std::uint64_t i_Value ) { return U( i_Value, 2 ); }
+    VLE& U32( std::uint64_t i_Value ) { return U( i_Value, 4 ); }
+    VLE& U64( std::uint64_t i_Value ) { return U( i_Value, 8 ); }
+    VLE& Text( const std::string& i_rText ) { return Append( VBytes( i_rText.begin(), i_rText.end() ) ); }
+    VLE& Zeros( std::size_t i_Count ) { return Append( VBytes( i_Count, 0 ) ); }
+    VLE& Append( const VBytes& i_rBytes );
+    VBytes Bytes;
+  };
+
   // A chunk with its pad byte when the payload is odd.
   VBytes Chunk( const std::string& i_rId, const VBytes& i_rPayload );
-  VBytes List( const std::string& i_rType, const std::vector< VBytes >& i_rChildren );
-  VBytes Riff( const std::string& i_rForm, const std::vector< VBytes >& i_rChildren );
+  VBytes List( const std::string& i_rType, const std::vector< VBytes >& i_rChildren,
+               const std::string& i_rId = "LIST" );
+  inline VBytes Riff( const std::string& i_rForm, const std::vector< VBytes >& i_rChildren )
+  {
+    return List( i_rForm, i_rChildren, "RIFF" );
+  }
   VBytes StreamHeader( const std::string& i_rType, std::uint32_t i_Scale, std::uint32_t i_Rate );
   VBytes WaveFormat( std::uint16_t i_Tag, std::uint16_t i_Channels, std::uint32_t i_Rate, std::uint16_t i_Bits );
   VBytes ExtensibleWaveFormat( bool i_bFloat, std::uint16_t i_Channels, std::uint32_t i_Rate, std::uint16_t i_Bits );
@@ -71,10 +86,8 @@ namespace AviTest
     bool bOpened = false;
   };
   VOpenedAvi OpenAvi( const VBytes& i_rBytes );
-  // The stored payload of a frame; empty when the read failed.
-  VBytes ReadVideo( RapidAVI::VRapidAVIReader& io_rReader, std::uint64_t i_Frame );
-  // The decoded picture of a frame; empty when the read failed.
-  VBytes DecodeVideo( RapidAVI::VRapidAVIReader& io_rReader, std::uint64_t i_Frame );
+  // The stored payload of a frame, or its decoded picture; empty when the read failed.
+  VBytes ReadVideo( RapidAVI::VRapidAVIReader& io_rReader, std::uint64_t i_Frame, bool i_bDecode = false );
 
   // An AVI of ffmpeg's from testsrc2 at 64 x 48, 25 Hz, with these arguments behind the input;
   // empty when there is no ffmpeg.
