@@ -12,25 +12,11 @@
 
 namespace LumekVideoTest
 {
-  VByteWriter& VByteWriter::U8( std::uint8_t i_Value )
+  VByteWriter& VByteWriter::Int( std::uint64_t i_Value, int i_Bytes )
   {
-    Bytes.push_back( i_Value );
+    for( int i = 0; i < i_Bytes; ++i )
+      Bytes.push_back( static_cast< std::uint8_t >( i_Value >> ( 8 * i ) ) );
     return *this;
-  }
-
-  VByteWriter& VByteWriter::U16( std::uint16_t i_Value )
-  {
-    return U8( static_cast< std::uint8_t >( i_Value ) ).U8( static_cast< std::uint8_t >( i_Value >> 8 ) );
-  }
-
-  VByteWriter& VByteWriter::U32( std::uint32_t i_Value )
-  {
-    return U16( static_cast< std::uint16_t >( i_Value ) ).U16( static_cast< std::uint16_t >( i_Value >> 16 ) );
-  }
-
-  VByteWriter& VByteWriter::U64( std::uint64_t i_Value )
-  {
-    return U32( static_cast< std::uint32_t >( i_Value ) ).U32( static_cast< std::uint32_t >( i_Value >> 32 ) );
   }
 
   VByteWriter& VByteWriter::F64( double i_Value )
@@ -46,12 +32,6 @@ namespace LumekVideoTest
     return *this;
   }
 
-  VByteWriter& VByteWriter::Text( const std::string& i_rText )
-  {
-    Bytes.insert( Bytes.end(), i_rText.begin(), i_rText.end() );
-    return *this;
-  }
-
   VByteWriter& VByteWriter::PadTo( std::uint64_t i_Alignment )
   {
     while( Bytes.size() % i_Alignment != 0 )
@@ -59,16 +39,10 @@ namespace LumekVideoTest
     return *this;
   }
 
-  void PatchU32( VBytes& io_rBytes, std::size_t i_Offset, std::uint32_t i_Value )
+  void Patch( VBytes& io_rBytes, std::size_t i_Offset, std::uint64_t i_Value, int i_Bytes )
   {
-    for( int i = 0; i < 4; ++i )
+    for( int i = 0; i < i_Bytes; ++i )
       io_rBytes.at( i_Offset + i ) = static_cast< std::uint8_t >( i_Value >> ( 8 * i ) );
-  }
-
-  void PatchU64( VBytes& io_rBytes, std::size_t i_Offset, std::uint64_t i_Value )
-  {
-    PatchU32( io_rBytes, i_Offset, static_cast< std::uint32_t >( i_Value ) );
-    PatchU32( io_rBytes, i_Offset + 4, static_cast< std::uint32_t >( i_Value >> 32 ) );
   }
 
   VBytes PatternBytes( std::size_t i_Size, std::uint32_t i_Seed )
@@ -204,11 +178,6 @@ namespace LumekVideoTest
   VMemoryRecording::VMemoryRecording( VBytes i_Bytes ) : Bytes( std::move( i_Bytes ) )
   {
     bOpened = Reader.Open( std::make_shared< UtilsIO::VMemoryInputStream >( Bytes.data(), Bytes.size() ) );
-  }
-
-  VBytes BytesOf( const ZOL::IBufferConst& i_rBuffer )
-  {
-    return VBytes( i_rBuffer.GetData(), i_rBuffer.GetData() + i_rBuffer.GetSize() );
   }
 
   std::optional< VFrameBytes > ReadBytes( LumekVideo::VReader& io_rReader, std::uint64_t i_Frame, bool i_bVideo,

@@ -21,21 +21,30 @@ namespace LumekVideoTest
   class VByteWriter
   {
   public:
-    VByteWriter& U8( std::uint8_t i_Value );
-    VByteWriter& U16( std::uint16_t i_Value );
-    VByteWriter& U32( std::uint32_t i_Value );
-    VByteWriter& U64( std::uint64_t i_Value );
+    VByteWriter& Int( std::uint64_t i_Value, int i_Bytes );
+    VByteWriter& U8( std::uint8_t i_Value ) { return Int( i_Value, 1 ); }
+    VByteWriter& U16( std::uint16_t i_Value ) { return Int( i_Value, 2 ); }
+    VByteWriter& U32( std::uint32_t i_Value ) { return Int( i_Value, 4 ); }
+    VByteWriter& U64( std::uint64_t i_Value ) { return Int( i_Value, 8 ); }
     VByteWriter& F64( double i_Value );
     VByteWriter& Raw( const VBytes& i_rBytes );
-    VByteWriter& Text( const std::string& i_rText );
+    VByteWriter& Text( const std::string& i_rText ) { return Raw( VBytes( i_rText.begin(), i_rText.end() ) ); }
     VByteWriter& PadTo( std::uint64_t i_Alignment );
 
     std::size_t Size() const { return Bytes.size(); }
     VBytes Bytes;
   };
 
-  void PatchU32( VBytes& io_rBytes, std::size_t i_Offset, std::uint32_t i_Value );
-  void PatchU64( VBytes& io_rBytes, std::size_t i_Offset, std::uint64_t i_Value );
+  // Overwrites a little-endian number of i_Bytes bytes.
+  void Patch( VBytes& io_rBytes, std::size_t i_Offset, std::uint64_t i_Value, int i_Bytes );
+  inline void PatchU32( VBytes& io_rBytes, std::size_t i_Offset, std::uint32_t i_Value )
+  {
+    Patch( io_rBytes, i_Offset, i_Value, 4 );
+  }
+  inline void PatchU64( VBytes& io_rBytes, std::size_t i_Offset, std::uint64_t i_Value )
+  {
+    Patch( io_rBytes, i_Offset, i_Value, 8 );
+  }
 
   // Deterministic bytes that differ from frame to frame and from seed to seed.
   VBytes PatternBytes( std::size_t i_Size, std::uint32_t i_Seed );
@@ -109,7 +118,10 @@ namespace LumekVideoTest
     bool bOpened = false;
   };
 
-  VBytes BytesOf( const ZOL::IBufferConst& i_rBuffer );
+  inline VBytes BytesOf( const ZOL::IBufferConst& i_rBuffer )
+  {
+    return VBytes( i_rBuffer.GetData(), i_rBuffer.GetData() + i_rBuffer.GetSize() );
+  }
   // What ReadFrameData gave, copied out, or nothing when it failed.
   struct VFrameBytes
   {

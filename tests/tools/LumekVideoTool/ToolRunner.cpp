@@ -30,8 +30,7 @@ namespace LumekVideoToolTest
     // The shell reports a child killed by a signal as 128 + the signal.
     const int Status = std::system( Command.c_str() );
     VRun Run;
-    Run.ExitCode = WIFEXITED( Status ) ? WEXITSTATUS( Status ) : -1;
-    Run.bSignalled = !WIFEXITED( Status ) || Run.ExitCode > 128;
+    Run.ExitCode = WIFEXITED( Status ) && WEXITSTATUS( Status ) <= 128 ? WEXITSTATUS( Status ) : -1;
     const VBytes Out = ReadFileBytes( Streams.Path( "out" ) ), Err = ReadFileBytes( Streams.Path( "err" ) );
     Run.Out.assign( Out.begin(), Out.end() );
     Run.Err.assign( Err.begin(), Err.end() );

@@ -19,8 +19,7 @@ namespace LumekVideoToolTest
 
   struct VRun
   {
-    int ExitCode = -1;
-    bool bSignalled = false;
+    int ExitCode = -1; // -1 for a program killed by a signal
     std::string Out;
     std::string Err;
   };
