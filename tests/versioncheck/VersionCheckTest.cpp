@@ -15,7 +15,6 @@
 
 #include <QApplication>
 #include <QCheckBox>
-#include <QElapsedTimer>
 #include <QEventLoop>
 #include <QPushButton>
 #include <QSettings>
@@ -35,21 +34,16 @@ namespace
   using namespace VersionCheck;
 
   // Runs the event loop until i_Done holds or the time is up; deferred deletes happen on the way.
-  bool RunUntil( const std::function< bool() >& i_Done, int i_Milliseconds = 15000 )
+  // (QTest::qWaitFor sleeps 10 ms a round, which an exchange needs several of.)
+  bool RunUntil( const std::function< bool() >& i_Done )
   {
-    if( i_Done() )
-      return true;
     QEventLoop Loop;
     QTimer Poll;
-    QObject::connect( &Poll, &QTimer::timeout, &Loop,
-                      [&]
-                      {
-                        if( i_Done() )
-                          Loop.quit();
-                      } );
+    QObject::connect( &Poll, &QTimer::timeout, &Loop, [&] { i_Done() ? Loop.quit() : void(); } );
     Poll.start( 5 );
-    QTimer::singleShot( i_Milliseconds, &Loop, &QEventLoop::quit );
-    Loop.exec();
+    QTimer::singleShot( 15000, &Loop, &QEventLoop::quit );
+    if( !i_Done() )
+      Loop.exec();
     return i_Done();
   }
 
