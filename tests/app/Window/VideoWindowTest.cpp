@@ -82,7 +82,6 @@ TEST_F( VideoWindow, OpenShowsTheFirstFrameAndDescribesTheFileAndCloseEmptiesIt 
   EXPECT_EQ( PlayButton()->toolTip(), "Pause video" );
   EXPECT_EQ( Action( EAction::Play )->text(), "Pause" );
   EXPECT_FALSE( Action( EAction::NextFrame )->isEnabled() );
-  EXPECT_TRUE( m_pWindow->GetVideoSettingsDialog()->isHidden() );
   EXPECT_FALSE( m_pWindow->GetVideoSettingsDialog()->GetRevertButton()->isEnabled() );
 
   QTableWidget* pTable = m_pWindow->GetPropertiesDialog()->GetTable();
