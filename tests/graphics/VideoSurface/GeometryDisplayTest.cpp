@@ -73,10 +73,6 @@ namespace
 
     const QImage Picture = Grab();
     const VRGBImage Image = ProcessorPicture( Frame );
-    VRGBImage Expected( 64, 48 );
-    for( int y = 0; y < 10; ++y )
-      for( int x = 0; x < 20; ++x )
-        std::copy( Image.At( x, y ), Image.At( x, y ) + 3, Expected.At( x + 30, y + 5 ) );
     // Inside the image, and the black sensor around it apart from the outline's rows and columns.
     EXPECT_TRUE( SamePicture( Picture, Image, QPoint( Margin + 30, Margin + 5 ), 0, 1 ) );
     int Stray = 0;
@@ -88,7 +84,7 @@ namespace
       }
     EXPECT_EQ( Stray, 0 );
     if( Stray != 0 )
-      SavePictures( Picture, Expected, QPoint( Margin, Margin ) );
+      SavePictures( Picture, Image, QPoint( Margin + 30, Margin + 5 ) );
 
     // With correction on, the outline is the distorted bounds, which even without distortion
     // reach a pixel further up and to the left.

@@ -218,12 +218,13 @@ namespace SurfaceTest
   {
     const ZOL::IVideoFrameInfo& rInfo = i_rFrame.VideoFrameInfo;
     const QSize Size( rInfo.ImageWidth + 2 * Margin, rInfo.ImageHeight + 2 * Margin );
-    if( !i_bNewWidget && m_pWidget )
+    const bool bReuse = !i_bNewWidget && m_pWidget;
+    if( bReuse )
       m_pWidget->setFixedSize( Size );
-    LumekVideoViewer::VGLWidget& rWidget =
-        !i_bNewWidget && m_pWidget ? *m_pWidget : MakeWidget( Size.width(), Size.height() );
+    LumekVideoViewer::VGLWidget& rWidget = bReuse ? *m_pWidget : MakeWidget( Size.width(), Size.height() );
     rWidget.SetScaleMode( LumekVideoViewer::ScaleOneToOne );
-    if( i_Decoder != LumekVideoViewer::Hardware )
+    // A new widget starts in Hardware mode, as the viewer's does.
+    if( bReuse || i_Decoder != LumekVideoViewer::Hardware )
       rWidget.SetDecoder( i_Decoder );
     rWidget.PrepareFrame( 0, rInfo, i_rFrame, false );
     return rWidget;
