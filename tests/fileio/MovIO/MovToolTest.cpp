@@ -30,7 +30,7 @@ namespace
   }
 } // namespace
 
-TEST( MovTool, DumpsTheAtomTreeAndConvertsToLvidWithPicturesAudioAndTimecode )
+TEST( MovTool, DumpsTheAtomTreeAndConvertsToLvidKeepingPicturesAudioAndTimecode )
 {
   if( !LumekTest::HaveFfmpeg() )
     GTEST_SKIP() << "ffmpeg is not installed";
@@ -39,12 +39,11 @@ TEST( MovTool, DumpsTheAtomTreeAndConvertsToLvidWithPicturesAudioAndTimecode )
                             "sine=f=440:r=48000", "-frames:v", "10", "-c:v", "rawvideo", "-pix_fmt", "uyvy422", "-c:a",
                             "pcm_s16le", "-shortest", "-timecode", "01:02:03:04" } );
   ASSERT_FALSE( Path.empty() );
+  // The tool's dump command prints the reader's atom tree (its whole text is MovAtomTree's).
   int ExitCode = -1;
   const std::string Dump = Tool( "dump " + LumekTest::ShellQuote( Path ), ExitCode );
   EXPECT_EQ( ExitCode, 0 ) << Dump;
-  for( const char* pLine :
-       { "\n moov\n  mvhd\n  trak\n   tkhd\n", "\n      tmcd\n       tcmi\n", "\n      stsd\n", "\n mdat\n" } )
-    EXPECT_NE( Dump.find( pLine ), std::string::npos ) << pLine << " in\n" << Dump;
+  EXPECT_NE( Dump.find( "\n moov\n  mvhd\n  trak\n   tkhd\n" ), std::string::npos ) << Dump;
 
   const boost::filesystem::path Folder =
       boost::filesystem::temp_directory_path() / boost::filesystem::unique_path( "movtool-%%%%%%%%" );

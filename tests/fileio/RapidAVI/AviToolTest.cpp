@@ -1,5 +1,5 @@
-// lumekvideotool on AVI files: "dump" prints the chunk tree, and "convert" to .lvid keeps the
-// pictures and the audio that the AVI reader gives.
+// lumekvideotool's "convert" of an AVI file to .lvid keeps the pictures and the audio that the
+// AVI reader gives; the chunk tree it dumps is the reader's (AviDump).
 
 #include "tests/support/FfmpegFixtures.h"
 
@@ -35,7 +35,7 @@ namespace
   }
 } // namespace
 
-TEST( AviTool, DumpsTheChunkTreeAndConvertsToLvidWithPicturesAndAudio )
+TEST( AviTool, ConvertToLvidKeepsPicturesAndAudio )
 {
   if( !LumekTest::HaveFfmpeg() )
     GTEST_SKIP() << "ffmpeg is not installed";
@@ -45,11 +45,6 @@ TEST( AviTool, DumpsTheChunkTreeAndConvertsToLvidWithPicturesAndAudio )
                                                       "-pix_fmt", "uyvy422", "-c:a", "pcm_s16le", "-shortest" } );
   ASSERT_FALSE( Path.empty() );
   int ExitCode = -1;
-  const std::string Dump = Tool( "dump " + LumekTest::ShellQuote( Path ), ExitCode );
-  EXPECT_EQ( ExitCode, 0 ) << Dump;
-  for( const char* pName : { "hdrl", "avih", "strl", "strh", "strf", "movi", "idx1" } )
-    EXPECT_NE( Dump.find( pName ), std::string::npos ) << pName << " in\n" << Dump;
-
   const boost::filesystem::path Folder =
       boost::filesystem::temp_directory_path() / boost::filesystem::unique_path( "avitool-%%%%%%%%" );
   boost::filesystem::create_directories( Folder );
