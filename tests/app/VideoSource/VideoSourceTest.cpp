@@ -56,8 +56,6 @@ TEST( VideoSource, CountsMissingFramesAndReadsWhatIsThere )
   ASSERT_TRUE( Source.Open( Recording.Path ) );
   EXPECT_EQ( Source.GetFrameCount(), 6u );
   EXPECT_EQ( Source.GetMissingFrameCount(), 3 );
-  EXPECT_DOUBLE_EQ( Source.GetFrameRate(), 50.0 );
-  EXPECT_DOUBLE_EQ( Source.GetDurationInSeconds(), 0.12 );
 
   ZOL::IVideoFrame Frame;
   EXPECT_FALSE( Source.GetFrame( 3, Frame ) );
@@ -100,13 +98,11 @@ TEST( VideoSource, LensDistortionNeedsBothRecords )
   const VTempRecording LensOnly( Spec );
   VVideoSource Source;
   ASSERT_TRUE( Source.Open( LensOnly.Path ) );
-  EXPECT_EQ( Source.GetLensDistortionCalibration().RadialDistortionCentre_X, 4.0 );
   EXPECT_FALSE( Source.HasLensDistortion() );
 
   Spec.bCamera = true;
   const VTempRecording Both( Spec );
   ASSERT_TRUE( Source.Open( Both.Path ) );
-  EXPECT_EQ( Source.GetCameraHardware().SerialNumber, "WT-1" );
   EXPECT_TRUE( Source.HasLensDistortion() );
   Source.Close();
   EXPECT_TRUE( Source.HasLensDistortion() ); // kept until the next open
