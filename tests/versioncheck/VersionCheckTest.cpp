@@ -56,25 +56,17 @@ namespace
   };
 
   // The application's settings over the test's store, with each check's outcome kept aside.
-  class VRecordingSettings : public IVersionCheckSettings
+  struct VRecordingSettings : public VVersionCheckSettings
   {
-  public:
-    explicit VRecordingSettings( QSettings* i_pStore ) : m_Settings( i_pStore, "LumekVideoViewer", false ) {}
-    std::string GetMessageId() const override { return m_Settings.GetMessageId(); }
-    void SetMessageId( const std::string& i_rId ) override { m_Settings.SetMessageId( i_rId ); }
-    bool GetShowOnStartup() const override { return m_Settings.GetShowOnStartup(); }
-    void SetShowOnStartup( bool i_bShow ) override { m_Settings.SetShowOnStartup( i_bShow ); }
+    explicit VRecordingSettings( QSettings* i_pStore ) : VVersionCheckSettings( i_pStore, "LumekVideoViewer", false ) {}
     void Report( int i_Status, const std::string& i_rBody, const std::string& i_rType,
                  const std::string& i_rError ) override
     {
       Outcomes.push_back( { i_Status, i_rBody, i_rType, i_rError } );
-      m_Settings.Report( i_Status, i_rBody, i_rType, i_rError );
+      VVersionCheckSettings::Report( i_Status, i_rBody, i_rType, i_rError );
     }
 
     std::vector< IOutcome > Outcomes;
-
-  private:
-    VVersionCheckSettings m_Settings;
   };
 
   struct IShownDialog
