@@ -3,29 +3,28 @@
 
 #include "app/VideoSource/VVideoSource.h"
 #include "fileio/H264IO/VH264Decoder.h"
-#include "fileio/VideoEncoding/VideoFrameDecoder.h"
 #include "tests/fileio/H264/H264TestSupport.h"
 #include "tests/support/FfmpegFixtures.h"
 
 #include <gtest/gtest.h>
-
-#include <cstring>
 
 namespace
 {
   using namespace LumekTest;
   using LumekVideoViewer::VVideoSource;
 
-  std::shared_ptr< ZOL::IH264Decoder > MakeDecoder()
+  // One decode of one access unit by a decoder made for it, or by the one given.
+  struct VDecode
   {
-    return H264IO::VH264Decoder::Create( std::make_shared< ZOL::VFrameBufferAllocator >() );
-  }
-
-  bool Decode( ZOL::IH264Decoder& io_rDecoder, const VBytes& i_rUnit, ZOL::EPixelFormat i_Wish,
-               std::shared_ptr< ZOL::IBuffer >& o_rOutput, ZOL::IVideoFrameInfo& o_rInfo )
-  {
-    return io_rDecoder.Decode( VBytesBuffer( i_rUnit ), i_Wish, o_rOutput, o_rInfo );
-  }
+    VDecode( const VBytes& i_rUnit, ZOL::EPixelFormat i_Wish, ZOL::IH264Decoder* i_pDecoder = nullptr )
+    {
+      const auto pOwn = H264IO::VH264Decoder::Create( std::make_shared< ZOL::VFrameBufferAllocator >() );
+      bDecoded = ( i_pDecoder ? *i_pDecoder : *pOwn ).Decode( VBytesBuffer( i_rUnit ), i_Wish, pOutput, Info );
+    }
+    bool bDecoded;
+    std::shared_ptr< ZOL::IBuffer > pOutput;
+    ZOL::IVideoFrameInfo Info;
+  };
 
   class H264Decoder : public ::testing::Test
   {
@@ -39,35 +38,25 @@ namespace
 
   TEST_F( H264Decoder, EveryFrameEqualsFfmpegs )
   {
-    struct VCase
+    // 98 x 62 is not a whole number of macroblocks: the stream crops.
+    const std::tuple< std::int32_t, std::int32_t, const char* > Cases[] = {
+        { 64, 48, "baseline" }, { 176, 144, "baseline" }, { 98, 62, "baseline" }, { 80, 48, "main" } };
+    for( const auto& [Width, Height, pProfile] : Cases )
     {
-      const char* Name;
-      std::int32_t Width, Height;
-      const char* Profile;
-    };
-    const VCase Cases[] = { { "Baseline64x48", 64, 48, "baseline" },
-                            { "Baseline176x144", 176, 144, "baseline" },
-                            // Not a whole number of macroblocks: the stream crops.
-                            { "Baseline98x62", 98, 62, "baseline" },
-                            { "MainCabac80x48", 80, 48, "main" } };
-    for( const VCase& rCase : Cases )
-    {
-      SCOPED_TRACE( rCase.Name );
-      const VH264Stream Stream = MakeH264Stream( rCase.Width, rCase.Height, 12, 5, { "-profile:v", rCase.Profile } );
+      SCOPED_TRACE( std::string( pProfile ) + " " + std::to_string( Width ) + "x" + std::to_string( Height ) );
+      const VH264Stream Stream = MakeH264Stream( Width, Height, 12, 5, { "-profile:v", pProfile } );
       const std::vector< VBytes > Expected = ExpectedUYVYFrames( Stream );
       ASSERT_EQ( Stream.AccessUnits.size(), 12u );
       ASSERT_EQ( Expected.size(), 12u );
-      const auto pDecoder = MakeDecoder();
-      ASSERT_TRUE( pDecoder );
+      const auto pDecoder = H264IO::VH264Decoder::Create( std::make_shared< ZOL::VFrameBufferAllocator >() );
       for( std::size_t i = 0; i < Stream.AccessUnits.size(); ++i )
       {
-        std::shared_ptr< ZOL::IBuffer > pOutput;
-        ZOL::IVideoFrameInfo Info;
-        ASSERT_TRUE( Decode( *pDecoder, Stream.AccessUnits[i], ZOL::PixelFormat_U8Y8V8Y8, pOutput, Info ) ) << i;
-        EXPECT_EQ( Info.ImageWidth, rCase.Width );
-        EXPECT_EQ( Info.ImageHeight, rCase.Height );
-        EXPECT_EQ( Info.PixelFormat, ZOL::PixelFormat_U8Y8V8Y8 );
-        EXPECT_EQ( Bytes( *pOutput ), Expected[i] ) << "frame " << i;
+        const VDecode Frame( Stream.AccessUnits[i], ZOL::PixelFormat_U8Y8V8Y8, pDecoder.get() );
+        ASSERT_TRUE( Frame.bDecoded ) << i;
+        EXPECT_EQ( Frame.Info.ImageWidth, Width );
+        EXPECT_EQ( Frame.Info.ImageHeight, Height );
+        EXPECT_EQ( Frame.Info.PixelFormat, ZOL::PixelFormat_U8Y8V8Y8 );
+        EXPECT_EQ( Bytes( *Frame.pOutput ), Expected[i] ) << "frame " << i;
       }
     }
   }
@@ -76,50 +65,34 @@ namespace
   {
     const VH264Stream Stream = MakeH264Stream( 64, 48, 12, 5 );
     const std::vector< VBytes > Expected = ExpectedUYVYFrames( Stream );
-    ASSERT_GE( Expected.size(), 2u );
-    const auto pDecoder = MakeDecoder();
-    std::shared_ptr< ZOL::IBuffer > pOutput;
-    ZOL::IVideoFrameInfo Info;
-    ASSERT_TRUE( Decode( *pDecoder, Stream.AccessUnits[0], ZOL::PixelFormat_Y8U8Y8V8, pOutput, Info ) );
-    EXPECT_EQ( Info.PixelFormat, ZOL::PixelFormat_Y8U8Y8V8 );
+    ASSERT_FALSE( Expected.empty() );
     VBytes Swapped = Expected[0];
     for( std::size_t i = 0; i + 1 < Swapped.size(); i += 2 )
       std::swap( Swapped[i], Swapped[i + 1] );
-    EXPECT_EQ( Bytes( *pOutput ), Swapped );
-    ASSERT_TRUE( Decode( *pDecoder, Stream.AccessUnits[1], ZOL::PixelFormat_R8G8B8, pOutput, Info ) );
-    EXPECT_EQ( Info.PixelFormat, ZOL::PixelFormat_U8Y8V8Y8 );
-    EXPECT_EQ( Bytes( *pOutput ), Expected[1] );
-
-    // The frame decoder hands the decoded frame over in place of the payload.
-    std::shared_ptr< ZOL::IBuffer > pBuffer;
-    auto pAllocator = std::make_shared< ZOL::VFrameBufferAllocator >();
-    pAllocator->Allocate( pBuffer, Stream.AccessUnits[0].size() );
-    std::memcpy( pBuffer->GetData(), Stream.AccessUnits[0].data(), Stream.AccessUnits[0].size() );
-    Info.PixelFormat = ZOL::PixelFormat_U8Y8V8Y8;
-    ASSERT_TRUE( VideoEncoding::VideoFrameDecoder( ZOL::VideoPayload_VideoH264, Info, pBuffer, pAllocator, pAllocator,
-                                                   MakeDecoder() ) );
-    EXPECT_EQ( Bytes( *pBuffer ), Expected[0] );
+    const VDecode Other( Stream.AccessUnits[0], ZOL::PixelFormat_Y8U8Y8V8 );
+    ASSERT_TRUE( Other.bDecoded );
+    EXPECT_EQ( Other.Info.PixelFormat, ZOL::PixelFormat_Y8U8Y8V8 );
+    EXPECT_EQ( Bytes( *Other.pOutput ), Swapped );
+    const VDecode Any( Stream.AccessUnits[0], ZOL::PixelFormat_R8G8B8 );
+    ASSERT_TRUE( Any.bDecoded );
+    EXPECT_EQ( Any.Info.PixelFormat, ZOL::PixelFormat_U8Y8V8Y8 );
+    EXPECT_EQ( Bytes( *Any.pOutput ), Expected[0] );
   }
 
   TEST_F( H264Decoder, UnitsWithoutAPictureGiveNoFrameAndSaySo )
   {
     const VH264Stream Stream = MakeH264Stream( 64, 48, 12, 5 );
-    VBytes ParameterSets = JoinNALUnits( UnitsOfType( Stream.AccessUnits.at( 0 ), 7 ), false );
-    const VBytes PPS = JoinNALUnits( UnitsOfType( Stream.AccessUnits[0], 8 ), false );
-    ParameterSets.insert( ParameterSets.end(), PPS.begin(), PPS.end() );
-    const VBytes Garbage = { 0, 0, 0, 1, 0x65, 0xFF, 0x13, 0x00, 0x42, 0x99, 0, 0, 1, 0x41, 0x9A };
-    std::shared_ptr< ZOL::IBuffer > pOutput;
-    ZOL::IVideoFrameInfo Info;
-    {
-      VLogCapture Log( "H264IO" );
-      EXPECT_FALSE( Decode( *MakeDecoder(), ParameterSets, ZOL::PixelFormat_U8Y8V8Y8, pOutput, Info ) );
-      EXPECT_FALSE( pOutput );
-      EXPECT_TRUE( Log.Contains( "Could not decode frame. Buffer status was 0, not 1." ) );
-    }
+    std::vector< VBytes > Sets = UnitsOfType( Stream.AccessUnits.at( 0 ), 7 );
+    Sets.push_back( UnitsOfType( Stream.AccessUnits[0], 8 ).at( 0 ) );
     VLogCapture Log( "H264IO" );
-    EXPECT_FALSE( Decode( *MakeDecoder(), Garbage, ZOL::PixelFormat_U8Y8V8Y8, pOutput, Info ) );
-    EXPECT_FALSE( pOutput );
-    EXPECT_FALSE( Log.Messages.empty() );
+    const VDecode ParameterSets( JoinNALUnits( Sets, false ), ZOL::PixelFormat_U8Y8V8Y8 );
+    EXPECT_FALSE( ParameterSets.bDecoded || ParameterSets.pOutput );
+    EXPECT_TRUE( Log.Has( "Could not decode frame. Buffer status was 0, not 1." ) );
+    const std::size_t LinesBefore = Log.Messages.size();
+    const VDecode Garbage( { 0, 0, 0, 1, 0x65, 0xFF, 0x13, 0x00, 0x42, 0x99, 0, 0, 1, 0x41, 0x9A },
+                           ZOL::PixelFormat_U8Y8V8Y8 );
+    EXPECT_FALSE( Garbage.bDecoded || Garbage.pOutput );
+    EXPECT_GT( Log.Messages.size(), LinesBefore );
   }
 
   TEST_F( H264Decoder, OddSizedStreamNeverGivesAnOddFrame )
@@ -129,22 +102,18 @@ namespace
     // even-size line instead. Either way no frame of odd size comes out.
     const VH264Stream Stream = MakeH264Stream( 33, 17, 4, 2, { "-profile:v", "high" }, "gray" );
     ASSERT_EQ( Stream.AccessUnits.size(), 4u );
-    const auto pDecoder = MakeDecoder();
+    const auto pDecoder = H264IO::VH264Decoder::Create( std::make_shared< ZOL::VFrameBufferAllocator >() );
     VLogCapture Log( "H264IO" );
     for( const VBytes& rUnit : Stream.AccessUnits )
     {
-      std::shared_ptr< ZOL::IBuffer > pOutput;
-      ZOL::IVideoFrameInfo Info;
-      if( !Decode( *pDecoder, rUnit, ZOL::PixelFormat_U8Y8V8Y8, pOutput, Info ) )
-      {
-        EXPECT_TRUE( Log.Contains( "Decoder produced a frame of dimensions 33 x 17. Only frames with even width and "
-                                   "height are supported." ) );
-        continue;
-      }
-      EXPECT_EQ( Info.ImageWidth % 2, 0 );
-      EXPECT_EQ( Info.ImageHeight % 2, 0 );
-      ASSERT_TRUE( pOutput );
-      EXPECT_EQ( pOutput->GetSize(), std::uint64_t( Info.ImageWidth ) * Info.ImageHeight * 2 );
+      const VDecode Frame( rUnit, ZOL::PixelFormat_U8Y8V8Y8, pDecoder.get() );
+      if( !Frame.bDecoded )
+        EXPECT_TRUE( Log.Has( "Decoder produced a frame of dimensions 33 x 17. Only frames with even width and "
+                              "height are supported." ) );
+      else
+        EXPECT_TRUE( Frame.Info.ImageWidth % 2 == 0 && Frame.Info.ImageHeight % 2 == 0 && Frame.pOutput &&
+                     Frame.pOutput->GetSize() == std::uint64_t( Frame.Info.ImageWidth ) * Frame.Info.ImageHeight * 2 )
+            << Frame.Info.ImageWidth << " x " << Frame.Info.ImageHeight;
     }
   }
 
@@ -163,18 +132,19 @@ namespace
       ASSERT_EQ( Expected.size(), 80u );
     }
 
-    std::shared_ptr< VMemoryH264Reader > Open( VVideoSource& io_rSource, const VH264Stream& i_rStream,
+    std::shared_ptr< VMemoryH264Reader > Open( const VH264Stream& i_rStream,
                                                const std::vector< std::uint64_t >& i_rNumbers = {} )
     {
       auto pReader = std::make_shared< VMemoryH264Reader >( i_rStream, i_rNumbers );
-      EXPECT_TRUE( io_rSource.Open( "memory.h264", pReader ) );
+      Source = std::make_unique< VVideoSource >();
+      EXPECT_TRUE( Source->Open( "memory.h264", pReader ) );
       return pReader;
     }
 
-    ::testing::AssertionResult FrameIs( VVideoSource& io_rSource, std::uint64_t i_Index, std::size_t i_Expected )
+    ::testing::AssertionResult FrameIs( std::uint64_t i_Index, std::size_t i_Expected )
     {
       ZOL::IVideoFrame Frame;
-      if( !io_rSource.GetFrame( i_Index, Frame ) || !Frame.Video )
+      if( !Source->GetFrame( i_Index, Frame ) || !Frame.Video )
         return ::testing::AssertionFailure() << "frame " << i_Index << " did not decode";
       if( Bytes( *Frame.Video ) != Expected[i_Expected] )
         return ::testing::AssertionFailure() << "frame " << i_Index << " differs from ffmpeg's";
@@ -183,26 +153,26 @@ namespace
 
     VH264Stream Stream;
     std::vector< VBytes > Expected;
+    std::unique_ptr< VVideoSource > Source;
   };
 
   TEST_F( H264RandomAccess, JumpsGiveFfmpegsFrames )
   {
-    const std::vector< std::vector< std::uint64_t > > Jumps = {
-        { 45 },
-        { 29 },
-        { 30 },
-        { 31 },
-        { 79 },                               // alone: mid-group, around a key frame, the last
-        { 62, 61, 60, 59, 31, 30, 29, 1, 0 }, // backwards
-        { 3, 17, 18, 28 },                    // forward within a group
-        { 5, 70, 33, 34, 35, 2 },             // across groups
-    };
+    // Alone mid-group, around a key frame and at the end; backwards; forward within a group;
+    // across groups.
+    const std::vector< std::vector< std::uint64_t > > Jumps = { { 45 },
+                                                                { 29 },
+                                                                { 30 },
+                                                                { 31 },
+                                                                { 79 },
+                                                                { 62, 61, 60, 59, 31, 30, 29, 1, 0 },
+                                                                { 3, 17, 18, 28 },
+                                                                { 5, 70, 33, 34, 35, 2 } };
     for( const std::vector< std::uint64_t >& rJump : Jumps )
     {
-      VVideoSource Source;
-      Open( Source, Stream );
+      Open( Stream );
       for( std::uint64_t Index : rJump )
-        EXPECT_TRUE( FrameIs( Source, Index, Index ) ) << "jumping " << ::testing::PrintToString( rJump );
+        EXPECT_TRUE( FrameIs( Index, Index ) ) << "jumping " << ::testing::PrintToString( rJump );
     }
   }
 
@@ -216,16 +186,14 @@ namespace
       Holes.push_back( i + ( i >= 10 ? 5 : 0 ) + ( i >= 50 ? 100 : 0 ) );
     for( const std::vector< std::uint64_t >& rNumbers : { std::vector< std::uint64_t >(), Holes } )
     {
-      VVideoSource Source;
-      const auto pReader = Open( Source, Stream, rNumbers );
+      const auto pReader = Open( Stream, rNumbers );
       for( std::uint64_t i = 0; i < 80; ++i )
-        ASSERT_TRUE( FrameIs( Source, rNumbers.empty() ? i : rNumbers[i], i ) );
+        ASSERT_TRUE( FrameIs( rNumbers.empty() ? i : rNumbers[i], i ) );
       EXPECT_EQ( pReader->Reads, 81u );
     }
     // A jump into the second hole's far side still finds the key frame before it.
-    VVideoSource Source;
-    Open( Source, Stream, Holes );
-    EXPECT_TRUE( FrameIs( Source, Holes[55], 55 ) );
+    Open( Stream, Holes );
+    EXPECT_TRUE( FrameIs( Holes[55], 55 ) );
   }
 
   TEST_F( H264RandomAccess, AStreamCutInsideAGroupPlaysFromItsNextKeyFrame )
@@ -234,14 +202,13 @@ namespace
     // original 30) is a key frame and everything from there matches.
     VH264Stream Tail = Stream;
     Tail.AccessUnits.erase( Tail.AccessUnits.begin(), Tail.AccessUnits.begin() + 10 );
-    VVideoSource Source;
-    Open( Source, Tail );
+    Open( Tail );
     ZOL::IVideoFrame Frame;
-    EXPECT_FALSE( Source.GetFrame( 5, Frame ) );
-    EXPECT_TRUE( FrameIs( Source, 21, 31 ) );
-    EXPECT_TRUE( FrameIs( Source, 20, 30 ) );
+    EXPECT_FALSE( Source->GetFrame( 5, Frame ) );
+    EXPECT_TRUE( FrameIs( 21, 31 ) );
+    EXPECT_TRUE( FrameIs( 20, 30 ) );
     for( std::uint64_t i = 21; i < 70; ++i )
-      ASSERT_TRUE( FrameIs( Source, i, i + 10 ) );
+      ASSERT_TRUE( FrameIs( i, i + 10 ) );
   }
 
   TEST_F( H264RandomAccess, NoKeyFrameWithinReachIsAFalseAnswer )
@@ -251,14 +218,13 @@ namespace
     VH264Stream Long = Stream;
     Long.AccessUnits.resize( 1 );
     Long.AccessUnits.insert( Long.AccessUnits.end(), 1500, Stream.AccessUnits[1] );
-    VVideoSource Source;
-    const auto pReader = Open( Source, Long );
+    const auto pReader = Open( Long );
     VLogCapture Log( "H264IO" );
     ZOL::IVideoFrame Frame;
-    EXPECT_FALSE( Source.GetFrame( 1400, Frame ) );
-    EXPECT_TRUE( Log.Contains( "No key frame within 1200 frames before frame 1400." ) );
+    EXPECT_FALSE( Source->GetFrame( 1400, Frame ) );
+    EXPECT_TRUE( Log.Has( "No key frame within 1200 frames before frame 1400." ) );
     EXPECT_EQ( pReader->Reads, 1200u );
-    EXPECT_TRUE( FrameIs( Source, 0, 0 ) );
-    EXPECT_TRUE( FrameIs( Source, 1, 1 ) );
+    EXPECT_TRUE( FrameIs( 0, 0 ) );
+    EXPECT_TRUE( FrameIs( 1, 1 ) );
   }
 } // namespace

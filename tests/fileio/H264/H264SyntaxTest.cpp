@@ -9,6 +9,7 @@
 
 #include <gtest/gtest.h>
 
+#include <array>
 #include <random>
 #include <sstream>
 
@@ -76,38 +77,33 @@ namespace
 
   TEST( BitStream, RandomSyntaxSurvivesTheRoundTrip )
   {
+    // Mostly zeros and small values, so that zero pairs and escapes are frequent.
     std::mt19937 Random( 11 );
-    struct VItem
-    {
-      int Kind; // bits, ue, se
-      std::uint32_t Value;
-      unsigned Bits;
-    };
-    std::vector< VItem > Items;
+    std::vector< std::array< std::uint32_t, 3 > > Items; // kind (bits, ue, se), value, bit count
     VOutputBitStream Out;
     for( int i = 0; i < 5000; ++i )
     {
-      // Mostly zeros and small values, so that zero pairs and escapes are frequent.
-      VItem Item{ static_cast< int >( Random() % 3 ), 0, 1 + static_cast< unsigned >( Random() % 32 ) };
-      Item.Value = Random() % 4 == 0 ? static_cast< std::uint32_t >( Random() ) : Random() % 4;
-      if( Item.Kind == 0 )
-        Out.WriteBits( Item.Value &= Item.Bits == 32 ? 0xFFFFFFFFu : ( 1u << Item.Bits ) - 1, Item.Bits );
-      else if( Item.Kind == 1 )
-        Out.WriteUE( Item.Value = std::min< std::uint32_t >( Item.Value, 0xFFFFFFFE ) );
+      const std::uint32_t Kind = Random() % 3, Bits = 1 + Random() % 32;
+      std::uint32_t Value = Random() % 4 == 0 ? static_cast< std::uint32_t >( Random() ) : Random() % 4;
+      if( Kind == 0 )
+        Out.WriteBits( Value &= Bits == 32 ? 0xFFFFFFFFu : ( 1u << Bits ) - 1, Bits );
+      else if( Kind == 1 )
+        Out.WriteUE( Value = std::min< std::uint32_t >( Value, 0xFFFFFFFE ) );
       else
-        Out.WriteSE( static_cast< std::int32_t >( Item.Value ) );
-      Items.push_back( Item );
+        Out.WriteSE( static_cast< std::int32_t >( Value ) );
+      Items.push_back( { Kind, Value, Bits } );
     }
     Out.WriteTrailingBits();
     const VBytes Bytes = Out.Emit();
     VInputBitStream In( Bytes.data(), Bytes.size() );
     for( std::size_t i = 0; i < Items.size(); ++i )
     {
-      const VItem& r = Items[i];
-      const std::uint32_t Read = r.Kind == 0   ? In.ReadBits( r.Bits )
-                                 : r.Kind == 1 ? In.ReadUE()
-                                               : static_cast< std::uint32_t >( In.ReadSE() );
-      ASSERT_EQ( Read, r.Value ) << "item " << i;
+      const auto [Kind, Value, Bits] = Items[i];
+      ASSERT_EQ( Kind == 0   ? In.ReadBits( Bits )
+                 : Kind == 1 ? In.ReadUE()
+                             : std::uint32_t( In.ReadSE() ),
+                 Value )
+          << "item " << i;
     }
     EXPECT_TRUE( In.ReadTrailingBits() );
     EXPECT_TRUE( In.IsValid() );
@@ -141,20 +137,17 @@ namespace
                                              "Bit position of a buffer is not a whole number of bytes." } ) );
   }
 
-  struct VStreamUtils : public ::testing::Test
+  std::shared_ptr< ZOL::IBuffer > Prefixed( const VBytes& i_rAnnexB, ZOL::IBufferAllocator& io_rAllocator )
   {
-    std::shared_ptr< ZOL::VReaderBufferAllocator > pAllocator = std::make_shared< ZOL::VReaderBufferAllocator >();
+    std::shared_ptr< ZOL::IBuffer > pOut;
+    EXPECT_TRUE( AnnexBToLengthPrefixed( i_rAnnexB.data(), i_rAnnexB.size(), pOut, io_rAllocator ) );
+    return pOut;
+  }
 
-    std::shared_ptr< ZOL::IBuffer > Prefixed( const VBytes& i_rAnnexB )
-    {
-      std::shared_ptr< ZOL::IBuffer > pOut;
-      EXPECT_TRUE( AnnexBToLengthPrefixed( i_rAnnexB.data(), i_rAnnexB.size(), pOut, *pAllocator ) );
-      return pOut;
-    }
-  };
-
-  TEST_F( VStreamUtils, RealAccessUnitsConvertBothWaysAndAreInspected )
+  TEST( StreamUtils, RealAccessUnitsConvertBothWaysAndAreInspected )
   {
+    const auto pAllocator = std::make_shared< ZOL::VReaderBufferAllocator >();
+    ZOL::VReaderBufferAllocator& Allocator = *pAllocator;
     if( !HaveFfmpeg() )
       GTEST_SKIP() << "ffmpeg is not installed";
     const VH264Stream Stream = MakeH264Stream( 64, 48, 12, 5 );
@@ -162,16 +155,16 @@ namespace
     for( const VBytes& rUnit : Stream.AccessUnits )
     {
       const std::vector< VBytes > Units = SplitNALUnits( rUnit );
-      const auto pPrefixed = Prefixed( rUnit );
+      const auto pPrefixed = Prefixed( rUnit, Allocator );
       ASSERT_TRUE( pPrefixed );
       EXPECT_EQ( Bytes( *pPrefixed ), JoinNALUnits( Units, true ) );
       std::shared_ptr< ZOL::IBuffer > pAnnexB;
-      ASSERT_TRUE( LengthPrefixedToAnnexB( pPrefixed->GetData(), pPrefixed->GetSize(), pAnnexB, *pAllocator ) );
+      ASSERT_TRUE( LengthPrefixedToAnnexB( pPrefixed->GetData(), pPrefixed->GetSize(), pAnnexB, Allocator ) );
       EXPECT_EQ( Bytes( *pAnnexB ), JoinNALUnits( Units, false ) );
     }
     // Key frames every 5: the IDR slice and the parameter sets are found in both forms.
-    const auto pKey = Prefixed( Stream.AccessUnits[5] );
-    const auto pOther = Prefixed( Stream.AccessUnits[6] );
+    const auto pKey = Prefixed( Stream.AccessUnits[5], Allocator );
+    const auto pOther = Prefixed( Stream.AccessUnits[6], Allocator );
     EXPECT_TRUE( ContainsNALUnit( *pKey, H264NALUnitType_CodedSliceIDR ) );
     EXPECT_TRUE( ContainsNALUnit( *pKey, H264NALUnitType_SPS ) );
     EXPECT_FALSE( ContainsNALUnit( *pOther, H264NALUnitType_CodedSliceIDR ) );
@@ -185,34 +178,37 @@ namespace
     EXPECT_EQ( SliceType, 'P' );
   }
 
-  TEST_F( VStreamUtils, StartCodesLengthsAndJoins )
+  TEST( StreamUtils, StartCodesLengthsAndJoins )
   {
+    const auto pAllocator = std::make_shared< ZOL::VReaderBufferAllocator >();
+    ZOL::VReaderBufferAllocator& Allocator = *pAllocator;
     // Junk before the first start code is no unit; a 3-byte code is as good as a 4-byte one.
     const VBytes Input = { 0xAA, 0, 0, 1, 0x09, 0xF0, 0, 0, 0, 1, 0x67, 0x42, 0, 0, 1, 0x68 };
-    EXPECT_EQ( Bytes( *Prefixed( Input ) ), JoinNALUnits( { { 0x09, 0xF0 }, { 0x67, 0x42 }, { 0x68 } }, true ) );
+    EXPECT_EQ( Bytes( *Prefixed( Input, Allocator ) ),
+               JoinNALUnits( { { 0x09, 0xF0 }, { 0x67, 0x42 }, { 0x68 } }, true ) );
 
     // Lengths that do not walk exactly to the end are refused, at every cut.
     std::shared_ptr< ZOL::IBuffer > pOut;
-    EXPECT_TRUE( LengthPrefixedToAnnexB( nullptr, 0, pOut, *pAllocator ) );
+    EXPECT_TRUE( LengthPrefixedToAnnexB( nullptr, 0, pOut, Allocator ) );
     ASSERT_TRUE( pOut );
     EXPECT_EQ( pOut->GetSize(), 0u );
     const VBytes Sample = JoinNALUnits( { { 0x65, 1, 2, 3 }, { 0x41, 9 } }, true );
     for( std::size_t Cut = 1; Cut < Sample.size(); ++Cut )
-      EXPECT_EQ( LengthPrefixedToAnnexB( Sample.data(), Cut, pOut, *pAllocator ), Cut == 8 ) << "cut " << Cut;
+      EXPECT_EQ( LengthPrefixedToAnnexB( Sample.data(), Cut, pOut, Allocator ), Cut == 8 ) << "cut " << Cut;
     VBytes Lying = Sample;
     Lying[0] = 0xFF; // a length of four gigabytes
-    EXPECT_FALSE( LengthPrefixedToAnnexB( Lying.data(), Lying.size(), pOut, *pAllocator ) );
+    EXPECT_FALSE( LengthPrefixedToAnnexB( Lying.data(), Lying.size(), pOut, Allocator ) );
     EXPECT_FALSE( ContainsNALUnit( VBytesBuffer( Lying ), H264NALUnitType_CodedSliceNonIDR ) );
 
     // One buffer is handed over as it is; more are copied together.
     std::shared_ptr< ZOL::IBuffer > pPart;
-    pAllocator->Allocate( pPart, 3 );
+    Allocator.Allocate( pPart, 3 );
     VBufferList List = { pPart };
-    EXPECT_EQ( JoinBuffers( List, *pAllocator ).get(), pPart.get() );
+    EXPECT_EQ( JoinBuffers( List, Allocator ).get(), pPart.get() );
     EXPECT_TRUE( List.empty() );
     std::copy_n( VBytes{ 0x65, 0x88, 0x80 }.begin(), 3, pPart->GetData() );
     List = { StartCodeBuffer(), pPart, StartCodeBuffer(), pPart };
-    EXPECT_EQ( Bytes( *JoinBuffers( List, *pAllocator ) ),
+    EXPECT_EQ( Bytes( *JoinBuffers( List, Allocator ) ),
                JoinNALUnits( { { 0x65, 0x88, 0x80 }, { 0x65, 0x88, 0x80 } }, false ) );
     EXPECT_TRUE( List.empty() );
   }

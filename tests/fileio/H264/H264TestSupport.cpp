@@ -129,7 +129,6 @@ namespace LumekTest
 
   VMemoryH264Reader::VMemoryH264Reader( const VH264Stream& i_rStream,
                                         const std::vector< std::uint64_t >& i_rFrameNumbers )
-      : m_pAllocator( std::make_shared< ZOL::VReaderBufferAllocator >() )
   {
     for( std::size_t i = 0; i < i_rStream.AccessUnits.size(); ++i )
       m_Frames[i < i_rFrameNumbers.size() ? i_rFrameNumbers[i] : i] = i_rStream.AccessUnits[i];

@@ -6,6 +6,7 @@
 #include "tests/support/LogCapture.h"
 #include "videointerface/BufferAllocators.h"
 #include "videointerface/IVideoReader.h"
+#include "videointerface/ReaderCapabilities.h"
 
 #include <cstdint>
 #include <map>
@@ -61,16 +62,14 @@ namespace LumekTest
 
   // Serves access units as an H.264 file would, under frame numbers the test chooses (gaps
   // allowed), and counts the reads.
-  class VMemoryH264Reader : public ZOL::IVideoReader,
-                            public ZOL::IFrameIndexQueries,
-                            private ZOL::IVideoReaderCapabilities
+  class VMemoryH264Reader : public ZOL::IVideoReader, public ZOL::IFrameIndexQueries
   {
   public:
     VMemoryH264Reader( const VH264Stream& i_rStream, const std::vector< std::uint64_t >& i_rFrameNumbers = {} );
 
     std::uint64_t Reads = 0;
 
-    const ZOL::IVideoReaderCapabilities& GetCapabilities() const override { return *this; }
+    const ZOL::IVideoReaderCapabilities& GetCapabilities() const override { return m_Capabilities; }
     bool Open( const std::string& ) override { return true; }
     const ZOL::IVideoAttributes& GetAttributes() const override { return m_Attributes; }
     const ZOL::IVideoTiming& GetVideoTiming() const override { return m_Timing; }
@@ -91,16 +90,10 @@ namespace LumekTest
     std::optional< std::uint64_t > FindStoredFrameAtOrAfter( std::uint64_t i_FrameIndex ) const override;
 
   private:
-    bool SupportsAudioSampleFormat( ZOL::EAudioSampleFormat ) const override { return false; }
-    bool SupportsAudioPayload( ZOL::EAudioPayload ) const override { return false; }
-    bool SupportsPixelFormat( ZOL::EPixelFormat ) const override { return true; }
-    bool SupportsVideoPayload( ZOL::EVideoPayload i_Payload ) const override
-    {
-      return i_Payload == ZOL::VideoPayload_VideoH264;
-    }
-
+    ZOL::VReaderCapabilities m_Capabilities{
+        {}, {}, ZOL::VReaderCapabilities::EveryPixelFormat(), { ZOL::VideoPayload_VideoH264 } };
     std::map< std::uint64_t, VBytes > m_Frames;
-    std::shared_ptr< ZOL::VReaderBufferAllocator > m_pAllocator;
+    std::shared_ptr< ZOL::VReaderBufferAllocator > m_pAllocator = std::make_shared< ZOL::VReaderBufferAllocator >();
     ZOL::IVideoAttributes m_Attributes;
     ZOL::IVideoTiming m_Timing;
     ZOL::ITimecode m_Timecode;

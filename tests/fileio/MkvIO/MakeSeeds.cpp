@@ -12,13 +12,8 @@ int main( int i_ArgumentCount, char** i_ppArguments )
     return 1;
   }
   const std::string Folder = i_ppArguments[1];
-  MkvTest::VFamilyCase Case;
-  Case.Width = 4;
-  Case.Height = 2;
-  Case.Frames = 2;
-  Case.Format = ZOL::PixelFormat_U8Y8V8Y8;
-  Case.Audio = ZOL::AudioSampleFormat_Int16;
-  bool bGood = MkvTest::WriteFamilyFile( Folder + "/uyvy_audio.mkv", Case, {} );
+  MkvTest::VFamilyCase Case{ ZOL::PixelFormat_U8Y8V8Y8, ZOL::AudioSampleFormat_Int16, false, 4, 2, 2 };
+  bool bGood = MkvTest::WriteFamilyFile( Folder + "/uyvy_audio.mkv", Case );
   Case.Format = ZOL::PixelFormat_Luminance8;
   Case.Audio = ZOL::AudioSampleFormat_Unspecified;
   bGood = bGood &&
@@ -33,11 +28,11 @@ int main( int i_ArgumentCount, char** i_ppArguments )
                                                Blocks[0].Track = 3;
                                                Blocks[0].Bytes = { 1, 2 };
                                                Blocks[1].bWithBlock = i_Frame != 0;
-                                               Blocks[1].Bytes = std::vector< std::uint8_t >( 8, 7 );
+                                               Blocks[1].Bytes = MkvTest::VBytes( 8, 7 );
                                                Blocks[2].Track = 2;
-                                               Blocks[2].Bytes = std::vector< std::uint8_t >( 8, 1 );
+                                               Blocks[2].Bytes = MkvTest::VBytes( 8, 1 );
                                                Blocks[3].Track = 2;
-                                               Blocks[3].Bytes = std::vector< std::uint8_t >( 16, 2 );
+                                               Blocks[3].Bytes = MkvTest::VBytes( 16, 2 );
                                                return Blocks;
                                              } );
   return bGood ? 0 : 1;

@@ -4,15 +4,14 @@
 // writer from frames whose every byte is known.
 
 #include "fileio/MkvIO/VMkvWriter.h"
-#include "videointerface/Enumerations.h"
 #include "videointerface/IBuffer.h"
 #include "videointerface/IVideoFrameInfo.h"
 
-#include <cstdint>
+#include <boost/filesystem.hpp>
+
+#include <fstream>
 #include <functional>
-#include <memory>
-#include <string>
-#include <vector>
+#include <iterator>
 
 namespace MkvTest
 {
@@ -20,39 +19,119 @@ namespace MkvTest
 
   struct VFamilyCase
   {
-    std::string Name;
     ZOL::EPixelFormat Format = ZOL::PixelFormat_R8G8B8u8; // the stored format, or the JPEG's
     ZOL::EAudioSampleFormat Audio = ZOL::AudioSampleFormat_Unspecified;
     bool bJPEG = false;
-    int Width = 16;
-    int Height = 8;
-    int Frames = 5;
-    double FramesPerSecond = 50.0;
+    int Width = 16, Height = 8, Frames = 5;
   };
 
   // 4 x 2 RGBA with 16-bit audio, three frames: small enough to cut at every byte.
-  VFamilyCase SmallCase();
+  inline VFamilyCase SmallCase()
+  {
+    return { ZOL::PixelFormat_R8G8B8u8, ZOL::AudioSampleFormat_Int16, false, 4, 2, 3 };
+  }
 
-  ZOL::IAudioFrameInfo AudioInfo( const VFamilyCase& i_rCase );
-  ZOL::IVideoTiming Timing( const VFamilyCase& i_rCase );
-  ZOL::ITimecode StartTimecode();
+  inline ZOL::IAudioFrameInfo AudioInfo( const VFamilyCase& i_rCase )
+  {
+    ZOL::IAudioFrameInfo Info;
+    if( i_rCase.Audio != ZOL::AudioSampleFormat_Unspecified )
+      Info = { i_rCase.Audio, 48000, 2 };
+    return Info;
+  }
+
+  // 50 frames a second, starting 1234 ticks in, at 10:20:30:12 with user bits A5A5.
+  inline ZOL::IVideoTiming Timing()
+  {
+    ZOL::IVideoTiming Timing;
+    Timing.FramePeriodInTicks = static_cast< std::uint32_t >( Timing.TicksPerSecond / 50 );
+    Timing.StartOffsetInTicks = 1234;
+    return Timing;
+  }
+
+  inline ZOL::ITimecode StartTimecode()
+  {
+    ZOL::ITimecode Timecode;
+    Timecode.Standards = ZOL::TimecodeStandard_25;
+    Timecode.Hours = 10;
+    Timecode.Minutes = 20;
+    Timecode.Seconds = 30;
+    Timecode.Frames = 12;
+    Timecode.UserBits = 0xA5A5;
+    return Timecode;
+  }
 
   // Frame i of a raw case: bytes that differ at every position and in every frame.
-  VBytes RawFrame( const VFamilyCase& i_rCase, int i_Frame );
-  // The audio of frame i: a whole number of sample groups, differing from frame to frame.
-  VBytes AudioBlock( const VFamilyCase& i_rCase, int i_Frame );
-  // What frame i holds: raw bytes, or for MJPEG the given JPEG file's bytes.
-  VBytes FrameBytes( const VFamilyCase& i_rCase, int i_Frame, const VBytes& i_rJPEG );
+  inline VBytes RawFrame( const VFamilyCase& i_rCase, int i_Frame )
+  {
+    ZOL::IVideoFrameInfo Info;
+    Info.ImageWidth = i_rCase.Width;
+    Info.ImageHeight = i_rCase.Height;
+    Info.PixelFormat = i_rCase.Format;
+    VBytes Bytes( ZOL::GetVideoFrameSizeInBytes64( Info ) );
+    for( std::size_t i = 0; i < Bytes.size(); ++i )
+      Bytes[i] = static_cast< std::uint8_t >( i * 7 + i / 5 + i_Frame * 29 );
+    return Bytes;
+  }
 
-  // Writes the case's file with one Cluster a frame; i_rEdit may change the description, and
-  // i_rClusters, when set, gives the blocks of each frame instead of the usual two.
-  bool WriteFamilyFile( const std::string& i_rPath, const VFamilyCase& i_rCase, const VBytes& i_rJPEG,
-                        const std::function< void( MkvIO::VMkvDescription& ) >& i_rEdit = {},
-                        const std::function< std::vector< MkvIO::VMkvBlock >( int ) >& i_rClusters = {} );
+  // The audio of frame i: a whole number of sample groups, and a sample count that changes from
+  // frame to frame, as 48 kHz at odd frame rates does.
+  inline VBytes AudioBlock( const VFamilyCase& i_rCase, int i_Frame )
+  {
+    const ZOL::IAudioFrameInfo Info = AudioInfo( i_rCase );
+    VBytes Bytes( Info.IsUsable() ? ( 40 + i_Frame % 3 ) * ZOL::GetAudioSampleGroupSizeInBytes( Info ) : 0 );
+    for( std::size_t i = 0; i < Bytes.size(); ++i )
+      Bytes[i] = static_cast< std::uint8_t >( i * 3 + i_Frame * 101 );
+    return Bytes;
+  }
 
-  VBytes Bytes( const std::shared_ptr< ZOL::IBuffer >& i_pBuffer );
-  VBytes ReadWholeFile( const std::string& i_rPath );
-  bool WriteWholeFile( const std::string& i_rPath, const VBytes& i_rBytes );
-  // A fresh path in the test's temporary folder.
-  std::string TempPath( const std::string& i_rName );
+  // Writes the case's file with one Cluster a frame, each holding the raw frame (or i_rJPEG) and
+  // its audio; i_rEdit may change the description, and i_rClusters, when set, gives the blocks
+  // of each frame instead.
+  inline bool WriteFamilyFile( const std::string& i_rPath, const VFamilyCase& i_rCase, const VBytes& i_rJPEG = {},
+                               const std::function< void( MkvIO::VMkvDescription& ) >& i_rEdit = {},
+                               const std::function< std::vector< MkvIO::VMkvBlock >( int ) >& i_rClusters = {} )
+  {
+    ZOL::IVideoFrameInfo Video;
+    Video.ImageWidth = i_rCase.Width;
+    Video.ImageHeight = i_rCase.Height;
+    Video.PixelFormat = i_rCase.Format;
+    Video.PixelAspectRatio = 1.0;
+    ZOL::IVideoSettings Settings;
+    Settings.Saturation = 0.75f;
+    Settings.GammaCorrection = 1.25f;
+    MkvIO::VMkvDescription Description;
+    MkvIO::VMkvWriter Writer;
+    if( !MkvIO::DescribeForMatroska( Video, i_rCase.bJPEG, AudioInfo( i_rCase ), Timing(), StartTimecode(), Settings,
+                                     Description ) )
+      return false;
+    if( i_rEdit )
+      i_rEdit( Description );
+    if( !Writer.Create( i_rPath, Description ) )
+      return false;
+    for( int Frame = 0; Frame < i_rCase.Frames; ++Frame )
+      if( !( i_rClusters ? Writer.WriteCluster( i_rClusters( Frame ) )
+                         : Writer.WriteFrame( i_rCase.bJPEG ? i_rJPEG : RawFrame( i_rCase, Frame ),
+                                              AudioBlock( i_rCase, Frame ) ) ) )
+        return false;
+    return Writer.Close();
+  }
+
+  inline VBytes Bytes( const std::shared_ptr< ZOL::IBuffer >& i_pBuffer )
+  {
+    return i_pBuffer ? VBytes( i_pBuffer->GetData(), i_pBuffer->GetData() + i_pBuffer->GetSize() ) : VBytes();
+  }
+
+  inline VBytes ReadWholeFile( const std::string& i_rPath )
+  {
+    std::ifstream File( i_rPath, std::ios::binary );
+    return VBytes( std::istreambuf_iterator< char >( File ), std::istreambuf_iterator< char >() );
+  }
+
+  // A fresh path in the tests' temporary folder.
+  inline std::string TempPath( const std::string& i_rName )
+  {
+    const boost::filesystem::path Folder = boost::filesystem::temp_directory_path() / "lumek-mkv-tests";
+    boost::filesystem::create_directories( Folder );
+    return ( Folder / boost::filesystem::unique_path( "%%%%%%%%-" + i_rName ) ).string();
+  }
 } // namespace MkvTest

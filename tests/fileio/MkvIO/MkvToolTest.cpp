@@ -24,17 +24,15 @@ namespace
 
   TEST( MkvTool, ConvertToLvidKeepsPixelsAudioAndTimecode )
   {
-    VFamilyCase Case;
-    Case.Format = ZOL::PixelFormat_U8Y8V8Y8;
-    Case.Audio = ZOL::AudioSampleFormat_Int16;
+    const VFamilyCase Case{ ZOL::PixelFormat_U8Y8V8Y8, ZOL::AudioSampleFormat_Int16 };
     const std::string Input = TempPath( "convert.mkv" ), Output = TempPath( "converted.lvid" );
-    ASSERT_TRUE( WriteFamilyFile( Input, Case, {} ) );
+    ASSERT_TRUE( WriteFamilyFile( Input, Case ) );
     ASSERT_EQ( RunTool( "convert", Input, Output ), 0 );
     LumekVideo::VReader Reader;
     ASSERT_TRUE( Reader.Open( Output ) );
     ASSERT_EQ( Reader.GetFrameCount(), static_cast< std::uint64_t >( Case.Frames ) );
     EXPECT_EQ( Reader.GetVideoFrameInfo().PixelFormat, Case.Format );
-    EXPECT_EQ( Reader.GetVideoTiming().FramePeriodInTicks, Timing( Case ).FramePeriodInTicks );
+    EXPECT_EQ( Reader.GetVideoTiming().FramePeriodInTicks, Timing().FramePeriodInTicks );
     const ZOL::ITimecode Expected = StartTimecode(), Got = Reader.GetTimecode();
     EXPECT_EQ(
         std::make_tuple( Got.Standards, Got.Hours, Got.Minutes, Got.Seconds, Got.Frames ),
