@@ -60,7 +60,7 @@ namespace
   class VQtMessages
   {
   public:
-    VQtMessages() { s_Messages.clear(), m_Previous = qInstallMessageHandler( &Collect ); }
+    VQtMessages() : m_Previous( qInstallMessageHandler( &Collect ) ) { s_Messages.clear(); }
     ~VQtMessages() { qInstallMessageHandler( m_Previous ); }
     std::string Text() const { return s_Messages.join( "\n" ).toStdString(); }
 
@@ -107,6 +107,7 @@ namespace
     Image.fill( Qt::transparent );
     QPainter Painter( &Image );
     Renderer.render( &Painter );
+    Painter.end();
     VCoverage Coverage;
     double Weight = 0.0;
     for( int y = 0; y < Image.height(); ++y )
