@@ -76,7 +76,7 @@ namespace LumekVideoTest
     return SerialiseStore( Store );
   }
 
-  VAssembled Assemble( const VRecordingPlan& i_rPlan )
+  VAssembled Assemble( const VRecordingPlan& i_rPlan, std::vector< std::pair< std::uint64_t, std::size_t > > i_Index )
   {
     VAssembled Result;
     VByteWriter File;
@@ -87,31 +87,20 @@ namespace LumekVideoTest
       Result.RecordOffsets.push_back( File.Size() );
       File.Raw( rRecord.Video ).PadTo( i_rPlan.Alignment );
       if( rRecord.Audio )
-      {
-        File.U32( rRecord.AudioByteCount.value_or( static_cast< std::uint32_t >( rRecord.Audio->size() ) ) );
-        File.Raw( *rRecord.Audio ).PadTo( i_rPlan.Alignment );
-      }
+        File.U32( static_cast< std::uint32_t >( rRecord.Audio->size() ) )
+            .Raw( *rRecord.Audio )
+            .PadTo( i_rPlan.Alignment );
     }
     Result.IndexOffset = File.Size();
-    std::vector< std::pair< std::uint64_t, std::uint64_t > > Index;
-    for( std::size_t i = 0; i < i_rPlan.Records.size(); ++i )
-      Index.emplace_back( i_rPlan.Records[i].FrameNumber, Result.RecordOffsets[i] );
-    File.U64( i_rPlan.Index.value_or( Index ).size() );
-    for( const auto& rEntry : i_rPlan.Index.value_or( Index ) )
-      File.U64( rEntry.first ).U64( rEntry.second );
+    if( i_Index.empty() )
+      for( std::size_t i = 0; i < i_rPlan.Records.size(); ++i )
+        i_Index.emplace_back( i_rPlan.Records[i].FrameNumber, i );
+    File.U64( i_Index.size() );
+    for( const auto& [Frame, Record] : i_Index )
+      File.U64( Frame ).U64( Result.RecordOffsets.at( Record ) );
     PatchU64( File.Bytes, 40, Result.IndexOffset );
     Result.Bytes = std::move( File.Bytes );
     return Result;
-  }
-
-  VAssembled AssembleWithIndex( VRecordingPlan i_Plan,
-                                const std::vector< std::pair< std::uint64_t, std::size_t > >& i_rFrameToRecord )
-  {
-    const VAssembled Plain = Assemble( i_Plan );
-    i_Plan.Index.emplace();
-    for( const auto& rEntry : i_rFrameToRecord )
-      i_Plan.Index->emplace_back( rEntry.first, Plain.RecordOffsets.at( rEntry.second ) );
-    return Assemble( i_Plan );
   }
 
   ZOL::IVideoFrameInfo MakeVideo( ZOL::EPixelFormat i_Format, int i_Width, int i_Height )
@@ -157,7 +146,7 @@ namespace LumekVideoTest
     Plan.AttributeBlock = SerialiseStore( MakeFileAttributes() );
     Plan.Alignment = 16;
     for( std::uint32_t i = 0; i < 3; ++i )
-      Plan.Records.push_back( { i, PatternBytes( 15, i ), PatternBytes( 4 * ( i + 1 ), 40 + i ), std::nullopt } );
+      Plan.Records.push_back( { i, PatternBytes( 15, i ), PatternBytes( 4 * ( i + 1 ), 40 + i ) } );
     return Plan;
   }
 

@@ -58,9 +58,7 @@ namespace LumekVideoTest
   {
     std::uint64_t FrameNumber = 0;
     VBytes Video;
-    // Absent: the recording has no audio. Its AudioByteCount may claim other than its size.
-    std::optional< VBytes > Audio;
-    std::optional< std::uint32_t > AudioByteCount;
+    std::optional< VBytes > Audio; // absent: the recording has no sound
   };
 
   // A recording as a capture lays it out: header, both blocks, aligned records, index last.
@@ -70,8 +68,6 @@ namespace LumekVideoTest
     VBytes AttributeBlock;
     std::uint64_t Alignment = 64;
     std::vector< VRecord > Records;
-    // (frame number, record offset) entries to write instead of one per record, in order.
-    std::optional< std::vector< std::pair< std::uint64_t, std::uint64_t > > > Index;
   };
 
   struct VAssembled
@@ -81,10 +77,10 @@ namespace LumekVideoTest
     std::uint64_t IndexOffset = 0;
   };
 
-  VAssembled Assemble( const VRecordingPlan& i_rPlan );
-  // The same plan with an index of (frame number, record number) entries.
-  VAssembled AssembleWithIndex( VRecordingPlan i_Plan,
-                                const std::vector< std::pair< std::uint64_t, std::size_t > >& i_rFrameToRecord );
+  // The index names each record by its frame number, unless (frame number, record number)
+  // entries are given to write instead.
+  VAssembled Assemble( const VRecordingPlan& i_rPlan,
+                       std::vector< std::pair< std::uint64_t, std::size_t > > i_Index = {} );
 
   // A frame description for tests: a size and a format, all else at the usual values.
   ZOL::IVideoFrameInfo MakeVideo( ZOL::EPixelFormat i_Format, int i_Width, int i_Height );
@@ -105,9 +101,10 @@ namespace LumekVideoTest
     VBytes Audio;
   };
 
-  // The writer's recording of these frames, or nothing when any call fails.
+  // The writer's recording of these frames with MakeFileAttributes, or nothing when any call fails.
   VBytes WriteToMemory( const ZOL::IVideoFrameInfo& i_rVideo, const ZOL::IAudioFrameInfo& i_rAudio,
-                        const std::vector< VFrameContent >& i_rFrames, std::uint64_t i_Alignment );
+                        const std::vector< VFrameContent >& i_rFrames,
+                        std::uint64_t i_Alignment = LumekVideo::DefaultAlignment );
 
   // A reader of a recording held in memory.
   struct VMemoryRecording

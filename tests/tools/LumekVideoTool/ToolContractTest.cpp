@@ -272,8 +272,9 @@ namespace
       {
         ASSERT_EQ( Reader.HasFrame( Frame ), Frame != 3 && Frame != 4 ) << Frame;
         ZOL::IVideoFrame Decoded;
-        if( !Reader.HasFrame( Frame ) || !Reader.ReadFrame( Frame, Decoded, true, false ) )
+        if( !Reader.HasFrame( Frame ) )
           continue;
+        ASSERT_TRUE( Reader.ReadFrame( Frame, Decoded, true, false ) ) << Frame;
         LumekVideoTool::VRGBImage Scene( 40, 24 );
         LumekVideoTool::RenderSampleScene( static_cast< int >( Frame ), 50.0, Scene );
         ASSERT_EQ( Decoded.Video->GetSize(), Scene.Pixels.size() );
