@@ -132,6 +132,22 @@ TEST( AviTree, OpensAndCountsAsTheRulesSay )
   EXPECT_TRUE( Garbage.bOpened );
   EXPECT_EQ( Garbage.pReader->GetFrameCount(), 0u );
   EXPECT_TRUE( Log.Has( "Unknown chunk 'ZZZZ' ignored." ) );
+
+  // Bitmaps of positive height are stored bottom row first, whichever name they go by; the
+  // other formats never are.
+  for( const std::uint32_t FourCC :
+       { RapidAVI::MakeFourCC( "RGB " ), RapidAVI::MakeFourCC( "DIB " ), RapidAVI::MakeFourCC( "YUY2" ) } )
+  {
+    VAviSpec Positive;
+    Bitmap( Positive, FourCC, FourCC == RapidAVI::MakeFourCC( "YUY2" ) ? 16 : 32 );
+    Positive.StrfHeight = 4;
+    Positive.Frames = { Frame( 8 * 4 * Positive.Bits / 8, 1 ) };
+    Positive.OldIndexFrames = 1;
+    VOpenedAvi Avi = OpenAvi( BuildAvi( Positive ) );
+    ASSERT_TRUE( Avi.bOpened );
+    EXPECT_EQ( Avi.pReader->GetVideoFrameInfo().IsInverted(), Positive.Bits == 32 ) << Positive.Bits;
+    EXPECT_EQ( ReadVideo( *Avi.pReader, 0 ), Positive.Frames[0] );
+  }
 }
 
 TEST( AviIndex, OldIndexOfHundredAgainstStandardIndexOfNinety )
