@@ -180,7 +180,14 @@ namespace ZOL
           o_rpValue = MakeValue( static_cast< T >( Wide ) );
         }
         else
+        {
+          // lexical_cast reads "-1" as an unsigned number and wraps it round; a field typed
+          // unsigned takes no sign.
+          if constexpr( std::is_unsigned_v< T > && !std::is_same_v< T, bool > )
+            if( i_rText.find( '-' ) != std::string::npos )
+              return false;
           o_rpValue = MakeValue( boost::lexical_cast< T >( i_rText ) );
+        }
         return true;
       }
       catch( const boost::bad_lexical_cast& )
