@@ -218,29 +218,18 @@ namespace
     }
   }
 
-  TEST( ToolMakeSample, WritesAPlayableRecording )
+  TEST( ToolMakeSample, WritesTheAskedRecording )
   {
+    // The default sample, with sound, is the golden report's.
     VScratch Scratch;
     const std::string Path = Scratch.Path( "sample.lvid" );
-    const VRun Make =
-        RunTool( { "make-sample", Path, "--width", "96", "--height", "54", "--frames", "10", "--fps", "50" } );
+    const VRun Make = RunTool( { "make-sample", Path, "--width", "96", "--height", "54", "--frames", "10", "--fps",
+                                 "50", "--format", "U8Y8V8Y8", "--no-audio" } );
     ASSERT_EQ( Make.ExitCode, 0 ) << Make.Err;
     const auto Json = ParseJson( RunInProcess( { "info", Path } ).Out );
     EXPECT_EQ( Json.get< std::string >( "infoPanel.video" ),
-               "V: 96 x 54 / BayerGB8 / 50.00Hz / 10 frames (2 missing) / 0.20s" );
-    EXPECT_EQ( Json.get< std::string >( "infoPanel.audio" ), "A: 2 channels / Int16 / 48000Hz" );
-    EXPECT_EQ( Json.get< std::string >( "infoPanel.timecode" ).rfind( "T: 10:00:00:00", 0 ), 0u );
-    // 960 stereo 16-bit samples a frame at 50 fps.
-    EXPECT_EQ( Json.get_child( "frame.audioBlocks" ).front().second.get_value< int >(), 960 * 4 );
-
-    const std::string Quiet = Scratch.Path( "quiet.lvid" );
-    ASSERT_EQ( RunInProcess( { "make-sample", Quiet, "--width", "32", "--height", "16", "--frames", "2", "--format",
-                               "U8Y8V8Y8", "--no-audio" } )
-                   .ExitCode,
-               0 );
-    const auto QuietJson = ParseJson( RunInProcess( { "info", Quiet } ).Out );
-    EXPECT_EQ( QuietJson.get< std::string >( "audio.payload" ), "None" );
-    EXPECT_EQ( QuietJson.get< std::string >( "video.pixelFormat" ), "U8Y8V8Y8" );
+               "V: 96 x 54 / U8Y8V8Y8 / 50.00Hz / 10 frames (2 missing) / 0.20s" );
+    EXPECT_EQ( Json.get< std::string >( "audio.payload" ), "None" );
   }
 
   TEST( ToolMakeSample, WritesImageSequencesOfTheScene )
