@@ -44,7 +44,7 @@ namespace
     for( const auto& [Width, Height, pProfile] : Cases )
     {
       SCOPED_TRACE( std::string( pProfile ) + " " + std::to_string( Width ) + "x" + std::to_string( Height ) );
-      const VH264Stream Stream = MakeH264Stream( Width, Height, 12, 5, { "-profile:v", pProfile } );
+      const VH264Stream Stream = MakeH264Stream( Width, Height, 12, 5, std::string( "-profile:v " ) + pProfile );
       const std::vector< VBytes > Expected = ExpectedUYVYFrames( Stream );
       ASSERT_EQ( Stream.AccessUnits.size(), 12u );
       ASSERT_EQ( Expected.size(), 12u );
@@ -100,7 +100,7 @@ namespace
     // Only monochrome pictures crop to an odd size. OpenH264 2.3 crops them in 4:2:0 units and
     // gives 32 x 16; a library that reported 33 x 17 would see each frame refused with the
     // even-size line instead. Either way no frame of odd size comes out.
-    const VH264Stream Stream = MakeH264Stream( 33, 17, 4, 2, { "-profile:v", "high" }, "gray" );
+    const VH264Stream Stream = MakeH264Stream( 33, 17, 4, 2, "-profile:v high", "gray" );
     ASSERT_EQ( Stream.AccessUnits.size(), 4u );
     const auto pDecoder = H264IO::VH264Decoder::Create( std::make_shared< ZOL::VFrameBufferAllocator >() );
     VLogCapture Log( "H264IO" );

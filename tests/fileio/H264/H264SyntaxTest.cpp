@@ -236,37 +236,26 @@ namespace
   {
     if( !HaveFfmpeg() )
       GTEST_SKIP() << "ffmpeg is not installed";
-    struct VEncoder
-    {
-      const char* Name;
-      std::vector< std::string > Arguments;
-      std::uint32_t Profile;
-      bool bTiming; // HRD and picture timing: the SEI is described with the SPS
-    };
-    const VEncoder Encoders[] = {
-        { "Baseline", { "-profile:v", "baseline" }, 66, false },
-        { "HighWithScalingMatrix", { "-profile:v", "high", "-x264-params", "cqm=jvt" }, 100, false },
-        { "MainWithHRDAndTiming",
-          { "-profile:v", "main", "-b:v", "300k", "-maxrate", "300k", "-bufsize", "600k", "-x264-params",
-            "nal-hrd=cbr:force-cfr=1:pic-struct=1" },
-          77,
+    // The encoder's arguments, the profile they give, and whether the SPS has HRD and picture
+    // timing, with which the SEI is described.
+    const std::tuple< const char*, std::uint32_t, bool > Encoders[] = {
+        { "-profile:v baseline", 66, false },
+        { "-profile:v high -x264-params cqm=jvt", 100, false },
+        { "-profile:v main -b:v 300k -maxrate 300k -bufsize 600k -x264-params nal-hrd=cbr:force-cfr=1:pic-struct=1", 77,
           true },
-        { "HighWithColourDescription",
-          { "-profile:v", "high", "-color_primaries", "bt709", "-color_trc", "bt709", "-colorspace", "bt709",
-            "-x264-params", "sar=4/3" },
-          100,
+        { "-profile:v high -color_primaries bt709 -color_trc bt709 -colorspace bt709 -x264-params sar=4/3", 100,
           false },
     };
-    for( const VEncoder& rEncoder : Encoders )
+    for( const auto& [pArguments, Profile, bTiming] : Encoders )
     {
-      SCOPED_TRACE( rEncoder.Name );
-      const VH264Stream Stream = MakeH264Stream( 98, 62, 3, 30, rEncoder.Arguments );
+      SCOPED_TRACE( pArguments );
+      const VH264Stream Stream = MakeH264Stream( 98, 62, 3, 30, pArguments );
       ASSERT_FALSE( Stream.AccessUnits.empty() );
       const VBytes SPSUnit = UnitsOfType( Stream.AccessUnits[0], 7 ).at( 0 );
       const VBytes PPSUnit = UnitsOfType( Stream.AccessUnits[0], 8 ).at( 0 );
       VH264SPS SPS;
       ASSERT_TRUE( ParseSPS( SPSUnit.data(), SPSUnit.size(), SPS ) );
-      EXPECT_EQ( SPS.profile_idc, rEncoder.Profile );
+      EXPECT_EQ( SPS.profile_idc, Profile );
       EXPECT_EQ( SPS.GetWidth(), 98u );
       EXPECT_EQ( SPS.GetHeight(), 62u );
       // Compared without emulation prevention: the writer leaves a zero third byte unescaped
@@ -286,7 +275,7 @@ namespace
         const VBytes Short( SPSUnit.begin(), SPSUnit.begin() + static_cast< std::ptrdiff_t >( Cut ) );
         (void)ParseSPS( Short.data(), Short.size(), Again );
       }
-      if( !rEncoder.bTiming )
+      if( !bTiming )
         continue;
       ASSERT_TRUE( SPS.vui.nal_hrd_parameters_present_flag );
       ASSERT_TRUE( SPS.vui.pic_struct_present_flag );

@@ -1,16 +1,15 @@
 #pragma once
 
 // What the still-image decoder tests share: frame allocators, files read whole, the committed
-// seeds, and the frame a container would declare.
+// seeds, the frame a container would declare, and the log's lines.
 
 #include "tests/support/LogCapture.h"
 #include "videointerface/BufferAllocators.h"
 #include "videointerface/IVideoFrameInfo.h"
 
-#include <cstdint>
-#include <memory>
-#include <string>
-#include <vector>
+#include <algorithm>
+#include <fstream>
+#include <iterator>
 
 namespace LumekTest
 {
@@ -21,17 +20,32 @@ namespace LumekTest
     return std::make_shared< ZOL::VFrameBufferAllocator >();
   }
 
-  VBytes ReadWholeFile( const std::string& i_rPath );
-  void WriteWholeFile( const std::string& i_rPath, const VBytes& i_rBytes );
+  inline VBytes ReadWholeFile( const std::string& i_rPath )
+  {
+    std::ifstream File( i_rPath, std::ios::binary );
+    return VBytes( std::istreambuf_iterator< char >( File ), std::istreambuf_iterator< char >() );
+  }
 
   // A file of the committed fuzz seeds, by its path below fuzz/seeds.
-  inline std::string SeedPath( const std::string& i_rName )
+  inline VBytes Seed( const std::string& i_rName )
   {
-    return std::string( LUMEK_SEED_DIR ) + "/" + i_rName;
+    return ReadWholeFile( std::string( LUMEK_SEED_DIR ) + "/" + i_rName );
+  }
+
+  inline ZOL::IVideoFrameInfo FrameInfo( std::int32_t i_Width, std::int32_t i_Height, ZOL::EPixelFormat i_Format )
+  {
+    ZOL::IVideoFrameInfo Info;
+    Info.ImageWidth = i_Width;
+    Info.ImageHeight = i_Height;
+    Info.PixelFormat = i_Format;
+    return Info;
   }
 
   // True when a line of the capture, as "LEVEL MESSAGE", holds i_rText.
-  bool Logged( const VLogCapture& i_rLog, const std::string& i_rText );
-
-  ZOL::IVideoFrameInfo FrameInfo( std::int32_t i_Width, std::int32_t i_Height, ZOL::EPixelFormat i_Format );
+  inline bool Logged( const VLogCapture& i_rLog, const std::string& i_rText )
+  {
+    const std::vector< std::string > Lines = i_rLog.Lines();
+    return std::any_of( Lines.begin(), Lines.end(),
+                        [&]( const std::string& i_rLine ) { return i_rLine.find( i_rText ) != std::string::npos; } );
+  }
 } // namespace LumekTest
