@@ -10,20 +10,12 @@
 
 #include <gtest/gtest.h>
 
-#include <sstream>
-
 using namespace ImageSequenceTest;
 using ImageSequenceIO::VImageSequenceReader;
 using LumekTest::VLogCapture;
 
 namespace
 {
-  std::vector< std::string > Words( const std::string& i_rText )
-  {
-    std::istringstream Stream( i_rText );
-    return { std::istream_iterator< std::string >( Stream ), std::istream_iterator< std::string >() };
-  }
-
   std::set< std::uint64_t > Frames( const std::string& i_rText )
   {
     std::set< std::uint64_t > Numbers;

@@ -6,10 +6,13 @@
 #include "fileio/ImageSequenceIO/SequenceDescriptor.h"
 #include "fileio/ImageSequenceIO/VImageSequenceReader.h"
 
-#include <cstdint>
+#include <boost/filesystem.hpp>
+#include <gtest/gtest.h>
+
+#include <fstream>
+#include <iterator>
 #include <set>
-#include <string>
-#include <vector>
+#include <sstream>
 
 namespace ImageSequenceTest
 {
@@ -19,8 +22,12 @@ namespace ImageSequenceTest
   class VTempFolder
   {
   public:
-    VTempFolder();
-    ~VTempFolder();
+    VTempFolder() { boost::filesystem::create_directories( m_Path ); }
+    ~VTempFolder()
+    {
+      boost::system::error_code Error;
+      boost::filesystem::remove_all( m_Path, Error );
+    }
     VTempFolder( const VTempFolder& ) = delete;
     VTempFolder& operator=( const VTempFolder& ) = delete;
 
@@ -28,22 +35,74 @@ namespace ImageSequenceTest
     std::string operator/( const std::string& i_rName ) const { return m_Path + "/" + i_rName; }
 
   private:
-    std::string m_Path;
+    std::string m_Path =
+        ( boost::filesystem::temp_directory_path() / boost::filesystem::unique_path( "lumek-sequence-%%%%-%%%%-%%%%" ) )
+            .string();
   };
 
-  void WriteFile( const std::string& i_rPath, const VBytes& i_rBytes );
-  void WriteFile( const std::string& i_rPath, const std::string& i_rText );
-  VBytes ReadFile( const std::string& i_rPath );
+  inline void WriteFile( const std::string& i_rPath, const VBytes& i_rBytes )
+  {
+    std::ofstream File( i_rPath, std::ios::binary | std::ios::trunc );
+    File.write( reinterpret_cast< const char* >( i_rBytes.data() ), static_cast< std::streamsize >( i_rBytes.size() ) );
+    ASSERT_TRUE( File.good() ) << i_rPath;
+  }
 
-  // A PNG signature and IHDR of a 40 x 30 RGB image: all a reader takes from an image to open.
-  VBytes PngHeader();
+  inline void WriteFile( const std::string& i_rPath, const std::string& i_rText )
+  {
+    WriteFile( i_rPath, VBytes( i_rText.begin(), i_rText.end() ) );
+  }
+
+  inline VBytes ReadFile( const std::string& i_rPath )
+  {
+    std::ifstream File( i_rPath, std::ios::binary );
+    return VBytes( std::istreambuf_iterator< char >( File ), std::istreambuf_iterator< char >() );
+  }
+
+  // The words of a text: file names, frame numbers.
+  inline std::vector< std::string > Words( const std::string& i_rText )
+  {
+    std::istringstream Stream( i_rText );
+    return { std::istream_iterator< std::string >( Stream ), std::istream_iterator< std::string >() };
+  }
+
+  // A PNG signature and IHDR of a 40 x 30 RGB image, big-endian as PNG stores its numbers: all
+  // a reader takes from an image to open.
+  inline VBytes PngHeader()
+  {
+    return { 0x89, 'P', 'N', 'G', 0x0D, 0x0A, 0x1A, 0x0A, 0, 0, 0, 13, 'I', 'H', 'D', 'R', 0,
+             0,    0,   40,  0,   0,    0,    30,   8,    2, 0, 0, 0,  0,   0,   0,   0 };
+  }
 
   // A descriptor of a 48 x 32 sequence at 25 frames a second with this pattern and count.
-  ImageSequenceIO::VDescriptor MakeDescriptor( const std::string& i_rPattern, std::uint32_t i_FrameCount,
-                                               std::uint32_t i_IndexPad = 8, std::uint32_t i_NumberPad = 8 );
+  inline ImageSequenceIO::VDescriptor MakeDescriptor( const std::string& i_rPattern, std::uint32_t i_FrameCount,
+                                                      std::uint32_t i_IndexPad = 8, std::uint32_t i_NumberPad = 8 )
+  {
+    ImageSequenceIO::VDescriptor Descriptor;
+    Descriptor.FrameInfo.ImageWidth = 48;
+    Descriptor.FrameInfo.ImageHeight = 32;
+    Descriptor.FrameInfo.PixelFormat = ZOL::PixelFormat_R8G8B8;
+    Descriptor.FrameInfo.PixelAspectRatio = 1.0;
+    Descriptor.Timing.FramePeriodInTicks = Descriptor.Timing.TicksPerSecond / 25;
+    Descriptor.Sequence.FileNamePattern = i_rPattern;
+    Descriptor.Sequence.FrameCount = i_FrameCount;
+    Descriptor.Sequence.FrameIndexPadWidth = i_IndexPad;
+    Descriptor.Sequence.FrameNumberPadWidth = i_NumberPad;
+    return Descriptor;
+  }
 
-  // The frames below i_Count that the reader says are on disk, asserting that its index says
-  // the same of each.
-  std::set< std::uint64_t > StoredFrames( const ImageSequenceIO::VImageSequenceReader& i_rReader,
-                                          std::uint64_t i_Count );
+  // The frames below i_Count that the reader says are on disk, expecting its index to say the
+  // same of each.
+  inline std::set< std::uint64_t > StoredFrames( const ImageSequenceIO::VImageSequenceReader& i_rReader,
+                                                 std::uint64_t i_Count )
+  {
+    std::set< std::uint64_t > Stored;
+    for( std::uint64_t i = 0; i < i_Count; ++i )
+    {
+      EXPECT_EQ( i_rReader.HasFrame( i ), i_rReader.FindStoredFrameAtOrAfter( i ) == i ) << "frame " << i;
+      if( i_rReader.HasFrame( i ) )
+        Stored.insert( i );
+    }
+    EXPECT_EQ( Stored.size(), i_rReader.GetStoredFrameCount() );
+    return Stored;
+  }
 } // namespace ImageSequenceTest
