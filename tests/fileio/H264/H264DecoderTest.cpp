@@ -82,8 +82,8 @@ namespace
   TEST_F( H264Decoder, UnitsWithoutAPictureGiveNoFrameAndSaySo )
   {
     const VH264Stream Stream = MakeH264Stream( 64, 48, 12, 5 );
-    std::vector< VBytes > Sets = UnitsOfType( Stream.AccessUnits.at( 0 ), 7 );
-    Sets.push_back( UnitsOfType( Stream.AccessUnits[0], 8 ).at( 0 ) );
+    std::vector< VBytes > Sets = SplitNALUnits( Stream.AccessUnits.at( 0 ), 7 );
+    Sets.push_back( SplitNALUnits( Stream.AccessUnits[0], 8 ).at( 0 ) );
     VLogCapture Log( "H264IO" );
     const VDecode ParameterSets( JoinNALUnits( Sets, false ), ZOL::PixelFormat_U8Y8V8Y8 );
     EXPECT_FALSE( ParameterSets.bDecoded || ParameterSets.pOutput );

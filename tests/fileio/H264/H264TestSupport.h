@@ -27,29 +27,24 @@ namespace LumekTest
     std::vector< VBytes > AccessUnits;
   };
 
-  // The units of an Annex B byte string, without start codes.
-  inline std::vector< VBytes > SplitNALUnits( const VBytes& i_rAnnexB )
+  // The units of an Annex B byte string without their start codes and the zeros before the next
+  // one; only those of one type when i_Type is given (7 SPS, 8 PPS, 6 SEI).
+  inline std::vector< VBytes > SplitNALUnits( const VBytes& i_rAnnexB, int i_Type = -1 )
   {
+    std::vector< std::size_t > Starts;
+    for( std::size_t i = 0; i + 2 < i_rAnnexB.size(); ++i )
+      if( i_rAnnexB[i] == 0 && i_rAnnexB[i + 1] == 0 && i_rAnnexB[i + 2] == 1 )
+        Starts.push_back( i + 3 );
     std::vector< VBytes > Units;
-    std::size_t i = 0, Start = std::string::npos;
-    while( i + 2 < i_rAnnexB.size() )
+    for( std::size_t n = 0; n < Starts.size(); ++n )
     {
-      if( i_rAnnexB[i] != 0 || i_rAnnexB[i + 1] != 0 || i_rAnnexB[i + 2] != 1 )
-      {
-        ++i;
-        continue;
-      }
-      if( Start != std::string::npos )
-      {
-        std::size_t End = i;
-        while( End > Start && i_rAnnexB[End - 1] == 0 )
-          --End;
-        Units.emplace_back( i_rAnnexB.begin() + Start, i_rAnnexB.begin() + End );
-      }
-      Start = i += 3;
+      const bool bLast = n + 1 == Starts.size();
+      VBytes Unit( i_rAnnexB.begin() + Starts[n], bLast ? i_rAnnexB.end() : i_rAnnexB.begin() + Starts[n + 1] - 3 );
+      while( !bLast && !Unit.empty() && Unit.back() == 0 )
+        Unit.pop_back();
+      if( i_Type < 0 || ( !Unit.empty() && ( Unit[0] & 0x1F ) == i_Type ) )
+        Units.push_back( std::move( Unit ) );
     }
-    if( Start != std::string::npos )
-      Units.emplace_back( i_rAnnexB.begin() + Start, i_rAnnexB.end() );
     return Units;
   }
 
@@ -65,16 +60,6 @@ namespace LumekTest
       Out.insert( Out.end(), rUnit.begin(), rUnit.end() );
     }
     return Out;
-  }
-
-  // The units of one type (7 SPS, 8 PPS, 6 SEI) in an access unit.
-  inline std::vector< VBytes > UnitsOfType( const VBytes& i_rAccessUnit, unsigned i_Type )
-  {
-    std::vector< VBytes > Units;
-    for( const VBytes& rUnit : SplitNALUnits( i_rAccessUnit ) )
-      if( !rUnit.empty() && ( rUnit[0] & 0x1Fu ) == i_Type )
-        Units.push_back( rUnit );
-    return Units;
   }
 
   // A libx264 stream without B-frames, a key frame every i_KeyInterval frames and an access

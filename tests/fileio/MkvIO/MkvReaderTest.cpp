@@ -1,12 +1,16 @@
-// The damaged and odd files a reader of the family meets: each is refused with its log line or
-// read as far as it can be; cut and flipped files never crash or hang.
+// Files of the family written by the project's writer read back equal, and ffprobe and ffmpeg
+// see in them what the reader sees. The damaged and odd files a reader meets are refused with
+// their log line or read as far as they can be; cut and flipped files never crash or hang.
 
 #include "fileio/MkvIO/VMkvReader.h"
 #include "tests/fileio/MkvIO/MkvTestSupport.h"
+#include "tests/support/FfmpegFixtures.h"
 #include "tests/support/LogCapture.h"
 
 #include <ebml/MemReadIOCallback.h>
 #include <gtest/gtest.h>
+
+#include <malloc.h>
 
 using namespace MkvTest;
 using LumekTest::VLogCapture;
@@ -14,6 +18,141 @@ using VDescription = MkvIO::VMkvDescription;
 
 namespace
 {
+  void ExpectReadsBack( const std::string& i_rPath, const VFamilyCase& i_rCase, const VBytes& i_rJPEG )
+  {
+    MkvIO::VMkvReader Reader;
+    ASSERT_TRUE( Reader.Open( i_rPath ) );
+    EXPECT_EQ( Reader.GetFrameCount(), static_cast< std::uint64_t >( i_rCase.Frames ) );
+    EXPECT_EQ( Reader.GetVideoPayload(), i_rCase.bJPEG ? ZOL::VideoPayload_ImageJPEG : ZOL::VideoPayload_Uncompressed );
+    const ZOL::IVideoFrameInfo& rVideo = Reader.GetVideoFrameInfo();
+    EXPECT_EQ( std::make_tuple( rVideo.ImageWidth, rVideo.ImageHeight, rVideo.PixelFormat ),
+               std::make_tuple( i_rCase.Width, i_rCase.Height, i_rCase.Format ) );
+    const ZOL::IAudioFrameInfo Audio = AudioInfo( i_rCase );
+    EXPECT_EQ( Reader.GetAudioPayload(), Audio.IsUsable() ? ZOL::AudioPayload_Uncompressed : ZOL::AudioPayload_None );
+    EXPECT_EQ( Reader.GetAudioFrameInfo(), Audio );
+    // The tags carry the timing, the timecode and the settings exactly.
+    EXPECT_EQ( Reader.GetVideoTiming(), Timing() );
+    EXPECT_EQ( Reader.GetTimecode(), StartTimecode() );
+    EXPECT_FLOAT_EQ( Reader.GetVideoSettings().Saturation, 0.75f );
+    EXPECT_FLOAT_EQ( Reader.GetVideoSettings().GammaCorrection, 1.25f );
+    std::string WritingApp;
+    EXPECT_TRUE( Reader.GetAttributes().Get( "Matroska.WritingApp", WritingApp ) );
+    EXPECT_EQ( WritingApp, "LumekVideoViewer" );
+
+    for( int Frame = 0; Frame <= i_rCase.Frames; ++Frame )
+    {
+      std::shared_ptr< ZOL::IBuffer > pVideo;
+      ZOL::IAudioBuffers Blocks;
+      ASSERT_EQ( Reader.ReadFrameData( Frame, pVideo, Blocks, true, true ), Frame < i_rCase.Frames ) << Frame;
+      if( Frame == i_rCase.Frames )
+        break;
+      EXPECT_EQ( Bytes( pVideo ), i_rCase.bJPEG ? i_rJPEG : RawFrame( i_rCase, Frame ) ) << Frame;
+      ASSERT_EQ( Blocks.size(), Audio.IsUsable() ? 1u : 0u ) << Frame;
+      EXPECT_TRUE( Blocks.empty() || Bytes( Blocks[0] ) == AudioBlock( i_rCase, Frame ) ) << Frame;
+    }
+    EXPECT_TRUE( Reader.HasFrame( i_rCase.Frames - 1 ) );
+    EXPECT_FALSE( Reader.HasFrame( i_rCase.Frames ) );
+    EXPECT_EQ( Reader.FindStoredFrameAtOrBefore( 1000 ), std::optional< std::uint64_t >( i_rCase.Frames - 1 ) );
+    EXPECT_EQ( Reader.FindStoredFrameAtOrAfter( i_rCase.Frames ), std::nullopt );
+  }
+
+  TEST( MkvFamily, WriterToReaderAndToFfmpeg )
+  {
+    if( !LumekTest::HaveFfmpeg() )
+      GTEST_SKIP() << "ffmpeg is not installed";
+    // One small JPEG for every MJPEG frame, made by ffmpeg.
+    const std::string JPEGPath =
+        LumekTest::FfmpegFixture( "mkv_frame.jpg", { "-f", "lavfi", "-i", "testsrc=size=16x8:rate=1", "-frames:v", "1",
+                                                     "-pix_fmt", "yuvj420p" } );
+    const VBytes JPEG = ReadWholeFile( JPEGPath );
+    ASSERT_FALSE( JPEG.empty() );
+    // The case, and ffmpeg's names of its pixel format and audio codec.
+    const std::tuple< VFamilyCase, const char*, const char* > Rows[] = {
+        { { ZOL::PixelFormat_R8G8B8u8, ZOL::AudioSampleFormat_Int16 }, "rgba", "pcm_s16le" },
+        { { ZOL::PixelFormat_U8Y8V8Y8, ZOL::AudioSampleFormat_Int24 }, "uyvy422", "pcm_s24le" },
+        { { ZOL::PixelFormat_Y8U8Y8V8, ZOL::AudioSampleFormat_Int32 }, "yuyv422", "pcm_s32le" },
+        { { ZOL::PixelFormat_Luminance8, ZOL::AudioSampleFormat_Float32 }, "gray", "pcm_f32le" },
+        { { ZOL::PixelFormat_Luminance8, ZOL::AudioSampleFormat_Unspecified }, "gray", "" },
+        { { ZOL::PixelFormat_R8G8B8u8, ZOL::AudioSampleFormat_Int16, true }, "rgb24", "pcm_s16le" },
+    };
+    for( const auto& [Case, pFfmpegFormat, pAudioCodec] : Rows )
+    {
+      SCOPED_TRACE( std::string( pFfmpegFormat ) + ( Case.bJPEG ? " JPEG " : " " ) + pAudioCodec );
+      const std::string Path = TempPath( "family.mkv" );
+      ASSERT_TRUE( WriteFamilyFile( Path, Case, JPEG ) );
+      ExpectReadsBack( Path, Case, JPEG );
+
+      const std::string Video = LumekTest::Ffprobe(
+          Path, { "-select_streams", "v:0", "-count_frames", "-show_entries",
+                  "stream=codec_name,width,height,r_frame_rate,nb_read_frames", "-of", "default=noprint_wrappers=1" } );
+      EXPECT_EQ( Video, std::string( "codec_name=" ) + ( Case.bJPEG ? "mjpeg" : "rawvideo" ) +
+                            "\nwidth=16\nheight=8\nr_frame_rate=50/1\nnb_read_frames=5\n" );
+      if( *pAudioCodec )
+      {
+        EXPECT_EQ( LumekTest::Ffprobe( Path, { "-select_streams", "a:0", "-show_entries",
+                                               "stream=codec_name,sample_rate,channels", "-of",
+                                               "default=noprint_wrappers=1" } ),
+                   std::string( "codec_name=" ) + pAudioCodec + "\nsample_rate=48000\nchannels=2\n" );
+      }
+      // ffmpeg reads the raw frames in its own pixel format names: the FourCC and the layout
+      // agree. MJPEG frames decode as the JPEG they were made from.
+      VBytes Expected;
+      const VBytes Picture = Case.bJPEG ? LumekTest::FfmpegDecode( JPEGPath, pFfmpegFormat ) : VBytes();
+      for( int Frame = 0; Frame < Case.Frames; ++Frame )
+      {
+        const VBytes Stored = Case.bJPEG ? Picture : RawFrame( Case, Frame );
+        Expected.insert( Expected.end(), Stored.begin(), Stored.end() );
+      }
+      EXPECT_EQ( LumekTest::FfmpegDecode( Path, pFfmpegFormat ), Expected );
+      std::remove( Path.c_str() );
+    }
+  }
+
+  // The FourCC in a BITMAPINFOHEADER reads as the colour space one does.
+  TEST( MkvReader, VfwFourCCReadsAsUncompressed )
+  {
+    const VFamilyCase Case{ ZOL::PixelFormat_U8Y8V8Y8 };
+    const std::string Path = TempPath( "vfw.mkv" );
+    ASSERT_TRUE(
+        WriteFamilyFile( Path, Case, {}, []( VDescription& io_rD ) { io_rD.Video.CodecID = "V_MS/VFW/FOURCC"; } ) );
+    MkvIO::VMkvReader Reader;
+    ASSERT_TRUE( Reader.Open( Path ) );
+    EXPECT_EQ( Reader.GetVideoPayload(), ZOL::VideoPayload_Uncompressed );
+    EXPECT_EQ( Reader.GetVideoFrameInfo().PixelFormat, ZOL::PixelFormat_U8Y8V8Y8 );
+    std::shared_ptr< ZOL::IBuffer > pVideo;
+    ZOL::IAudioBuffers Audio;
+    ASSERT_TRUE( Reader.ReadFrameData( 2, pVideo, Audio, true, true ) );
+    EXPECT_EQ( Bytes( pVideo ), RawFrame( Case, 2 ) );
+    std::remove( Path.c_str() );
+  }
+
+  // Reading frames must not leave their blocks behind: the heap after thousands of frames is
+  // what it was after the first hundred.
+  TEST( MkvReader, MemoryDoesNotGrowWithFramesRead )
+  {
+    const VFamilyCase Case{ ZOL::PixelFormat_Luminance8, ZOL::AudioSampleFormat_Int16, false, 8, 4, 3000 };
+    const std::string Path = TempPath( "long.mkv" );
+    ASSERT_TRUE( WriteFamilyFile( Path, Case ) );
+    MkvIO::VMkvReader Reader;
+    ASSERT_TRUE( Reader.Open( Path ) );
+    ASSERT_EQ( Reader.GetFrameCount(), 3000u );
+    std::size_t HeapAfterWarmUp = 0;
+    for( int Pass = 0; Pass < 2; ++Pass )
+      for( int Frame = 0; Frame < Case.Frames; ++Frame )
+      {
+        std::shared_ptr< ZOL::IBuffer > pVideo;
+        ZOL::IAudioBuffers Audio;
+        ASSERT_TRUE( Reader.ReadFrameData( Frame, pVideo, Audio, true, true ) );
+        if( Pass == 0 && Frame == 100 )
+          HeapAfterWarmUp = mallinfo2().uordblks;
+      }
+    const std::size_t HeapAtEnd = mallinfo2().uordblks;
+    // The first read of a frame drops what opening kept of its blocks, so the heap may shrink.
+    EXPECT_LT( static_cast< double >( HeapAtEnd ), static_cast< double >( HeapAfterWarmUp ) + 16 * 1024 )
+        << "after warm-up " << HeapAfterWarmUp << ", at end " << HeapAtEnd;
+    std::remove( Path.c_str() );
+  }
+
   MkvIO::VMkvBlock Block( std::uint16_t i_Track, VBytes i_Bytes, bool i_bWithBlock = true )
   {
     MkvIO::VMkvBlock Result;
