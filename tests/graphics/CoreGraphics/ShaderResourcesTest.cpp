@@ -18,6 +18,7 @@
 #include <QTemporaryDir>
 
 #include <memory>
+#include <set>
 #include <string>
 #include <vector>
 
@@ -37,8 +38,7 @@ namespace
       LUMEK_REQUIRE_DISPLAY();
       Shaders::RegisterResources();
       m_Surface.create();
-      ASSERT_TRUE( m_Context.create() );
-      ASSERT_TRUE( m_Context.makeCurrent( &m_Surface ) );
+      ASSERT_TRUE( m_Context.create() && m_Context.makeCurrent( &m_Surface ) );
       m_pResources = std::make_unique< VResources >( false, QDir::currentPath() );
       m_pResources->Load();
       m_pRender = std::make_unique< CoreGraphics::VRenderContext >();
@@ -59,7 +59,6 @@ namespace
     {
       CoreGraphics::VRenderContext& rContext = *m_pRender;
       QOpenGLFramebufferObject Framebuffer( i_Size, i_Size );
-      EXPECT_TRUE( Framebuffer.isValid() );
       rContext.BindFramebuffer( &Framebuffer );
       EXPECT_TRUE( rContext.FramebufferComplete() );
       rContext.SetViewport( QRect( 0, 0, i_Size, i_Size ) );
@@ -89,66 +88,56 @@ namespace
     std::unique_ptr< CoreGraphics::VRenderContext > m_pRender;
   };
 
+  // The viewer's programs and the general-purpose stages in the pairs they are written for:
+  // every stage compiles, is in one pair, and each pair links once. A uniform each is driven
+  // through is found by name and by hash.
   TEST_F( ShaderResourcesTest, EveryStageCompilesAndEveryProgramLinks )
   {
     LumekTest::VLogCapture Log( "CoreGraphics" );
     VResources Resources( false, QDir::currentPath() );
     Resources.Load();
-    // clang-format off
-    EXPECT_EQ( Resources.GetShaderNames( VShader::Kind_Vertex ),
-               QStringList( { "ColoredLine", "Simple", "Simple3D", "Simple3DModel", "Simple3DModelColour",
-                              "Simple3DModelWireframe", "Simple3DPointSize", "Simple3DUniformColour",
-                              "Simple3DVertexColour", "SimpleColour", "Video" } ) );
-    // clang-format on
-    EXPECT_EQ( Resources.GetShaderNames( VShader::Kind_Fragment ),
-               QStringList( { "Colour", "ImageSet", "SimpleLighting", "StippledLine", "UniformColour", "VideoBayer",
-                              "VideoLuminance", "VideoRaw", "VideoYUV" } ) );
     EXPECT_FALSE( Log.Contains( "Failed" ) );
-
-    // The five programs of the viewer, and the general-purpose stages in the pairs they are
-    // written for (every stage above is in one), with the uniforms each is driven through, found
-    // by name and by hash.
     const struct
     {
-      const char* Vertex;
-      const char* Fragment;
-      std::vector< std::string > Uniforms;
+      const char *Vertex, *Fragment, *Uniform;
     } Programs[] = {
-        { "Video",
-          "VideoRaw",
-          { "u_View2D", "u_SensorSize", "u_RadialDistortionCentre", "u_RadialDistortionParameters", "u_Rotation",
-            "u_RotationCentre", "u_VideoScaleAndOffset", "u_Inverted", "t_DiffuseTexture", "u_Swizzle" } },
-        { "Video", "VideoBayer", { "t_DiffuseTexture", "u_Resolution", "u_FirstRed", "u_ColourCorrection" } },
-        { "Video", "VideoLuminance", { "t_DiffuseTexture", "u_Inverted" } },
-        { "Video", "VideoYUV", { "t_DiffuseTexture", "u_Swizzle", "u_Resolution" } },
-        { "Video", "UniformColour", { "u_colour", "u_View2D" } },
-        { "Video", "ImageSet", { "t_DiffuseTexture", "u_ColourTint" } },
-        { "Simple", "UniformColour", { "u_colour" } },
-        { "SimpleColour", "Colour", {} },
-        { "Simple3D", "UniformColour", { "u_ViewProjection", "u_colour" } },
-        { "Simple3DPointSize", "UniformColour", { "u_ViewProjection", "u_PointSize" } },
-        { "Simple3DUniformColour", "Colour", { "u_ViewProjection", "u_Colour" } },
-        { "Simple3DVertexColour", "Colour", { "u_ViewProjection" } },
-        { "Simple3DModel", "SimpleLighting", { "u_ViewProjection", "u_ModelTransform", "u_View", "u_Up" } },
-        { "Simple3DModelColour", "SimpleLighting", { "u_ModelTransform", "u_ModelColour" } },
-        { "Simple3DModelWireframe", "Colour", { "u_ViewProjection", "u_ModelTransform" } },
-        { "ColoredLine", "StippledLine", { "u_ViewProjection", "u_SourcePoint", "u_ModelColour" } },
+        { "Video", "VideoRaw", "u_RadialDistortionParameters" },
+        { "Video", "VideoBayer", "u_FirstRed" },
+        { "Video", "VideoLuminance", "u_Inverted" },
+        { "Video", "VideoYUV", "u_Swizzle" },
+        { "Video", "UniformColour", "u_View2D" },
+        { "Video", "ImageSet", "u_ColourTint" },
+        { "Simple", "UniformColour", "u_colour" },
+        { "SimpleColour", "Colour", nullptr },
+        { "Simple3D", "UniformColour", "u_ViewProjection" },
+        { "Simple3DPointSize", "UniformColour", "u_PointSize" },
+        { "Simple3DUniformColour", "Colour", "u_Colour" },
+        { "Simple3DVertexColour", "Colour", "u_ViewProjection" },
+        { "Simple3DModel", "SimpleLighting", "u_Up" },
+        { "Simple3DModelColour", "SimpleLighting", "u_ModelColour" },
+        { "Simple3DModelWireframe", "Colour", "u_ModelTransform" },
+        { "ColoredLine", "StippledLine", "u_SourcePoint" },
     };
+    std::set< QString > Vertex, Fragment;
     for( const auto& rCase : Programs )
     {
       SCOPED_TRACE( std::string( rCase.Vertex ) + "_" + rCase.Fragment );
+      Vertex.insert( rCase.Vertex );
+      Fragment.insert( rCase.Fragment );
       std::shared_ptr< VShaderProgram > pProgram = Resources.GetProgram( rCase.Vertex, rCase.Fragment );
       ASSERT_TRUE( pProgram && pProgram->IsLinked() );
       EXPECT_EQ( Resources.GetProgram( rCase.Vertex, rCase.Fragment ), pProgram ) << "a pair is linked once";
-      for( const std::string& rName : rCase.Uniforms )
+      for( const char* pName : { rCase.Uniform, "u_NotThere" } )
       {
-        const int Location = pProgram->UniformLocation( rName.c_str() );
-        EXPECT_GE( Location, 0 ) << rName;
-        EXPECT_EQ( pProgram->UniformLocationByHash( CoreGraphics::MurmurHash3_32( rName ) ), Location ) << rName;
+        if( pName == nullptr )
+          continue;
+        const int Location = pProgram->UniformLocation( pName );
+        EXPECT_EQ( Location >= 0, pName == rCase.Uniform ) << pName;
+        EXPECT_EQ( pProgram->UniformLocationByHash( CoreGraphics::MurmurHash3_32( pName ) ), Location ) << pName;
       }
-      EXPECT_EQ( pProgram->UniformLocation( "u_NotThere" ), -1 );
-      EXPECT_EQ( pProgram->UniformLocationByHash( CoreGraphics::MurmurHash3_32( "u_NotThere" ) ), -1 );
     }
+    EXPECT_EQ( Resources.GetShaderNames( VShader::Kind_Vertex ), QStringList( Vertex.begin(), Vertex.end() ) );
+    EXPECT_EQ( Resources.GetShaderNames( VShader::Kind_Fragment ), QStringList( Fragment.begin(), Fragment.end() ) );
   }
 
   // Stage files of the user's own: a broken or missing one gives no program and a log line; an
@@ -204,9 +193,7 @@ namespace
     QSurfaceFormat::setDefaultFormat( Debug );
     QOpenGLContext DebugContext;
     DebugContext.setFormat( Debug );
-    ASSERT_TRUE( DebugContext.create() );
-    ASSERT_TRUE( DebugContext.makeCurrent( &m_Surface ) );
-
+    ASSERT_TRUE( DebugContext.create() && DebugContext.makeCurrent( &m_Surface ) );
     {
       LumekTest::VLogCapture Log( "CoreGraphics" );
       CoreGraphics::VRenderContext Context;
@@ -224,14 +211,12 @@ namespace
 
   TEST_F( ShaderResourcesTest, BuffersCountWhatTheyHoldAndRefuseWritesPastTheEnd )
   {
-    CoreGraphics::VIndexBuffer Empty;
+    CoreGraphics::VIndexBuffer Empty, Wide;
     ASSERT_TRUE( Empty.Create( std::vector< std::uint16_t >() ) );
     EXPECT_EQ( Empty.GetIndexCount(), 0u );
     ASSERT_TRUE( Empty.GetBuffer().bind() );
     EXPECT_EQ( Empty.GetBuffer().size(), 0 );
     Empty.GetBuffer().release();
-
-    CoreGraphics::VIndexBuffer Wide;
     ASSERT_TRUE( Wide.Create( std::vector< std::uint32_t >{ 0, 1, 2 } ) );
     EXPECT_EQ( Wide.GetIndexType(), GLenum( GL_UNSIGNED_INT ) );
     EXPECT_EQ( Wide.GetIndexCount(), 3u );
@@ -276,41 +261,25 @@ namespace
     Context.UnbindFramebuffer();
   }
 
-  // The projection halves x, so the quad of the whole clip square covers the middle columns only:
+  // The source (1.0, 0.5, 0.0, 0.5) over the destination (0.2, 0.4, 0.6) in each blend mode. The
+  // projection halves x, so the quad of the whole clip square covers the middle columns only:
   // the layout, the standard uniforms and the state come together.
-  TEST_F( ShaderResourcesTest, DrawsAnIndexedQuadWithTheStandardUniforms )
-  {
-    QMatrix4x4 Projection;
-    Projection.scale( 0.5f, 1.0f, 1.0f );
-    const QImage Picture = DrawQuad( 8, QVector4D( 1.0f, 0.5f, 0.0f, 1.0f ), QColor( 25, 25, 25 ),
-                                     CoreGraphics::VRenderState(), Projection );
-    for( int x = 0; x < 8; ++x )
-    {
-      const QRgb Expected = ( x >= 2 && x < 6 ) ? qRgb( 255, 128, 0 ) : qRgb( 25, 25, 25 );
-      EXPECT_EQ( Picture.pixel( x, 4 ) & 0xffffff, Expected & 0xffffff ) << "column " << x;
-    }
-
-    // Using no program is refused and leaves the current one in place.
-    const std::shared_ptr< VShaderProgram > pCurrent = m_pResources->GetProgram( "Video", "VideoRaw" );
-    ASSERT_TRUE( m_pRender->UseProgram( pCurrent ) );
-    EXPECT_FALSE( m_pRender->UseProgram( nullptr ) );
-    EXPECT_EQ( m_pRender->GetCurrentProgram(), pCurrent );
-  }
-
-  TEST_F( ShaderResourcesTest, BlendModesMixSourceAndDestination )
+  TEST_F( ShaderResourcesTest, DrawsAnIndexedQuadInEachBlendMode )
   {
     const struct
     {
       const char* Name;
       int ColourMode;
       float BlendConstant;
-      // Expected colour over the destination (0.2, 0.4, 0.6) for the source (1.0, 0.5, 0.0, 0.5).
-      float R, G, B;
+      float R, G, B; // expected, before clamping
     } Cases[] = {
         { "Replace", 0, 1.0f, 1.0f, 0.5f, 0.0f },        { "Alpha", 1, 1.0f, 0.6f, 0.45f, 0.3f },
         { "AdditiveAlpha", 2, 1.0f, 0.7f, 0.65f, 0.6f }, { "ConstantAlphaAdditive", 3, 0.25f, 0.45f, 0.525f, 0.6f },
         { "Premultiplied", 4, 1.0f, 1.1f, 0.7f, 0.3f },
     };
+    QMatrix4x4 Projection;
+    Projection.scale( 0.5f, 1.0f, 1.0f );
+    const QColor Clear = QColor::fromRgbF( 0.2, 0.4, 0.6, 1.0 );
     for( const auto& rCase : Cases )
     {
       SCOPED_TRACE( rCase.Name );
@@ -319,12 +288,21 @@ namespace
       // Alpha mode 1 turns blending on for colour mode 0 as well.
       State.AlphaBlendMode = 1;
       State.BlendConstant = rCase.BlendConstant;
-      const QRgb Pixel =
-          DrawQuad( 4, QVector4D( 1.0f, 0.5f, 0.0f, 0.5f ), QColor::fromRgbF( 0.2, 0.4, 0.6, 1.0 ), State )
-              .pixel( 2, 2 );
-      EXPECT_NEAR( qRed( Pixel ), std::min( rCase.R, 1.0f ) * 255, 2 );
-      EXPECT_NEAR( qGreen( Pixel ), std::min( rCase.G, 1.0f ) * 255, 2 );
-      EXPECT_NEAR( qBlue( Pixel ), std::min( rCase.B, 1.0f ) * 255, 2 );
+      const QImage Picture = DrawQuad( 8, QVector4D( 1.0f, 0.5f, 0.0f, 0.5f ), Clear, State, Projection );
+      for( int x = 0; x < 8; ++x )
+      {
+        const QRgb Pixel = Picture.pixel( x, 4 );
+        const bool bInside = x >= 2 && x < 6;
+        EXPECT_NEAR( qRed( Pixel ), bInside ? std::min( rCase.R, 1.0f ) * 255 : Clear.red(), 2 ) << "column " << x;
+        EXPECT_NEAR( qGreen( Pixel ), bInside ? std::min( rCase.G, 1.0f ) * 255 : Clear.green(), 2 ) << "column " << x;
+        EXPECT_NEAR( qBlue( Pixel ), bInside ? std::min( rCase.B, 1.0f ) * 255 : Clear.blue(), 2 ) << "column " << x;
+      }
     }
+
+    // Using no program is refused and leaves the current one in place.
+    const std::shared_ptr< VShaderProgram > pCurrent = m_pResources->GetProgram( "Video", "VideoRaw" );
+    ASSERT_TRUE( m_pRender->UseProgram( pCurrent ) );
+    EXPECT_FALSE( m_pRender->UseProgram( nullptr ) );
+    EXPECT_EQ( m_pRender->GetCurrentProgram(), pCurrent );
   }
 } // namespace
