@@ -86,6 +86,9 @@ namespace
     ASSERT_TRUE( Input.Read( Read.data(), Read.size() ) );
     EXPECT_EQ( Read, Bytes );
     std::uint8_t Byte = 0;
+    std::uint64_t Position = 0;
+    EXPECT_TRUE( Input.GetPosition( Position ) && Input.Read( &Byte, 0 ) );
+    EXPECT_EQ( Position, Bytes.size() );
     EXPECT_FALSE( Input.Read( &Byte, 1 ) );
     EXPECT_TRUE( Input.IsAtEnd() );
     EXPECT_FALSE( Input.Read( &Byte, 0 ) ) << "a failed stream stays failed until a seek";
