@@ -27,11 +27,7 @@ namespace
   // 01:02:03:04 at 30 fps, frames at 60 Hz: every other frame is half a timecode frame on.
   void SetHalfFrameTimecode( ZOL::ITimecode& o_rStart, ZOL::IVideoTiming& o_rTiming )
   {
-    o_rStart.Standards = ZOL::TimecodeStandard_30;
-    o_rStart.Hours = 1;
-    o_rStart.Minutes = 2;
-    o_rStart.Seconds = 3;
-    o_rStart.Frames = 4;
+    o_rStart = { ZOL::TimecodeStandard_30, 1, 2, 3, 4 };
     o_rTiming.FramePeriodInTicks = o_rTiming.TicksPerSecond / 60;
   }
 

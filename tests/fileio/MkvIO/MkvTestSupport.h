@@ -42,22 +42,12 @@ namespace MkvTest
   // 50 frames a second, starting 1234 ticks in, at 10:20:30:12 with user bits A5A5.
   inline ZOL::IVideoTiming Timing()
   {
-    ZOL::IVideoTiming Timing;
-    Timing.FramePeriodInTicks = static_cast< std::uint32_t >( Timing.TicksPerSecond / 50 );
-    Timing.StartOffsetInTicks = 1234;
-    return Timing;
+    return { ZOL::DefaultTicksPerSecond, ZOL::DefaultTicksPerSecond / 50, 1234 };
   }
 
   inline ZOL::ITimecode StartTimecode()
   {
-    ZOL::ITimecode Timecode;
-    Timecode.Standards = ZOL::TimecodeStandard_25;
-    Timecode.Hours = 10;
-    Timecode.Minutes = 20;
-    Timecode.Seconds = 30;
-    Timecode.Frames = 12;
-    Timecode.UserBits = 0xA5A5;
-    return Timecode;
+    return { ZOL::TimecodeStandard_25, 10, 20, 30, 12, 0xA5A5 };
   }
 
   // Frame i of a raw case: bytes that differ at every position and in every frame.
