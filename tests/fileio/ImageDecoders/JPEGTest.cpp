@@ -1,7 +1,7 @@
 // The JPEG segment parser and its dump against an image assembled by hand and ffmpeg's encoding
 // kept as a fuzz seed; the reader against ffmpeg's decode of the same files, in every format a
-// caller may wish for. Malformed streams, every cut, lying sizes and failed allocations are
-// refused with the parser's and the reader's own lines.
+// caller may wish for. Malformed streams, every cut and lying sizes are refused with the
+// parser's and the reader's own lines.
 
 #include "fileio/JPEGIO/JPEGReader.h"
 #include "fileio/JPEGUtils/JPEGParser.h"
@@ -363,26 +363,6 @@ namespace
       EXPECT_LT( Watch.Largest(), 1u << 20 );
       EXPECT_TRUE( Logged( Log, "2 JPEG image of " + std::to_string( Width ) + " x " + std::to_string( Height ) +
                                     " is too large to decode." ) );
-    }
-  }
-
-  TEST( JPEGAllocation, ANullAllocatorIsAFailedAllocation )
-  {
-    const VBytes Bytes = Seed( "jpeg/yuv422_16x16.jpg" );
-    // The output allocator on both paths, and the packed path's temporary buffer.
-    const std::tuple< EPixelFormat, bool, const char* > Cases[] = {
-        { PixelFormat_U8Y8V8Y8, true, "Output buffer allocation failed." },
-        { PixelFormat_R8G8B8, true, "Output buffer allocation failed." },
-        { PixelFormat_U8Y8V8Y8, false, "Temporary buffer allocation failed." },
-    };
-    for( const auto& [Wish, bOutputMissing, pMessage] : Cases )
-    {
-      VLogCapture Log( "JPEGIO" );
-      IVideoFrameInfo Info = FrameInfo( 0, 0, Wish );
-      std::shared_ptr< IBuffer > pOutput;
-      EXPECT_FALSE( JPEGIO::ReadJPEG( Bytes.data(), Bytes.size(), bOutputMissing ? nullptr : MakeFrameAllocator(),
-                                      bOutputMissing ? MakeFrameAllocator() : nullptr, Info, pOutput ) );
-      EXPECT_TRUE( Logged( Log, std::string( "2 " ) + pMessage ) ) << pMessage;
     }
   }
 } // namespace
