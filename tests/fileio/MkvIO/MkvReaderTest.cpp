@@ -15,6 +15,7 @@
 using namespace MkvTest;
 using LumekTest::VLogCapture;
 using VDescription = MkvIO::VMkvDescription;
+using VBlock = MkvIO::VMkvBlock;
 
 namespace
 {
@@ -153,15 +154,6 @@ namespace
     std::remove( Path.c_str() );
   }
 
-  MkvIO::VMkvBlock Block( std::uint16_t i_Track, VBytes i_Bytes, bool i_bWithBlock = true )
-  {
-    MkvIO::VMkvBlock Result;
-    Result.Track = i_Track;
-    Result.Bytes = std::move( i_Bytes );
-    Result.bWithBlock = i_bWithBlock;
-    return Result;
-  }
-
   TEST( MkvReader, BrokenFilesAreRefusedWithTheirLine )
   {
     const std::pair< std::function< void( VDescription& ) >, const char* > Cases[] = {
@@ -206,15 +198,15 @@ namespace
     struct VCase
     {
       const char* Name;
-      std::vector< MkvIO::VMkvBlock > Blocks; // frame 1's Cluster; the others are ordinary
-      VBytes Video;                           // what frame 1 reads as
+      std::vector< VBlock > Blocks; // frame 1's Cluster; the others are ordinary
+      VBytes Video;                 // what frame 1 reads as
       std::vector< VBytes > Audio;
     };
     const VCase Cases[] = {
-        { "ThirdTrackBlock", { Block( 3, { 1, 2, 3 } ), Block( 1, Video ), Block( 2, AudioA ) }, Video, { AudioA } },
-        { "NoVideoBlock", { Block( 2, AudioA ) }, {}, { AudioA } },
-        { "GroupWithoutBlock", { Block( 1, {}, false ), Block( 1, Video ), Block( 2, AudioA ) }, Video, { AudioA } },
-        { "TwoAudioBlocks", { Block( 1, Video ), Block( 2, AudioA ), Block( 2, AudioB ) }, Video, { AudioB } },
+        { "ThirdTrackBlock", { VBlock{ 3, { 1, 2, 3 } }, VBlock{ 1, Video }, VBlock{ 2, AudioA } }, Video, { AudioA } },
+        { "NoVideoBlock", { VBlock{ 2, AudioA } }, {}, { AudioA } },
+        { "GroupWithoutBlock", { VBlock{ 1, {}, false }, VBlock{ 1, Video }, VBlock{ 2, AudioA } }, Video, { AudioA } },
+        { "TwoAudioBlocks", { VBlock{ 1, Video }, VBlock{ 2, AudioA }, VBlock{ 2, AudioB } }, Video, { AudioB } },
         { "EmptyCluster", {}, {}, {} },
     };
     for( const VCase& rCase : Cases )
@@ -226,8 +218,8 @@ namespace
                                     {
                                       if( i_Frame == 1 )
                                         return rCase.Blocks;
-                                      return std::vector< MkvIO::VMkvBlock >{ Block( 1, RawFrame( Case, i_Frame ) ),
-                                                                              Block( 2, AudioBlock( Case, i_Frame ) ) };
+                                      return std::vector< VBlock >{ VBlock{ 1, RawFrame( Case, i_Frame ) },
+                                                                    VBlock{ 2, AudioBlock( Case, i_Frame ) } };
                                     } ) );
       MkvIO::VMkvReader Reader;
       ASSERT_TRUE( Reader.Open( Path ) );
