@@ -11,6 +11,7 @@
 
 #include <cstring>
 #include <string>
+#include <tuple>
 #include <vector>
 
 namespace
@@ -50,53 +51,47 @@ namespace
     std::shared_ptr< IBufferAllocator > m_pTemporaryAllocator = std::make_shared< VFrameBufferAllocator >();
   };
 
-  TEST_F( FrameDecoder, UncompressedKeepsTheVeryBuffer )
+  // A raw frame is used where it lies, so a description that promises more bytes than the
+  // buffer holds would have the surface read past its end: it is refused.
+  TEST_F( FrameDecoder, UncompressedKeepsTheVeryBufferWhenItHoldsItsDescription )
   {
-    auto pBuffer = Payload( std::vector< std::uint8_t >( 4 * 3 * 3, 9 ) );
-    IBuffer* pBefore = pBuffer.get();
-    IVideoFrameInfo FrameInfo = Info( 4, 3, PixelFormat_B8G8R8 );
-    EXPECT_TRUE( Decode( VideoPayload_Uncompressed, FrameInfo, pBuffer ) );
-    EXPECT_EQ( pBuffer.get(), pBefore );
-    EXPECT_EQ( FrameInfo, Info( 4, 3, PixelFormat_B8G8R8 ) );
-    // No buffer is no frame, whatever the payload.
-    std::shared_ptr< IBuffer > pNone;
-    for( EVideoPayload Payload : { VideoPayload_Uncompressed, VideoPayload_ImageJPEG, VideoPayload_VideoH264 } )
-      EXPECT_FALSE( Decode( Payload, FrameInfo, pNone ) );
-  }
-
-  // A description that promises more bytes than the buffer holds would have the surface read
-  // past its end: it is refused.
-  TEST_F( FrameDecoder, UncompressedFrameSmallerThanItsDescriptionFails )
-  {
-    const std::pair< IVideoFrameInfo, std::size_t > Cases[] = {
-        { Info( 4, 3, PixelFormat_R8G8B8 ), 35 },
-        { Info( 64, 2, PixelFormat_U10Y10V10Y10 ), 2 * 128 * 2 - 1 },
-        { Info( 9, 1, PixelFormat_Luminance7 ), 7 },
-        { Info( 4, 3, PixelFormat_Unspecified ), 100 },
-        { Info( 0x7FFFFFFF, 0x7FFFFFFF, PixelFormat_R8G8B8u8 ), 100 },
-        { Info( -4, 3, PixelFormat_Luminance8 ), 100 },
+    const std::tuple< IVideoFrameInfo, std::size_t, bool > Cases[] = {
+        { Info( 4, 3, PixelFormat_B8G8R8 ), 36, true },
+        { Info( 4, 3, PixelFormat_R8G8B8 ), 35, false },
+        { Info( 64, 2, PixelFormat_U10Y10V10Y10 ), 2 * 128 * 2 - 1, false },
+        { Info( 9, 1, PixelFormat_Luminance7 ), 7, false },
+        { Info( 4, 3, PixelFormat_Unspecified ), 100, false },
+        { Info( 0x7FFFFFFF, 0x7FFFFFFF, PixelFormat_R8G8B8u8 ), 100, false },
+        { Info( -4, 3, PixelFormat_Luminance8 ), 100, false },
     };
-    for( const auto& [rFrameInfo, Bytes] : Cases )
+    for( const auto& [rFrameInfo, Bytes, bHolds] : Cases )
     {
+      SCOPED_TRACE( std::to_string( Bytes ) + " bytes" );
       LumekTest::VLogCapture Log( "VideoEncoding" );
       auto pBuffer = Payload( std::vector< std::uint8_t >( Bytes ) );
+      IBuffer* pBefore = pBuffer.get();
       IVideoFrameInfo FrameInfo = rFrameInfo;
-      EXPECT_FALSE( Decode( VideoPayload_Uncompressed, FrameInfo, pBuffer ) ) << Bytes;
-      EXPECT_EQ( Log.Lines().size(), 1u );
+      EXPECT_EQ( Decode( VideoPayload_Uncompressed, FrameInfo, pBuffer ), bHolds );
+      EXPECT_EQ( pBuffer.get(), pBefore );
+      EXPECT_EQ( FrameInfo, rFrameInfo );
+      EXPECT_EQ( Log.Lines().size(), bHolds ? 0u : 1u );
       if( Bytes == 35 )
       {
         EXPECT_EQ( Log.Lines().at( 0 ), "2 Uncompressed frame of 35 bytes does not hold a 4 x 3 frame of pixel format "
                                         "'R8G8B8' (36 bytes)." );
       }
+      // No buffer is no frame, whatever the payload.
+      std::shared_ptr< IBuffer > pNone;
+      for( EVideoPayload Payload : { VideoPayload_Uncompressed, VideoPayload_ImageJPEG, VideoPayload_VideoH264 } )
+        EXPECT_FALSE( Decode( Payload, FrameInfo, pNone ) );
     }
   }
 
   // A stand-in decoder: notes what it is given and answers as told.
-  class VFakeH264Decoder : public IH264Decoder
+  struct VFakeH264Decoder : IH264Decoder
   {
-  public:
     VFakeH264Decoder( std::shared_ptr< IBufferAllocator > i_pAllocator, bool i_bSucceed, bool i_bGiveFrame )
-        : m_pAllocator( std::move( i_pAllocator ) ), m_bSucceed( i_bSucceed ), m_bGiveFrame( i_bGiveFrame )
+        : pAllocator( std::move( i_pAllocator ) ), bSucceed( i_bSucceed ), bGiveFrame( i_bGiveFrame )
     {
     }
     bool Decode( const IBufferConst& i_rInput, EPixelFormat i_PixelFormat, std::shared_ptr< IBuffer >& o_rOutput,
@@ -104,19 +99,17 @@ namespace
     {
       InputSize = i_rInput.GetSize();
       Wished = i_PixelFormat;
-      if( m_bGiveFrame )
+      if( bGiveFrame )
       {
         io_VideoFrameInfo = Info( 2, 2, PixelFormat_U8Y8V8Y8 );
-        m_pAllocator->Allocate( o_rOutput, 8 );
+        pAllocator->Allocate( o_rOutput, 8 );
       }
-      return m_bSucceed;
+      return bSucceed;
     }
+    std::shared_ptr< IBufferAllocator > pAllocator;
+    bool bSucceed, bGiveFrame;
     std::uint64_t InputSize = 0;
     EPixelFormat Wished = PixelFormat_Unspecified;
-
-  private:
-    std::shared_ptr< IBufferAllocator > m_pAllocator;
-    bool m_bSucceed, m_bGiveFrame;
   };
 
   TEST_F( FrameDecoder, H264GoesThroughTheDecoder )
@@ -187,14 +180,8 @@ namespace
       auto pBuffer = Payload( rCase.Bytes );
       IVideoFrameInfo FrameInfo = Info( 8, 8, PixelFormat_R8G8B8 );
       EXPECT_FALSE( Decode( rCase.Payload, FrameInfo, pBuffer ) );
-      if( rCase.LogLine.empty() )
-      {
-        EXPECT_TRUE( Log.Lines().empty() );
-      }
-      else
-      {
-        EXPECT_EQ( Log.Lines(), std::vector< std::string >{ rCase.LogLine } );
-      }
+      EXPECT_EQ( Log.Lines(),
+                 rCase.LogLine.empty() ? std::vector< std::string >() : std::vector< std::string >{ rCase.LogLine } );
     }
   }
 } // namespace
