@@ -6,7 +6,6 @@
 
 #include <boost/filesystem.hpp>
 
-#include <cstring>
 #include <fstream>
 #include <iterator>
 
@@ -17,13 +16,6 @@ namespace LumekVideoTest
     for( int i = 0; i < i_Bytes; ++i )
       Bytes.push_back( static_cast< std::uint8_t >( i_Value >> ( 8 * i ) ) );
     return *this;
-  }
-
-  VByteWriter& VByteWriter::F64( double i_Value )
-  {
-    std::uint64_t Bits = 0;
-    std::memcpy( &Bits, &i_Value, sizeof( Bits ) );
-    return U64( Bits );
   }
 
   VByteWriter& VByteWriter::Raw( const VBytes& i_rBytes )
@@ -68,11 +60,13 @@ namespace LumekVideoTest
     return i_rStore.WriteTo( Stream ) ? Stream.GetData() : VBytes();
   }
 
-  VBytes DescriptionBlock( const ZOL::IVideoFrameInfo& i_rVideo, const ZOL::IAudioFrameInfo& i_rAudio )
+  VBytes DescriptionBlock( const ZOL::IVideoFrameInfo& i_rVideo, const ZOL::IAudioFrameInfo& i_rAudio,
+                           const std::string& i_rWithoutKey )
   {
     ZOL::IVideoAttributes Store;
     ZOL::WriteVideoFrameInfo( Store, i_rVideo );
     ZOL::WriteAudioFrameInfo( Store, "", i_rAudio );
+    Store.Remove( i_rWithoutKey );
     return SerialiseStore( Store );
   }
 

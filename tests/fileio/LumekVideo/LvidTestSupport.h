@@ -22,11 +22,8 @@ namespace LumekVideoTest
   {
   public:
     VByteWriter& Int( std::uint64_t i_Value, int i_Bytes );
-    VByteWriter& U8( std::uint8_t i_Value ) { return Int( i_Value, 1 ); }
-    VByteWriter& U16( std::uint16_t i_Value ) { return Int( i_Value, 2 ); }
     VByteWriter& U32( std::uint32_t i_Value ) { return Int( i_Value, 4 ); }
     VByteWriter& U64( std::uint64_t i_Value ) { return Int( i_Value, 8 ); }
-    VByteWriter& F64( double i_Value );
     VByteWriter& Raw( const VBytes& i_rBytes );
     VByteWriter& Text( const std::string& i_rText ) { return Raw( VBytes( i_rText.begin(), i_rText.end() ) ); }
     VByteWriter& PadTo( std::uint64_t i_Alignment );
@@ -51,8 +48,9 @@ namespace LumekVideoTest
 
   // The serial form of a store, as its own WriteTo gives it.
   VBytes SerialiseStore( const ZOL::IVideoAttributes& i_rStore );
-  // The frame description block of a recording with this video and audio.
-  VBytes DescriptionBlock( const ZOL::IVideoFrameInfo& i_rVideo, const ZOL::IAudioFrameInfo& i_rAudio );
+  // The frame description block of a recording with this video and audio, less one key if named.
+  VBytes DescriptionBlock( const ZOL::IVideoFrameInfo& i_rVideo, const ZOL::IAudioFrameInfo& i_rAudio,
+                           const std::string& i_rWithoutKey = "" );
 
   struct VRecord
   {
