@@ -21,7 +21,6 @@ using LumekTest::ShellQuote;
 namespace
 {
   const std::string s_AppId = "com.lumek.LumekVideoViewer";
-  const int s_IconSizes[] = { 16, 22, 24, 32, 48, 64, 128, 256 };
 
   bool Have( const std::string& i_rProgram )
   {
@@ -92,22 +91,17 @@ TEST_F( InstalledTree, HoldsExactlyTheProgramsAndTheDesktopFiles )
       "share/man/man1/lumekvideoviewer.1.gz",
       "share/man/man1/lumekvideotool.1.gz",
   };
-  for( int Size : s_IconSizes )
-    Expected.insert( "share/icons/hicolor/" + std::to_string( Size ) + "x" + std::to_string( Size ) + "/apps/" +
-                     s_AppId + ".png" );
-  EXPECT_EQ( s_Installed, Expected );
-
-  for( int Size : s_IconSizes )
+  for( int Size : { 16, 22, 24, 32, 48, 64, 128, 256 } )
   {
     const std::string Icon =
-        ( Prefix() / "share/icons/hicolor" / ( std::to_string( Size ) + "x" + std::to_string( Size ) ) / "apps" /
-          ( s_AppId + ".png" ) )
-            .string();
-    const QImage Image( QString::fromStdString( Icon ) );
+        "share/icons/hicolor/" + std::to_string( Size ) + "x" + std::to_string( Size ) + "/apps/" + s_AppId + ".png";
+    Expected.insert( Icon );
+    const QImage Image( QString::fromStdString( ( Prefix() / Icon ).string() ) );
     EXPECT_EQ( Image.size(), QSize( Size, Size ) ) << Icon;
     // A rendered icon, not an empty canvas: its middle is opaque.
     EXPECT_EQ( qAlpha( Image.pixel( Size / 2, Size / 2 ) ), 255 ) << Icon;
   }
+  EXPECT_EQ( s_Installed, Expected );
   for( const char* pProgram : { "lumekvideoviewer", "lumekvideotool" } )
     EXPECT_TRUE( fs::status( Prefix() / "bin" / pProgram ).permissions() & fs::owner_exe ) << pProgram;
 }
@@ -168,51 +162,34 @@ TEST_F( InstalledTree, FileTypesAreNamedByTheDatabase )
     GTEST_SKIP() << "update-mime-database, xdg-mime and gio are needed (scripts/install-deps.sh installs them)";
   MustRun( "update-mime-database " + ShellQuote( ( Share() / "mime" ).string() ) );
   fs::create_directories( Scratch( "home" ) );
-  const std::string Recording = WriteRecording( "made.lvid" );
-  const struct
+  const std::string Recording = WriteRecording( "take.lvid" ), Renamed = Scratch( "take.bin" ).string(),
+                    Sequence = Scratch( "take.lumekimagesequence" ).string();
+  fs::copy_file( Recording, Renamed );
+  std::ofstream( Sequence ) << "frames/take_%06d.png\n";
+  // The contents name a recording whatever it is called.
+  for( const auto& [Path, Expected] :
+       { std::pair( Recording, "video/x-lumek-lvid" ), std::pair( Renamed, "video/x-lumek-lvid" ),
+         std::pair( Sequence, "application/x-lumek-imagesequence" ) } )
   {
-    const char* FileName;
-    bool bRecording; // a real recording, or a few bytes of text
-    const char* Expected;
-  } Cases[] = {
-      { "take.lvid", true, "video/x-lumek-lvid" },
-      // The contents name a recording whatever it is called.
-      { "take", true, "video/x-lumek-lvid" },
-      { "take.bin", true, "video/x-lumek-lvid" },
-      { "take.lumekimagesequence", false, "application/x-lumek-imagesequence" },
-  };
-  for( const auto& rCase : Cases )
-  {
-    SCOPED_TRACE( rCase.FileName );
-    const std::string Path = Scratch( rCase.FileName ).string();
-    if( rCase.bRecording )
-      fs::copy_file( Recording, Path, fs::copy_option::overwrite_if_exists );
-    else
-      std::ofstream( Path ) << "frames/take_%06d.png\n";
     const std::string Type = MustRun(
         "XDG_CURRENT_DESKTOP=GNOME XDG_DATA_HOME=" + ShellQuote( Scratch( "home" ).string() ) +
         " XDG_DATA_DIRS=" + ShellQuote( Share().string() ) + " xdg-mime query filetype " + ShellQuote( Path ) );
-    EXPECT_EQ( boost::trim_copy( Type ), rCase.Expected );
+    EXPECT_EQ( boost::trim_copy( Type ), Expected ) << Path;
   }
 }
 
 TEST_F( InstalledTree, ThumbnailerCommandRunsAsWritten )
 {
-  std::ifstream File( ( Share() / "thumbnailers/lumekvideotool.thumbnailer" ).string() );
-  std::string Exec, MimeTypes;
-  for( std::string Line; std::getline( File, Line ); )
-  {
-    if( boost::starts_with( Line, "Exec=" ) )
-      Exec = Line.substr( 5 );
-    if( boost::starts_with( Line, "MimeType=" ) )
-      MimeTypes = Line.substr( 9 );
-  }
-  EXPECT_EQ( Exec, "lumekvideotool thumbnail %i %o --size %s" );
-  EXPECT_NE( MimeTypes.find( "video/x-lumek-lvid;" ), std::string::npos ) << MimeTypes;
+  std::stringstream File;
+  File << std::ifstream( ( Share() / "thumbnailers/lumekvideotool.thumbnailer" ).string() ).rdbuf();
+  const std::string Text = File.str();
+  const auto Exec = Text.find( "\nExec=" ) + 6;
+  std::string Command = Text.substr( Exec, Text.find( '\n', Exec ) - Exec );
+  EXPECT_EQ( Command, "lumekvideotool thumbnail %i %o --size %s" );
+  EXPECT_NE( Text.find( "\nMimeType=video/x-lumek-lvid;" ), std::string::npos ) << Text;
 
   // As a thumbnail manager runs it: the program from PATH, the fields replaced by quoted words.
   const std::string Output = Scratch( "thumb nail.png" ).string();
-  std::string Command = Exec;
   boost::replace_all( Command, "%i", ShellQuote( WriteRecording( "a take with spaces.lvid" ) ) );
   boost::replace_all( Command, "%o", ShellQuote( Output ) );
   boost::replace_all( Command, "%s", "32" );
@@ -225,18 +202,12 @@ TEST_F( InstalledTree, DebianPackageControlAndContents )
 {
   if( !Have( "dpkg-deb" ) || !Have( "cpack" ) )
     GTEST_SKIP() << "dpkg-deb and cpack are needed";
-  const fs::path Folder = fs::temp_directory_path() / fs::unique_path( "lumek-deb-%%%%%%%%" );
-  fs::create_directories( Folder );
-  const std::string Build = MustRun( "cd " + ShellQuote( Folder.string() ) + " && cpack -G DEB --config " +
-                                     ShellQuote( std::string( LUMEK_BUILD_DIR ) + "/CPackConfig.cmake" ) );
-  fs::path Deb;
-  for( fs::directory_iterator It( Folder ), End; It != End; ++It )
-    if( It->path().extension() == ".deb" )
-      Deb = It->path();
-  ASSERT_FALSE( Deb.empty() ) << Build;
-
+  const std::string Folder = ShellQuote( Scratch( "deb" ).string() );
+  MustRun( "mkdir " + Folder + " && cd " + Folder + " && cpack -G DEB --config " +
+           ShellQuote( std::string( LUMEK_BUILD_DIR ) + "/CPackConfig.cmake" ) );
+  const std::string Deb = boost::trim_copy( MustRun( "ls " + Folder + "/*.deb" ) );
   const auto Field = [&]( const std::string& i_rName )
-  { return boost::trim_copy( RunCommand( "dpkg-deb -f " + ShellQuote( Deb.string() ) + " " + i_rName ) ); };
+  { return boost::trim_copy( RunCommand( "dpkg-deb -f " + ShellQuote( Deb ) + " " + i_rName ) ); };
   EXPECT_EQ( Field( "Package" ), "lumekvideoviewer" );
   EXPECT_EQ( Field( "Section" ), "video" );
   const std::string Depends = Field( "Depends" );
@@ -252,12 +223,9 @@ TEST_F( InstalledTree, DebianPackageControlAndContents )
   for( std::string& rPackage : Packages )
     MustRun( "dpkg-query -W " + ShellQuote( boost::trim_copy( rPackage ) ) + " >/dev/null" );
 
-  const std::string Contents = RunCommand( "dpkg-deb -c " + ShellQuote( Deb.string() ) );
+  const std::string Contents = RunCommand( "dpkg-deb -c " + ShellQuote( Deb ) );
   for( const std::string& rPath : s_Installed )
     EXPECT_NE( Contents.find( "./usr/" + rPath + "\n" ), std::string::npos ) << rPath << "\n" << Contents;
   for( const char* pFolder : { "./usr/lib", "./usr/include" } )
     EXPECT_EQ( Contents.find( pFolder ), std::string::npos ) << Contents;
-
-  boost::system::error_code Error;
-  fs::remove_all( Folder, Error );
 }
