@@ -4,8 +4,9 @@
 #include <QString>
 #include <QStringList>
 #include <QTcpServer>
+#include <QTcpSocket>
 
-class QTcpSocket;
+#include <memory>
 
 // A version server for the tests: plain HTTP on 127.0.0.1 at a port of its own choice, one reply
 // per connection.
@@ -20,7 +21,30 @@ public:
     Stream  // send such a body without announcing its length, ending it by closing
   };
 
-  VTestServer();
+  VTestServer()
+  {
+    m_Server.listen( QHostAddress::LocalHost, 0 );
+    QObject::connect( &m_Server, &QTcpServer::newConnection, &m_Server,
+                      [this]
+                      {
+                        while( QTcpSocket* pSocket = m_Server.nextPendingConnection() )
+                        {
+                          QObject::connect( pSocket, &QTcpSocket::disconnected, pSocket, &QObject::deleteLater );
+                          // Everything up to the blank line that ends the request's header; nothing
+                          // is read after it.
+                          auto pHeader = std::make_shared< QByteArray >();
+                          QObject::connect( pSocket, &QTcpSocket::readyRead, pSocket,
+                                            [this, pSocket, pHeader]
+                                            {
+                                              if( pHeader->endsWith( "\r\n\r\n" ) )
+                                                return;
+                                              pHeader->append( pSocket->readAll() );
+                                              if( pHeader->contains( "\r\n\r\n" ) )
+                                                Answer( *pSocket, pHeader->left( pHeader->indexOf( "\r\n\r\n" ) + 4 ) );
+                                            } );
+                        }
+                      } );
+  }
 
   void SetReply( int i_Status, const QByteArray& i_rBody ) { m_Status = i_Status, m_Body = i_rBody; }
   void SetMode( EMode i_Mode ) { m_Mode = i_Mode; }
@@ -30,11 +54,31 @@ public:
   // The request targets received so far, e.g. "/?protocol=1.0&name=...".
   const QStringList& Requests() const { return m_Requests; }
 
-  // A port on 127.0.0.1 where nothing listens.
-  static quint16 ClosedPort();
+  // The address of a port on 127.0.0.1 where nothing listens.
+  static std::string ClosedUrl()
+  {
+    QTcpServer Probe;
+    Probe.listen( QHostAddress::LocalHost, 0 );
+    return QStringLiteral( "http://127.0.0.1:%1/" ).arg( Probe.serverPort() ).toStdString();
+  }
 
 private:
-  void Answer( QTcpSocket& io_rSocket, const QByteArray& i_rHeader );
+  void Answer( QTcpSocket& io_rSocket, const QByteArray& i_rHeader )
+  {
+    m_Requests << QString::fromLatin1( i_rHeader.left( i_rHeader.indexOf( "\r\n" ) ).split( ' ' ).value( 1 ) );
+    if( m_Mode == EMode::Silent )
+      return;
+    const bool bLarge = m_Mode == EMode::Flood || m_Mode == EMode::Stream;
+    const QByteArray Body = bLarge ? QByteArray( 2 * 1024 * 1024, 'x' ) : m_Body;
+    QByteArray Header = QStringLiteral( "HTTP/1.1 %1 %2\r\nContent-Type: text/html\r\nConnection: close\r\n" )
+                            .arg( m_Status )
+                            .arg( m_Status == 200 ? "OK" : "Not Found" )
+                            .toLatin1();
+    if( m_Mode != EMode::Stream )
+      Header += "Content-Length: " + QByteArray::number( Body.size() ) + "\r\n";
+    io_rSocket.write( Header + "\r\n" + Body );
+    io_rSocket.disconnectFromHost();
+  }
 
   QTcpServer m_Server;
   EMode m_Mode = EMode::Answer;

@@ -15,11 +15,15 @@
 
 #include <QApplication>
 #include <QCheckBox>
+#include <QDesktopServices>
 #include <QEventLoop>
+#include <QLabel>
 #include <QPushButton>
 #include <QSettings>
+#include <QStyle>
 #include <QTextBrowser>
 #include <QTimer>
+#include <QUrl>
 
 #include <algorithm>
 #include <functional>
@@ -47,12 +51,15 @@ namespace
     return i_Done();
   }
 
+  bool Idle( const VVersionCheck& i_rCheck )
+  {
+    return i_rCheck.findChildren< VVersionCheckListener* >().isEmpty();
+  }
+
   struct IOutcome
   {
     int Status;
-    std::string Body;
-    std::string MessageType;
-    std::string Error;
+    std::string Body, MessageType, Error;
   };
 
   // The application's settings over the test's store, with each check's outcome kept aside.
@@ -69,13 +76,30 @@ namespace
     std::vector< IOutcome > Outcomes;
   };
 
+  // A dialog as the user sees it; the icon is the style's own message box icon at the size the
+  // style gives them: "information" or "critical".
   struct IShownDialog
   {
-    QString Title;
-    QString Text;
+    QString Title, Text;
     bool bCheckBox;
-    bool bError;
+    std::string Icon;
   };
+
+  IShownDialog Describe( const VVersionCheckMessageBox& i_rBox )
+  {
+    IShownDialog Shown{ i_rBox.windowTitle(), i_rBox.GetTextBrowser()->toPlainText(), i_rBox.GetCheckBox() != nullptr,
+                        "" };
+    const int Size = i_rBox.style()->pixelMetric( QStyle::PM_MessageBoxIconSize );
+    for( const auto& [Icon, pName] : { std::pair( QStyle::SP_MessageBoxInformation, "information" ),
+                                       std::pair( QStyle::SP_MessageBoxCritical, "critical" ) } )
+    {
+      const QImage Wanted = i_rBox.style()->standardIcon( Icon ).pixmap( Size, Size ).toImage();
+      for( const QLabel* pLabel : i_rBox.findChildren< QLabel* >() )
+        if( pLabel->pixmap( Qt::ReturnByValue ).toImage() == Wanted )
+          Shown.Icon += pName;
+    }
+    return Shown;
+  }
 
   // A reply page as the server sends it: a message to show, the record in a comment.
   std::string Page( const std::string& i_rCheckVersion, const std::string& i_rType, const std::string& i_rId,
@@ -97,8 +121,7 @@ namespace
       Check.SetDialogRunner(
           [this]( VVersionCheckMessageBox& io_rBox )
           {
-            Shown.push_back( { io_rBox.windowTitle(), io_rBox.GetTextBrowser()->toPlainText(),
-                               io_rBox.GetCheckBox() != nullptr, io_rBox.IsError() } );
+            Shown.push_back( Describe( io_rBox ) );
             if( bTickBox && io_rBox.GetCheckBox() )
               io_rBox.GetCheckBox()->setChecked( true );
           } );
@@ -114,12 +137,17 @@ namespace
       Server.SetReply( i_Status, QByteArray::fromStdString( i_rBody ) );
     }
 
-    // One check, run until its listener is gone.
+    bool Send( bool i_bStartupCheck, unsigned i_TimeoutSeconds = 10 )
+    {
+      return Check.Check( "LumekVideoViewer", "1.10.0.137509h", "Debian+GNU/Linux+12+64Bit", i_bStartupCheck, pSettings,
+                          i_TimeoutSeconds, "1.0" );
+    }
+
+    // One check, run until every listener is gone.
     bool RunCheck( bool i_bStartupCheck, unsigned i_TimeoutSeconds = 10 )
     {
-      const bool bSent = Check.Check( "LumekVideoViewer", "1.10.0.137509h", "Debian+GNU/Linux+12+64Bit",
-                                      i_bStartupCheck, pSettings, i_TimeoutSeconds, "1.0" );
-      EXPECT_TRUE( RunUntil( [this] { return Check.findChildren< VVersionCheckListener* >().isEmpty(); } ) );
+      const bool bSent = Send( i_bStartupCheck, i_TimeoutSeconds );
+      EXPECT_TRUE( RunUntil( [this] { return Idle( Check ); } ) );
       return bSent;
     }
 
@@ -152,65 +180,38 @@ namespace
     {
       const char* Name;
       std::string Body;
-      int HttpStatus;
+      int HttpStatus; // 0: nothing listens
       bool bStartupCheck;
       std::optional< std::string > StoredId;
       std::optional< bool > StoredShowOnStartup;
       // Expected:
-      int Dialogs;
-      bool bCheckBox;
-      bool bErrorIcon;
-      bool bComplete;
+      std::string Dialog; // "", "plain", "box" (with the box to tick) or "error"
       int Status;
-      std::string MessageType;
-      std::string Error; // checked when not empty
+      std::string MessageType; // empty: no outcome and no completion
+      std::string Error;       // checked when not empty
       std::vector< std::string > Versions;
       std::vector< std::vector< std::string > > Whitelists;
     } Cases[] = {
         // Each row: name, reply body, HTTP status, at start, stored id and show-at-start; then the
-        // dialogs shown, with a check box, with the error icon, completed, the reported status and
-        // message type, the error (when not empty), the versions and whitelists announced.
+        // dialog shown, the reported status, message type and error, the versions and whitelists
+        // announced. What a user's earlier choice does is DoNotShowAgainHoldsUntilTheIdChanges.
         // clang-format off
-        { "OptionalNewAtStart", Optional, 200, true, {}, {},
-          1, true, false, true, 0, "OPTIONAL", "", Newest, {} },
-        { "OptionalSeenAndDeclinedAtStart", Optional, 200, true, "A", false,
-          0, false, false, true, 0, "OPTIONAL", "", Newest, {} },
-        { "OptionalSeenStillWantedAtStart", Optional, 200, true, "A", true,
-          1, true, false, true, 0, "OPTIONAL", "", Newest, {} },
-        { "OptionalDeclinedButNewIdAtStart", Optional, 200, true, "old", false,
-          1, true, false, true, 0, "OPTIONAL", "", Newest, {} },
-        { "OptionalDeclinedOnRequest", Optional, 200, false, "A", false,
-          1, false, false, true, 0, "OPTIONAL", "", Newest, {} },
-        { "RequiredDeclinedAtStart", Required, 200, true, "A", false,
-          1, false, false, true, 0, "REQUIRED", "", Newest, {} },
-        { "NoneAtStart", None, 200, true, {}, {},
-          0, false, false, true, 0, "NONE", "", Newest, {} },
-        { "NoneOnRequest", None, 200, false, "A", true,
-          1, false, false, true, 0, "NONE", "", Newest, {} },
-        { "TypeAbsentAtStart", "<!--{\"CheckVersion\":\"1.0\",\"Id\":\"A\"}-->", 200, true, {}, {},
-          0, false, false, true, 0, "NONE", "", { "" }, {} },
-        { "Format2AtStart", Page( "2.0", "REQUIRED", "A" ), 200, true, {}, {},
-          0, false, false, false, 0, "", "", {}, {} },
-        { "Format2OnRequest", Page( "2.0", "REQUIRED", "A" ), 200, false, {}, {},
-          0, false, false, false, 0, "", "", {}, {} },
-        { "Format3NewAtStart", Whitelisted, 200, true, {}, {},
-          0, false, false, true, 0, "NONE", "", Newest, Listed },
-        { "Format3DeclinedAtStart", Whitelisted, 200, true, "A", false,
-          0, false, false, true, 0, "NONE", "", {}, {} },
-        { "Format3DeclinedOnRequest", Whitelisted, 200, false, "A", false,
-          0, false, false, true, 0, "NONE", "", Newest, Listed },
-        { "Format3WithoutWhitelist", Page( "3.0", "NONE", "A" ), 200, false, {}, {},
-          0, false, false, true, 0, "NONE", "", Newest, { {} } },
+        { "OptionalNewAtStart", Optional, 200, true, {}, {}, "box", 0, "OPTIONAL", "", Newest, {} },
+        { "NoneAtStart", None, 200, true, {}, {}, "", 0, "NONE", "", Newest, {} },
+        { "NoneOnRequest", None, 200, false, "A", true, "plain", 0, "NONE", "", Newest, {} },
+        // A "2.0" reply is answered by silence.
+        { "Format2AtStart", Page( "2.0", "REQUIRED", "A" ), 200, true, {}, {}, "", 0, "", "", {}, {} },
+        { "Format3NewAtStart", Whitelisted, 200, true, {}, {}, "", 0, "NONE", "", Newest, Listed },
+        { "Format3DeclinedAtStart", Whitelisted, 200, true, "A", false, "", 0, "NONE", "", {}, {} },
+        { "Format3WithoutWhitelistDeclinedOnRequest", Page( "3.0", "NONE", "A" ), 200, false, "A", false,
+          "", 0, "NONE", "", Newest, { {} } },
         { "UnknownFormatOnRequest", Page( "4.0", "REQUIRED", "A" ), 200, false, {}, {},
-          0, false, false, true, 0, "REQUIRED", "", {}, {} },
-        { "BadJsonOnRequest", "<!--{\n\"CheckVersion\": \"1.0\",\n}-->", 200, false, {}, {},
-          0, false, false, true, 0, "NONE", "Error parsing JSON data: expected key string on line 3", {}, {} },
+          "", 0, "REQUIRED", "", {}, {} },
         { "NoCommentAtStart", "<html><body>Down for maintenance</body></html>", 200, true, {}, {},
-          0, false, false, true, 0, "NONE", "Error parsing JSON data: expected value on line 1", {}, {} },
-        { "NotFoundAtStart", Required, 404, true, {}, {},
-          0, false, false, true, 203, "NONE", "", {}, {} },
-        { "NotFoundOnRequest", Required, 404, false, {}, {},
-          1, false, true, true, 203, "NONE", "", {}, {} },
+          "", 0, "NONE", "Error parsing JSON data: expected value on line 1", {}, {} },
+        // Nothing at start depends on the server: only a user who asked hears that it failed.
+        { "NotFoundAtStart", Required, 404, true, {}, {}, "", 203, "NONE", "", {}, {} },
+        { "RefusedOnRequest", "", 0, false, {}, {}, "error", 1, "NONE", "", {}, {} },
         // clang-format on
     };
     for( const auto& rCase : Cases )
@@ -221,16 +222,18 @@ namespace
         H.pSettings->SetMessageId( *rCase.StoredId );
       if( rCase.StoredShowOnStartup )
         H.pSettings->SetShowOnStartup( *rCase.StoredShowOnStartup );
+      if( rCase.HttpStatus == 0 )
+        H.Check.SetServer( VTestServer::ClosedUrl() );
       H.Serve( rCase.Body, rCase.HttpStatus );
       ASSERT_TRUE( H.RunCheck( rCase.bStartupCheck ) );
 
-      ASSERT_EQ( static_cast< int >( H.Shown.size() ), rCase.Dialogs );
+      ASSERT_EQ( H.Shown.size(), rCase.Dialog.empty() ? 0u : 1u );
       for( const auto& rShown : H.Shown )
       {
         EXPECT_EQ( rShown.Title, "Checking LumekVideoViewer Version" );
-        EXPECT_EQ( rShown.bCheckBox, rCase.bCheckBox );
-        EXPECT_EQ( rShown.bError, rCase.bErrorIcon );
-        if( rCase.bErrorIcon )
+        EXPECT_EQ( rShown.bCheckBox, rCase.Dialog == "box" );
+        EXPECT_EQ( rShown.Icon, rCase.Dialog == "error" ? "critical" : "information" );
+        if( rCase.Dialog == "error" )
           EXPECT_TRUE( rShown.Text.startsWith( "Unable to contact version check server.\n"
                                                "Please check your network connection and try again.\n" ) )
               << rShown.Text.toStdString();
@@ -240,13 +243,13 @@ namespace
       EXPECT_EQ( H.Versions, rCase.Versions );
       EXPECT_EQ( H.Whitelists, rCase.Whitelists );
 
-      // A reply of a format the check does not know ends it without an outcome.
-      EXPECT_EQ( H.Completions, rCase.bComplete ? std::vector< bool >{ rCase.bStartupCheck } : std::vector< bool >{} );
-      ASSERT_EQ( H.pSettings->Outcomes.size(), rCase.bComplete ? 1u : 0u );
-      if( !rCase.bComplete )
+      const bool bOutcome = !rCase.MessageType.empty();
+      EXPECT_EQ( H.Completions, bOutcome ? std::vector< bool >{ rCase.bStartupCheck } : std::vector< bool >{} );
+      ASSERT_EQ( H.pSettings->Outcomes.size(), bOutcome ? 1u : 0u );
+      if( !bOutcome )
         continue;
       const IOutcome& rOutcome = H.pSettings->Outcomes[0];
-      EXPECT_EQ( rOutcome.Status, rCase.Status );
+      EXPECT_EQ( rOutcome.Status, rCase.Status ) << rOutcome.Error;
       EXPECT_EQ( rOutcome.MessageType, rCase.MessageType );
       EXPECT_EQ( rOutcome.Body, rCase.Body );
       if( !rCase.Error.empty() )
@@ -265,13 +268,16 @@ namespace
     EXPECT_TRUE( Shown.back().bCheckBox );
     EXPECT_FALSE( pSettings->GetShowOnStartup() );
 
-    RunCheck( true );
-    EXPECT_EQ( Shown.size(), 1u ) << "the same message came back at start after the user declined it";
-
+    // Two checks at once, each with its own answer; a check returns before its answer comes.
+    ASSERT_TRUE( Send( true ) );
+    EXPECT_EQ( pSettings->Outcomes.size(), 1u );
     RunCheck( false );
-    ASSERT_EQ( Shown.size(), 2u ) << "a user's check shows the message anyway";
+    ASSERT_EQ( Shown.size(), 2u ) << "the declined message stays away at start; a user's check shows it anyway";
     EXPECT_FALSE( Shown.back().bCheckBox );
     EXPECT_FALSE( pSettings->GetShowOnStartup() );
+    EXPECT_EQ( pSettings->Outcomes.size(), 3u );
+    std::sort( Completions.begin(), Completions.end() );
+    EXPECT_EQ( Completions, ( std::vector< bool >{ false, true, true } ) );
 
     Serve( Page( "1.0", "OPTIONAL", "B" ) );
     bTickBox = false;
@@ -280,65 +286,41 @@ namespace
     EXPECT_EQ( Shown.back().Text, "Message B" );
     EXPECT_TRUE( pSettings->GetShowOnStartup() );
     EXPECT_EQ( Store.value( "LumekVideoViewer.MessageId" ).toString(), "B" );
-    EXPECT_EQ( Server.Requests().size(), 4 );
+
+    // Not declined, it comes back at the next start; now declined, and then required.
+    bTickBox = true;
+    RunCheck( true );
+    ASSERT_EQ( Shown.size(), 4u );
+    EXPECT_TRUE( Shown.back().bCheckBox );
+    EXPECT_FALSE( pSettings->GetShowOnStartup() );
+    EXPECT_EQ( Server.Requests().size(), 5 );
 
     // A required message offers no box to tick and comes back at every start.
-    Serve( Required );
-    bTickBox = true;
+    Serve( Page( "1.0", "REQUIRED", "B" ) );
     for( int Start = 0; Start < 2; ++Start )
       RunCheck( true );
-    ASSERT_EQ( Shown.size(), 5u );
-    EXPECT_FALSE( Shown[3].bCheckBox || Shown[4].bCheckBox );
+    ASSERT_EQ( Shown.size(), 6u );
+    EXPECT_FALSE( Shown[4].bCheckBox || Shown[5].bCheckBox );
   }
 
   TEST_F( VersionCheckTest, SilentServerTimesOutWithoutADialog )
   {
     Server.SetMode( VTestServer::EMode::Silent );
-    for( const bool bStartupCheck : { true, false } )
-    {
-      pSettings->Outcomes.clear();
-      ASSERT_TRUE( RunCheck( bStartupCheck, 1 ) );
-      ASSERT_EQ( pSettings->Outcomes.size(), 1u );
-      const IOutcome& rOutcome = pSettings->Outcomes[0];
-      EXPECT_EQ( rOutcome.Status, 4 );
-      EXPECT_EQ( rOutcome.Body, "" );
-      EXPECT_EQ( rOutcome.MessageType, "NONE" );
-      EXPECT_EQ( rOutcome.Error, "Version check request timeout" );
-    }
-    EXPECT_TRUE( Shown.empty() );
-    EXPECT_TRUE( Completions.empty() );
-    EXPECT_EQ( Server.Requests().size(), 2 );
-  }
-
-  TEST_F( VersionCheckTest, RefusedConnectionIsSilentAtStartAndShownOnRequest )
-  {
-    Check.SetServer( QStringLiteral( "http://127.0.0.1:%1/" ).arg( VTestServer::ClosedPort() ).toStdString() );
-    RunCheck( true );
-    EXPECT_TRUE( Shown.empty() );
-    RunCheck( false );
-    ASSERT_EQ( Shown.size(), 1u );
-    EXPECT_TRUE( Shown[0].bError );
-    EXPECT_FALSE( Shown[0].bCheckBox );
-    ASSERT_EQ( pSettings->Outcomes.size(), 2u );
-    for( const auto& rOutcome : pSettings->Outcomes )
-      EXPECT_EQ( rOutcome.Status, 1 ) << rOutcome.Error; // QNetworkReply::ConnectionRefusedError
-    EXPECT_EQ( Completions, ( std::vector< bool >{ true, false } ) );
-  }
-
-  TEST_F( VersionCheckTest, EmptyServerFailsSilentlyAtStart )
-  {
-    Check.SetServer( "" );
-    EXPECT_EQ( Check.RequestUrl( "LumekVideoViewer", "1.10.0.137509h", "X+64Bit", "1.0" ),
-               "?protocol=1.0&name=LumekVideoViewer&version=1.10.0.137509h&system=X+64Bit" );
-    ASSERT_TRUE( RunCheck( true ) );
-    EXPECT_TRUE( Shown.empty() );
+    ASSERT_TRUE( RunCheck( false, 1 ) );
     ASSERT_EQ( pSettings->Outcomes.size(), 1u );
-    EXPECT_NE( pSettings->Outcomes[0].Status, 0 );
-    EXPECT_EQ( Completions, std::vector< bool >{ true } );
+    const IOutcome& rOutcome = pSettings->Outcomes[0];
+    EXPECT_EQ( rOutcome.Status, 4 );
+    EXPECT_EQ( rOutcome.Body, "" );
+    EXPECT_EQ( rOutcome.MessageType, "NONE" );
+    EXPECT_EQ( rOutcome.Error, "Version check request timeout" );
+    EXPECT_TRUE( Shown.empty() ) << "not even a user's check reports the silence";
+    EXPECT_TRUE( Completions.empty() );
+    EXPECT_EQ( Server.Requests().size(), 1 );
   }
 
   TEST_F( VersionCheckTest, FloodingServerIsCutOff )
   {
+    // Flood is cut off by the announced length, Stream by the bytes that came.
     for( const auto Mode : { VTestServer::EMode::Flood, VTestServer::EMode::Stream } )
     {
       pSettings->Outcomes.clear();
@@ -351,27 +333,13 @@ namespace
     }
   }
 
-  TEST_F( VersionCheckTest, OverlappingChecksEachGetTheirAnswer )
-  {
-    Serve( None );
-    ASSERT_TRUE( Check.Check( "LumekVideoViewer", "1", "S", true, pSettings, 10, "1.0" ) );
-    EXPECT_TRUE( pSettings->Outcomes.empty() ) << "a check must return before its answer comes";
-    ASSERT_TRUE( RunCheck( false ) );
-    EXPECT_EQ( pSettings->Outcomes.size(), 2u );
-    std::sort( Completions.begin(), Completions.end() );
-    EXPECT_EQ( Completions, ( std::vector< bool >{ false, true } ) );
-    EXPECT_EQ( Shown.size(), 1u );
-  }
-
   TEST_F( VersionCheckTest, RefusesWithoutSettingsOrOffTheMainThread )
   {
     EXPECT_FALSE( Check.Check( "LumekVideoViewer", "1", "S", true, nullptr, 10, "1.0" ) );
     bool bSentFromThread = true;
-    std::thread Other( [&]
-                       { bSentFromThread = Check.Check( "LumekVideoViewer", "1", "S", true, pSettings, 10, "1.0" ); } );
-    Other.join();
+    std::thread( [&] { bSentFromThread = Send( true ); } ).join();
     EXPECT_FALSE( bSentFromThread );
-    EXPECT_TRUE( Check.findChildren< VVersionCheckListener* >().isEmpty() );
+    EXPECT_TRUE( Idle( Check ) );
 
     // A listener that finishes without a reply has nothing to read; a later timeout adds nothing.
     VVersionCheckListener Listener( "LumekVideoViewer", true, pSettings, nullptr, {}, nullptr );
@@ -382,12 +350,27 @@ namespace
     EXPECT_EQ( pSettings->Outcomes[0].Error, "Unknown error" );
   }
 
-  // The application's own dialog, run modally: the test ticks the box and presses "OK" as a user would.
+  // Stands in for the system's browser.
+  class VUrlCatcher : public QObject
+  {
+    Q_OBJECT
+
+  public:
+    QList< QUrl > Urls;
+
+  public slots:
+    void Open( const QUrl& i_rUrl ) { Urls << i_rUrl; }
+  };
+
+  // The application's own dialog, run modally: the test follows its link, ticks the box and
+  // presses its one button as a user would.
   TEST_F( VersionCheckTest, ModalDialogAnsweredLikeAUser )
   {
     Check.SetDialogRunner( {} );
     Serve( Optional );
-    QString Title;
+    VUrlCatcher Browser;
+    QDesktopServices::setUrlHandler( "https", &Browser, "Open" );
+    const QUrl News( "https://www.lumek.example/news" );
     QTimer Answer;
     QObject::connect( &Answer, &QTimer::timeout,
                       [&]
@@ -397,47 +380,46 @@ namespace
                           auto* pBox = qobject_cast< VVersionCheckMessageBox* >( pWidget );
                           if( pBox == nullptr || !pBox->isVisible() )
                             continue;
-                          Title = pBox->windowTitle();
+                          Shown.push_back( Describe( *pBox ) );
+                          EXPECT_FALSE( pBox->windowFlags().testFlag( Qt::WindowContextHelpButtonHint ) );
+                          EXPECT_FALSE( pBox->GetTextBrowser()->openLinks() ) << "links go to the system's browser";
+                          emit pBox->GetTextBrowser()->anchorClicked( News );
+                          EXPECT_TRUE( pBox->isVisible() ) << "the dialog stays while the browser opens";
+                          EXPECT_EQ( pBox->GetCheckBox()->text(), "Do not show this message again." );
+                          EXPECT_FALSE( pBox->GetCheckBox()->isChecked() );
                           pBox->GetCheckBox()->setChecked( true );
-                          for( QPushButton* pButton : pBox->findChildren< QPushButton* >() )
-                            if( pButton->text() == "OK" )
-                              pButton->click();
+                          const auto Buttons = pBox->findChildren< QPushButton* >();
+                          EXPECT_EQ( Buttons.size(), 1 );
+                          EXPECT_EQ( Buttons.value( 0 )->text(), "OK" );
+                          Buttons.value( 0 )->click();
+                          EXPECT_FALSE( pBox->isVisible() );
                         }
                       } );
     Answer.start( 20 );
     RunCheck( true );
-    EXPECT_EQ( Title, "Checking LumekVideoViewer Version" );
+    QDesktopServices::unsetUrlHandler( "https" );
+    ASSERT_EQ( Shown.size(), 1u );
+    EXPECT_EQ( Shown[0].Title, "Checking LumekVideoViewer Version" );
+    EXPECT_EQ( Shown[0].Icon, "information" );
+    EXPECT_EQ( Browser.Urls, QList< QUrl >{ News } );
     EXPECT_FALSE( pSettings->GetShowOnStartup() );
     EXPECT_EQ( Completions, std::vector< bool >{ true } );
   }
 
-  // The settings the window builds over its store.
-  TEST( VersionCheckSettings, RoundTripUnderTopLevelKeys )
+  // Without a store nothing is kept and the defaults are read; a forced setting shows at start
+  // whatever the store says.
+  TEST( VersionCheckSettings, WithoutAStoreOrForced )
   {
-    QSettings Store( "Lumek Labs Ltd", "LumekVideoViewer" );
-    Store.clear();
-    VVersionCheckSettings Settings( &Store, "LumekVideoViewer", false );
-    EXPECT_EQ( Settings.GetMessageId(), "" );
-    EXPECT_TRUE( Settings.GetShowOnStartup() );
-    Settings.SetMessageId( "2026-11-A" );
-    Settings.SetShowOnStartup( false );
-    Settings.Report( 0, "<html/>", "OPTIONAL", "Unknown error" );
-    Store.sync();
-
-    QSettings Again( "Lumek Labs Ltd", "LumekVideoViewer" );
-    EXPECT_EQ( Again.allKeys(), ( QStringList{ "LumekVideoViewer.MessageId", "LumekVideoViewer.ShowOnStartup" } ) );
-    VVersionCheckSettings Reader( &Again, "LumekVideoViewer", false );
-    EXPECT_EQ( Reader.GetMessageId(), "2026-11-A" );
-    EXPECT_FALSE( Reader.GetShowOnStartup() );
-    EXPECT_TRUE( VVersionCheckSettings( &Again, "LumekVideoViewer", true ).GetShowOnStartup() );
-    Store.clear();
-
-    // Without a store nothing is kept and the defaults are read.
     VVersionCheckSettings Nowhere( nullptr, "LumekVideoViewer", false );
     Nowhere.SetMessageId( "x" );
     Nowhere.SetShowOnStartup( false );
     EXPECT_EQ( Nowhere.GetMessageId(), "" );
     EXPECT_TRUE( Nowhere.GetShowOnStartup() );
+
+    QSettings Store( "Lumek Labs Ltd", "LumekVideoViewer" );
+    VVersionCheckSettings( &Store, "LumekVideoViewer", false ).SetShowOnStartup( false );
+    EXPECT_TRUE( VVersionCheckSettings( &Store, "LumekVideoViewer", true ).GetShowOnStartup() );
+    Store.clear();
   }
 
   // The object the window holds: the release and system it tells the server, or the version it is
@@ -452,7 +434,7 @@ namespace
                                           Server.Url().toStdString(), "" );
     EXPECT_EQ( UpdateCheck.GetVersionText(), "1.10.0.137509h" );
     ASSERT_TRUE( UpdateCheck.CheckAtStartup() );
-    RunUntil( [&] { return UpdateCheck.GetVersionCheck().findChildren< VVersionCheckListener* >().isEmpty(); } );
+    RunUntil( [&] { return Idle( UpdateCheck.GetVersionCheck() ); } );
     ASSERT_EQ( Server.Requests().size(), 1 );
     EXPECT_EQ( Server.Requests()[0].toStdString(),
                "/?protocol=1.0&name=LumekVideoViewer&version=1.10.0.137509h&system=" + SystemText() );
@@ -467,9 +449,11 @@ namespace
     Spoofed.GetVersionCheck().SetDialogRunner( [&]( VVersionCheckMessageBox& io_rBox )
                                                { Boxes.push_back( io_rBox.GetCheckBox() != nullptr ); } );
     ASSERT_TRUE( Spoofed.CheckOnRequest() );
-    RunUntil( [&] { return Spoofed.GetVersionCheck().findChildren< VVersionCheckListener* >().isEmpty(); } );
+    RunUntil( [&] { return Idle( Spoofed.GetVersionCheck() ); } );
     ASSERT_EQ( Server.Requests().size(), 2 );
     EXPECT_NE( Server.Requests()[1].indexOf( "&version=0.3.0.55914h&" ), -1 ) << Server.Requests()[1].toStdString();
     EXPECT_EQ( Boxes, std::vector< bool >{ false } ) << "a user's check offers no box to tick";
   }
 } // namespace
+
+#include "VersionCheckTest.moc"

@@ -3,7 +3,6 @@
 // bound the real readers is the fuzzer's to check.
 
 #include "versioncheck/VersionReply/VersionReply.h"
-#include "services/ILogCategorised.h"
 #include "tests/support/LogCapture.h"
 #include "versioncheck/VersionReply/DefaultServer.h"
 #include "versioncheck/VersionReply/HtmlReply.h"
@@ -16,34 +15,27 @@
 
 namespace
 {
-  using VersionCheck::IVersionReply;
-
-  // The record's fields in order, or the error when the reply does not parse.
-  std::vector< std::string > Fields( const IVersionReply& i_rReply )
-  {
-    std::vector< std::string > Result = { i_rReply.CheckVersion, i_rReply.MessageType, i_rReply.Id,
-                                          i_rReply.ProductVersion };
-    Result.insert( Result.end(), i_rReply.Whitelist.begin(), i_rReply.Whitelist.end() );
-    return Result;
-  }
-
+  // The record's fields in order (CheckVersion, MessageType, Id, ProductVersion, whitelist...), or
+  // the error when the reply does not parse.
   std::vector< std::string > Parse( const std::string& i_rBody )
   {
-    IVersionReply Reply;
+    VersionCheck::IVersionReply Reply;
     std::string Error;
     if( !VersionCheck::ParseVersionReply( i_rBody, Reply, Error ) )
       return { Error };
-    return Fields( Reply );
+    std::vector< std::string > Result = { Reply.CheckVersion, Reply.MessageType, Reply.Id, Reply.ProductVersion };
+    Result.insert( Result.end(), Reply.Whitelist.begin(), Reply.Whitelist.end() );
+    return Result;
   }
 
   TEST( VersionReplyParse, GoldenRepliesGiveTheirRecordOrError )
   {
-    const std::string Expected = "Error parsing JSON data: expected value on line 1";
+    const std::string NoComment = "Error parsing JSON data: expected value on line 1";
     const struct
     {
       const char* Name;
       std::string Body;
-      std::vector< std::string > Result; // CheckVersion, MessageType, Id, ProductVersion, whitelist...
+      std::vector< std::string > Result;
     } Cases[] = {
         { "OptionalMessageInPage",
           "<html><body><p>Version 1.11 is out.</p>\n<!--\n{ \"CheckVersion\": \"1.0\", \"MessageType\": \"OPTIONAL\","
@@ -59,9 +51,9 @@ namespace
           "<!--{\"Whitelist\":{\"a\":\"x\",\"b\":\"y\"}}-->",
           { "", "NONE", "", "", "x", "y" } },
         { "FirstCommentOnly", "<!--{\"Id\":\"first\"}--><!--{\"Id\":\"second\"}-->", { "", "NONE", "first", "" } },
-        { "NoComment", "<html><body>Nothing to see</body></html>", { Expected } },
-        { "UnclosedComment", "<!--{\"Id\":\"x\"}", { Expected } },
-        { "CommentEndBeforeStart", "-->{\"Id\":\"x\"}<!--", { Expected } },
+        { "NoComment", "<html><body>Nothing to see</body></html>", { NoComment } },
+        { "UnclosedComment", "<!--{\"Id\":\"x\"}", { NoComment } },
+        { "CommentEndBeforeStart", "-->{\"Id\":\"x\"}<!--", { NoComment } },
         { "TrailingCommaOnLineThree",
           "<!--{\n\"CheckVersion\": \"1.0\",\n}-->",
           { "Error parsing JSON data: expected key string on line 3" } },
@@ -71,52 +63,48 @@ namespace
         { "NestedTooDeep",
           "<!--" + std::string( 100000, '[' ) + "-->",
           { "Error parsing JSON data: nesting too deep on line 1" } },
+        // Nesting right at the limit is still read.
+        { "NestedToTheLimit",
+          "<!--{\"Id\":\"deep\",\"x\":" + std::string( VersionCheck::MaximumJsonDepth - 1, '[' ) +
+              std::string( VersionCheck::MaximumJsonDepth - 1, ']' ) + "}-->",
+          { "", "NONE", "deep", "" } },
     };
     for( const auto& rCase : Cases )
       EXPECT_EQ( Parse( rCase.Body ), rCase.Result ) << rCase.Name;
-
-    // Nesting right at the limit is still read.
-    const int Depth = VersionCheck::MaximumJsonDepth;
-    EXPECT_EQ(
-        Parse( "<!--{\"Id\":\"deep\",\"x\":" + std::string( Depth - 1, '[' ) + std::string( Depth - 1, ']' ) + "}-->" ),
-        ( std::vector< std::string >{ "", "NONE", "deep", "" } ) );
   }
 
+  // The body's paragraphs are logged at the level the message type asks for; a page that is not
+  // one gives one failure line.
   TEST( HtmlReply, LogsBodyTextAtTheTypesLevel )
   {
-    const struct
-    {
-      const char* MessageType;
-      int Level;
-    } Cases[] = { { "REQUIRED", 2 }, { "NONE", 5 }, { "OPTIONAL", 3 }, { "", 3 } };
-    for( const auto& rCase : Cases )
-    {
-      SCOPED_TRACE( rCase.MessageType );
-      LumekTest::VLogCapture Capture( "CheckVersion" );
-      ASSERT_TRUE( VersionCheck::ReadHtmlReply( "<HTML><HEAD><TITLE>t</TITLE></HEAD><BODY><P>New release</P>"
-                                                "<P>Please update &amp; restart</P></BODY></HTML>",
-                                                rCase.MessageType ) );
-      const std::string Level = std::to_string( rCase.Level ) + " ";
-      EXPECT_EQ( Capture.Lines(),
-                 ( std::vector< std::string >{ Level + "New release", Level + "Please update & restart" } ) );
-    }
-  }
-
-  TEST( HtmlReply, BadPagesLogOneFailureLine )
-  {
+    const std::string Page = "<HTML><HEAD><TITLE>t</TITLE></HEAD><BODY><P>New release</P>"
+                             "<P>Please update &amp; restart</P></BODY></HTML>";
+    const std::vector< std::string > Failed = { "2 Could not parse VersionCheck reply." };
     std::string Deep = "<HTML><BODY>";
     for( int Index = 0; Index < 100000; ++Index )
       Deep += "<a>";
-    for( const std::string& rBody :
-         { std::string( "<PAGE><BODY>x</BODY></PAGE>" ), std::string( "<HTML><HEAD>x</HEAD></HTML>" ),
-           std::string( "<html><body>x</body></html>" ), // names are case sensitive
-           std::string( "<HTML><BODY><p>unclosed</BODY>" ), std::string(), Deep } )
+    const struct
     {
-      SCOPED_TRACE( rBody.substr( 0, 40 ) );
+      std::string Body, MessageType;
+      std::vector< std::string > Lines;
+    } Cases[] = {
+        { Page, "REQUIRED", { "2 New release", "2 Please update & restart" } },
+        { Page, "NONE", { "5 New release", "5 Please update & restart" } },
+        { Page, "OPTIONAL", { "3 New release", "3 Please update & restart" } },
+        { Page, "", { "3 New release", "3 Please update & restart" } },
+        { "<PAGE><BODY>x</BODY></PAGE>", "NONE", Failed },
+        { "<HTML><HEAD>x</HEAD></HTML>", "NONE", Failed },
+        { "<html><body>x</body></html>", "NONE", Failed }, // names are case sensitive
+        { "<HTML><BODY><p>unclosed</BODY>", "NONE", Failed },
+        { "", "NONE", Failed },
+        { Deep, "NONE", Failed },
+    };
+    for( const auto& rCase : Cases )
+    {
+      SCOPED_TRACE( rCase.Body.substr( 0, 40 ) + " as " + rCase.MessageType );
       LumekTest::VLogCapture Capture( "CheckVersion" );
-      EXPECT_FALSE( VersionCheck::ReadHtmlReply( rBody, "NONE" ) );
-      EXPECT_EQ( Capture.Lines(), std::vector< std::string >{ std::to_string( ZOL::LogFailure ) +
-                                                              " Could not parse VersionCheck reply." } );
+      EXPECT_EQ( VersionCheck::ReadHtmlReply( rCase.Body, rCase.MessageType ), rCase.Lines != Failed );
+      EXPECT_EQ( Capture.Lines(), rCase.Lines );
     }
   }
 
@@ -140,11 +128,6 @@ namespace
       EXPECT_EQ( VersionCheck::SystemTextFromName( VersionCheck::OperatingSystemName( rCase.OsRelease ) ),
                  rCase.SystemText )
           << rCase.OsRelease;
-
-    const std::string Text = VersionCheck::SystemText();
-    EXPECT_EQ( Text.find( ' ' ), std::string::npos ) << Text;
-    ASSERT_GT( Text.size(), 6u );
-    EXPECT_EQ( Text.substr( Text.size() - 6 ), "+64Bit" );
   }
 
   // A build that is never told a server must not reach a real host: every address the check knows
@@ -154,10 +137,9 @@ namespace
     for( const std::string Address :
          { VersionCheck::DefaultVersionServer, VersionCheck::BuiltInVersionServer, VersionCheck::SupportPage } )
     {
-      const auto HostStart = Address.find( "://" );
-      ASSERT_NE( HostStart, std::string::npos ) << Address;
-      const std::string Host = Address.substr( HostStart + 3, Address.find( '/', HostStart + 3 ) - HostStart - 3 );
-      EXPECT_EQ( Host.substr( Host.size() - 8 ), ".example" ) << Address;
+      const auto HostStart = Address.find( "://" ) + 3;
+      const std::string Host = Address.substr( HostStart, Address.find( '/', HostStart ) - HostStart );
+      EXPECT_TRUE( Host.size() > 8 && Host.substr( Host.size() - 8 ) == ".example" ) << Address;
       EXPECT_EQ( Address.back(), '/' ) << Address;
     }
     EXPECT_EQ( std::string( VersionCheck::DefaultVersionServer ).rfind( "https://", 0 ), 0u );
