@@ -107,23 +107,6 @@ TEST( Theme, EveryTokenGivesTheApplicationsValue )
              Golden.readAll().toStdString() );
 }
 
-TEST( Theme, ScalingTakesTheIntegerPartOfWholeNumbers )
-{
-  // Truncated, not rounded; point sizes keep their size.
-  const std::tuple< float, const char*, int > Rows[] = { { 1.5f, "Margin", 15 },
-                                                         { 1.25f, "ButtonRadius", 6 },
-                                                         { 1.33f, "ItemHeight", 26 },
-                                                         { 2.0f, "PointSizeNormal", 9 },
-                                                         { 1.5f, "InfoToolTipDelay", 750 } };
-  for( const auto& [Ratio, Name, Expected] : Rows )
-  {
-    ZOL::IApplicationStyling Styling = ZOL::CreateApplicationStyling();
-    Styling.Scale( Ratio );
-    EXPECT_EQ( Styling.Value( Name ).toInt(), Expected ) << Name;
-    EXPECT_EQ( Styling.m_Window, QColor( "#303030" ) ) << Name;
-  }
-}
-
 // Set before the QApplication was made, and still in force after it.
 TEST( Theme, PaletteRolesTakeTheirColoursBeforeAndAfterTheApplication )
 {
@@ -173,6 +156,12 @@ TEST( Theme, TheSheetIsScaledOnACopyAndAMissingSheetSetsNone )
   DPIUtils::SetDPI( DPIUtils::DesignDPI );
   EXPECT_FALSE( Scaled.isEmpty() );
   EXPECT_EQ( ZOL::ApplicationStyling()->m_ItemHeight, 20 );
+  // Whole numbers are truncated, not rounded; point sizes keep their size; colours stay.
+  ZOL::IApplicationStyling Scaled125 = ZOL::CreateApplicationStyling();
+  Scaled125.Scale( 1.25f );
+  for( const auto& [Name, Expected] : { std::pair( "Margin", 12 ), { "ButtonRadius", 6 }, { "PointSizeNormal", 9 } } )
+    EXPECT_EQ( Scaled125.Value( Name ).toInt(), Expected ) << Name;
+  EXPECT_EQ( Scaled125.m_Window, QColor( "#303030" ) );
 
   ZOL::IApplicationStyling Styling = ZOL::CreateApplicationStyling();
   Styling.m_StyleSheetPath = QStringLiteral( ":/no/such/sheet.qss" );

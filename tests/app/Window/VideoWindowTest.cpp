@@ -1,32 +1,81 @@
-// The real window with generated recordings: opening, playing, seeking and failing, full screen,
-// scale modes, keys, stored settings and the Help menu; and the viewer started as a user starts it.
+// The real window under an X server, with generated recordings: opening, playing, seeking and
+// failing, full screen, scale modes, keys, stored settings and the Help menu; and the viewer
+// started as a user starts it. Each test gets a fresh window on an empty settings store.
 
-#include "tests/app/Window/WindowTestSupport.h"
+#include "tests/app/AppTestSupport.h"
 
+#include "app/Controls/VClickSpinBox.h"
 #include "app/Controls/VEditSlider.h"
+#include "app/Controls/VLabelSlider.h"
+#include "app/Playback/VPlayBackManager.h"
 #include "app/Window/VLegalDialog.h"
+#include "app/Window/VPropertiesDialog.h"
+#include "app/Window/VVideoSettingsDialog.h"
+#include "app/Window/VVideoWindow.h"
 
+#include <QAction>
+#include <QApplication>
 #include <QDesktopServices>
 #include <QDragEnterEvent>
 #include <QDropEvent>
 #include <QFile>
 #include <QGroupBox>
+#include <QLabel>
 #include <QLineEdit>
 #include <QMenuBar>
 #include <QMessageBox>
 #include <QMimeData>
 #include <QMouseEvent>
 #include <QProcess>
+#include <QPushButton>
 #include <QQuickItem>
 #include <QQuickWidget>
+#include <QSettings>
+#include <QTableWidget>
+#include <QTemporaryDir>
+#include <QTest>
 #include <QTextBrowser>
+#include <QTimer>
 #include <QUrl>
 
-using namespace WindowTest;
+#include <gtest/gtest.h>
+
+#include <functional>
+#include <memory>
+
+using namespace AppTest;
+using namespace LumekVideoViewer;
 
 namespace
 {
-  using VideoWindow = WindowFixture;
+  // Closes every modal dialog of type T that appears, with its done(), and keeps what it showed;
+  // the dialog's own event loop would otherwise hold the test forever.
+  template < typename T > class VDialogCloser
+  {
+  public:
+    explicit VDialogCloser( std::function< void( T* ) > i_Inspect = {} ) : m_Inspect( std::move( i_Inspect ) )
+    {
+      QObject::connect( &m_Timer, &QTimer::timeout,
+                        [this]
+                        {
+                          for( QWidget* pWidget : QApplication::topLevelWidgets() )
+                            if( T* pDialog = qobject_cast< T* >( pWidget ); pDialog && pDialog->isVisible() )
+                            {
+                              ++m_Count;
+                              if( m_Inspect )
+                                m_Inspect( pDialog );
+                              pDialog->done( 0 );
+                            }
+                        } );
+      m_Timer.start( 20 );
+    }
+    int GetCount() const { return m_Count; }
+
+  private:
+    std::function< void( T* ) > m_Inspect;
+    QTimer m_Timer;
+    int m_Count = 0;
+  };
 
   // Catches what the Help menu would open in a browser.
   class VUrlCatcher : public QObject
@@ -40,10 +89,10 @@ namespace
     void Open( const QUrl& i_rUrl ) { Urls.append( i_rUrl ); }
   };
 
-  void SendMouse( QWidget* i_pWidget, QEvent::Type i_Type, QPointF i_Point, Qt::MouseButton i_Button,
-                  Qt::MouseButtons i_Buttons )
+  void SendMouse( QWidget* i_pWidget, QEvent::Type i_Type, QPointF i_Point, Qt::MouseButtons i_Buttons )
   {
-    QMouseEvent Event( i_Type, i_Point, i_Button, i_Buttons, Qt::NoModifier );
+    const Qt::MouseButton Button = i_Type == QEvent::MouseMove ? Qt::NoButton : Qt::LeftButton;
+    QMouseEvent Event( i_Type, i_Point, Button, i_Buttons, Qt::NoModifier );
     QApplication::sendEvent( i_pWidget, &Event );
   }
 
@@ -53,6 +102,91 @@ namespace
                        Qt::NoModifier, Qt::NoScrollPhase, false );
     QApplication::sendEvent( i_pWidget, &Event );
   }
+
+  class VideoWindow : public testing::Test
+  {
+  protected:
+    void SetUp() override
+    {
+      ASSERT_TRUE( m_Dir.isValid() );
+      QSettings( SettingsOrganisation, SettingsApplication ).clear();
+      NewWindow();
+    }
+
+    void NewWindow()
+    {
+      m_pWindow.reset();
+      // No version server: the start-up check fails at once and silently.
+      m_pWindow = std::make_unique< VVideoWindow >( false, "", "", nullptr );
+      m_pWindow->resize( 900, 700 );
+      m_pWindow->show();
+      QApplication::setActiveWindow( m_pWindow.get() );
+      ASSERT_TRUE( QTest::qWaitForWindowExposed( m_pWindow.get() ) );
+    }
+
+    std::string Recording( const std::string& i_rName, const VRecordingSpec& i_rSpec = VRecordingSpec() )
+    {
+      return WriteRecording( m_Dir.filePath( QString::fromStdString( i_rName ) ).toStdString(), i_rSpec );
+    }
+    bool Open( const std::string& i_rPath ) { return m_pWindow->OpenFile( QString::fromStdString( i_rPath ) ); }
+
+    QString Label( const char* i_pName ) const
+    {
+      QLabel* pLabel = Child< QLabel >( i_pName );
+      return pLabel ? pLabel->text() : QString( "<no label %1>" ).arg( i_pName );
+    }
+    template < typename T > T* Child( const char* i_pName ) const { return m_pWindow->findChild< T* >( i_pName ); }
+    bool Hidden( const char* i_pName ) const { return Child< QWidget >( i_pName )->isHidden(); }
+    VPlayBackManager& Manager() const { return *m_pWindow->GetPlayBackManager(); }
+    std::uint64_t Frame() const { return Manager().GetCurrentFrame(); }
+    QAction* Action( EAction i_Action ) const { return m_pWindow->GetAction( i_Action ); }
+    VLabelSlider* Timebar() const { return Child< VLabelSlider >( "Timebar" ); }
+    QSpinBox* SpinBox() const { return m_pWindow->findChild< VClickSpinBox* >(); }
+    QPushButton* PlayButton() const
+    {
+      QPushButton* pButton = Child< QPushButton >( "Play" );
+      return pButton ? pButton : Child< QPushButton >( "Pause" );
+    }
+    bool IsFull() const { return m_pWindow->windowState().testFlag( Qt::WindowFullScreen ); }
+
+    void Pause()
+    {
+      if( Manager().IsPlaying() )
+        m_pWindow->PlayPause();
+    }
+    // As a user typing into the box: the plain QSpinBox::setValue tells the connected slots.
+    void TypeFrame( int i_Frame ) { SpinBox()->QSpinBox::setValue( i_Frame ); }
+    // A shortcut reaches only the active window.
+    void Key( int i_Key )
+    {
+      QApplication::setActiveWindow( m_pWindow.get() );
+      QTest::keyClick( m_pWindow.get(), static_cast< Qt::Key >( i_Key ) );
+    }
+
+    // The grey level the surface shows at a point inside the picture, off the centre where the
+    // missing frame plate sits and off the outline at the edges.
+    int ShownLevel() const
+    {
+      const QImage Image = m_pWindow->GetGLWidget()->grabFramebuffer();
+      return qGray( Image.pixel( Image.width() / 4, Image.height() / 2 ) );
+    }
+
+    void ExpectNoFileState() const
+    {
+      EXPECT_EQ( m_pWindow->windowTitle(), "Lumek Video Viewer" );
+      EXPECT_EQ( Label( "TimecodeLabel" ), "No file open" );
+      EXPECT_EQ( Label( "VideoLabel" ) + Label( "DecoderLabel" ), "" );
+      EXPECT_FALSE( Timebar()->isEnabled() );
+      EXPECT_EQ( Timebar()->maximum(), 100 );
+      EXPECT_EQ( Timebar()->value(), 0 );
+      EXPECT_FALSE( SpinBox()->isEnabled() || PlayButton()->isEnabled() || Action( EAction::Play )->isEnabled() );
+      EXPECT_FALSE( m_pWindow->GetVideoSettingsDialog()->GetRevertButton()->isEnabled() );
+      EXPECT_EQ( m_pWindow->GetPropertiesDialog()->GetTable()->rowCount(), 0 );
+    }
+
+    QTemporaryDir m_Dir;
+    std::unique_ptr< VVideoWindow > m_pWindow;
+  };
 } // namespace
 
 TEST_F( VideoWindow, OpenShowsTheFirstFrameAndDescribesTheFileAndCloseEmptiesIt )
@@ -69,7 +203,7 @@ TEST_F( VideoWindow, OpenShowsTheFirstFrameAndDescribesTheFileAndCloseEmptiesIt 
   EXPECT_EQ( Label( "VideoLabel" ), "V: 16 x 8 / Luminance8 / 25.00Hz / 10 frames (2 missing) / 0.40s" );
   EXPECT_TRUE( Label( "TimecodeLabel" ).startsWith( "T: " ) ) << Label( "TimecodeLabel" ).toStdString();
   EXPECT_TRUE( Label( "DecoderLabel" ).contains( " @ " ) ) << Label( "DecoderLabel" ).toStdString();
-  EXPECT_TRUE( Child< QLabel >( "AudioLabel" )->isHidden() );
+  EXPECT_TRUE( Hidden( "AudioLabel" ) );
 
   EXPECT_EQ( Timebar()->maximum(), 9 );
   // Taken from the bar's width at the open, before the labels settled the layout.
@@ -100,33 +234,32 @@ TEST_F( VideoWindow, AudioIsDescribedAndPlaysSilentlyWithoutADevice )
   Spec.bAudio = true;
   ASSERT_TRUE( Open( Recording( "sound.lvid", Spec ) ) );
   EXPECT_EQ( Label( "AudioLabel" ), "A: 2 channels / Int16 / 48000Hz" );
-  EXPECT_FALSE( Child< QLabel >( "AudioLabel" )->isHidden() );
+  EXPECT_FALSE( Hidden( "AudioLabel" ) );
   // Every frame shown writes its block, to a device or to nowhere.
-  EXPECT_TRUE( WaitFor( [this] { return Manager().GetCurrentFrame() >= 5; } ) );
+  EXPECT_TRUE( QTest::qWaitFor( [this] { return Frame() >= 5; } ) );
   Pause();
   m_pWindow->ReloadCurrentFrame();
 
   // The next file without sound hides the label again.
   ASSERT_TRUE( Open( Recording( "quiet.lvid" ) ) );
-  EXPECT_TRUE( Child< QLabel >( "AudioLabel" )->isHidden() );
+  EXPECT_TRUE( Hidden( "AudioLabel" ) );
 }
 
 TEST_F( VideoWindow, PlaybackLoopsAndWithoutLoopingStopsOnTheLastPicture )
 {
   ASSERT_TRUE( Open( Recording( "loop.lvid" ) ) );
-  int Highest = 0;
-  EXPECT_TRUE( WaitFor(
+  std::uint64_t Highest = 0;
+  EXPECT_TRUE( QTest::qWaitFor(
       [&]
       {
-        const int Frame = static_cast< int >( Manager().GetCurrentFrame() );
-        Highest = std::max( Highest, Frame );
-        return Highest >= 8 && Frame < 4;
+        Highest = std::max( Highest, Frame() );
+        return Highest >= 8 && Frame() < 4;
       } ) );
   EXPECT_TRUE( Manager().IsPlaying() );
 
   Action( EAction::Looping )->setChecked( false );
-  ASSERT_TRUE( WaitFor( [this] { return !Manager().IsPlaying(); } ) );
-  EXPECT_EQ( Manager().GetCurrentFrame(), 0u );
+  ASSERT_TRUE( QTest::qWaitFor( [this] { return !Manager().IsPlaying(); } ) );
+  EXPECT_EQ( Frame(), 0u );
   EXPECT_EQ( Timebar()->value(), 9 );
   EXPECT_EQ( FrameForLevel( ShownLevel() ), 9 );
   EXPECT_EQ( PlayButton()->objectName(), "Play" );
@@ -138,63 +271,63 @@ TEST_F( VideoWindow, PlaybackLoopsAndWithoutLoopingStopsOnTheLastPicture )
   ASSERT_TRUE( Open( Recording( "still.lvid", Still ) ) );
   EXPECT_EQ( Timebar()->maximum(), 0 );
   EXPECT_EQ( SpinBox()->maximum(), 0 );
-  ASSERT_TRUE( WaitFor( [this] { return !Manager().IsPlaying(); } ) );
+  ASSERT_TRUE( QTest::qWaitFor( [this] { return !Manager().IsPlaying(); } ) );
   EXPECT_EQ( FrameForLevel( ShownLevel() ), 0 );
 }
 
-TEST_F( VideoWindow, StopSeekingStepsAndTheWheelMoveTheFrame )
+// Frames 7 and 8 are missing: a gap shows the last frame before it, darkened while paused.
+TEST_F( VideoWindow, SeekingStepsStopAndGapsMoveTheFrame )
 {
-  ASSERT_TRUE( Open( Recording( "seek.lvid" ) ) );
+  VRecordingSpec Spec;
+  Spec.Frames = FramesWithout( 10, { 7, 8 } );
+  ASSERT_TRUE( Open( Recording( "seek.lvid", Spec ) ) );
+  const QImage PauseButton = PlayButton()->grab().toImage();
   Key( Qt::Key_Space );
   ASSERT_FALSE( Manager().IsPlaying() );
   EXPECT_EQ( Action( EAction::Play )->text(), "Play" );
+  // The button's picture follows its new name.
+  EXPECT_NE( PlayButton()->grab().toImage(), PauseButton );
 
   TypeFrame( 4 );
-  EXPECT_EQ( Manager().GetCurrentFrame(), 4u );
+  EXPECT_EQ( Frame(), 4u );
   EXPECT_EQ( Timebar()->value(), 4 );
   EXPECT_EQ( FrameForLevel( ShownLevel() ), 4 );
   Key( Qt::Key_Right );
   Key( Qt::Key_Right );
-  EXPECT_EQ( Manager().GetCurrentFrame(), 6u );
+  EXPECT_EQ( Frame(), 6u );
   EXPECT_EQ( SpinBox()->value(), 6 );
   Key( Qt::Key_Left );
-  EXPECT_EQ( Manager().GetCurrentFrame(), 5u );
+  EXPECT_EQ( Frame(), 5u );
   EXPECT_EQ( FrameForLevel( ShownLevel() ), 5 );
   SendWheel( m_pWindow.get(), 120 );
-  EXPECT_EQ( Manager().GetCurrentFrame(), 6u );
+  EXPECT_EQ( Frame(), 6u );
   SendWheel( m_pWindow.get(), -120 );
   SendWheel( m_pWindow.get(), -120 );
-  EXPECT_EQ( Manager().GetCurrentFrame(), 4u );
+  EXPECT_EQ( Frame(), 4u );
+
+  TypeFrame( 8 );
+  EXPECT_EQ( m_pWindow->GetShownFrameIndex(), 6 );
+  // The warning darkens the last good picture to half.
+  EXPECT_NEAR( ShownLevel(), FrameLevel( 6 ) / 2, 6 );
+  TypeFrame( 9 );
+  EXPECT_EQ( m_pWindow->GetShownFrameIndex(), 9 );
+  EXPECT_EQ( FrameForLevel( ShownLevel() ), 9 );
 
   // Stop goes back to frame 0, and play goes on from there.
   PlayButton()->click();
   EXPECT_TRUE( Manager().IsPlaying() );
+  EXPECT_EQ( PlayButton()->grab().toImage(), PauseButton );
   // Stepping while playing would fight the clock.
   EXPECT_FALSE( Action( EAction::PreviousFrame )->isEnabled() );
   Child< QPushButton >( "Stop" )->click();
   EXPECT_FALSE( Manager().IsPlaying() );
-  EXPECT_EQ( Manager().GetCurrentFrame(), 0u );
+  EXPECT_EQ( Frame(), 0u );
   EXPECT_EQ( Timebar()->value(), 0 );
   EXPECT_EQ( SpinBox()->value(), 0 );
   EXPECT_EQ( FrameForLevel( ShownLevel() ), 0 );
   PlayButton()->click();
-  EXPECT_TRUE( WaitFor( [this] { return Manager().GetCurrentFrame() >= 1; } ) );
-  EXPECT_LT( Manager().GetCurrentFrame(), 9u );
-}
-
-TEST_F( VideoWindow, AMissingFrameShowsTheEarlierOneAndWarnsWhenPaused )
-{
-  VRecordingSpec Spec;
-  Spec.Frames = FramesWithout( 10, { 3, 4 } );
-  ASSERT_TRUE( Open( Recording( "gaps.lvid", Spec ) ) );
-  Pause();
-  TypeFrame( 4 );
-  EXPECT_EQ( m_pWindow->GetShownFrameIndex(), 2 );
-  // The warning darkens the last good picture to half.
-  EXPECT_NEAR( ShownLevel(), FrameLevel( 2 ) / 2, 6 );
-  TypeFrame( 5 );
-  EXPECT_EQ( m_pWindow->GetShownFrameIndex(), 5 );
-  EXPECT_EQ( FrameForLevel( ShownLevel() ), 5 );
+  EXPECT_TRUE( QTest::qWaitFor( [this] { return Frame() >= 1; } ) );
+  EXPECT_LT( Frame(), 9u );
 }
 
 // Whatever cannot be opened ends in the "Invalid file" dialog and no file; whatever survives of a
@@ -214,18 +347,16 @@ TEST_F( VideoWindow, BadFilesGetTheInvalidFileDialogAndLeaveNoFile )
   };
   ASSERT_TRUE( m_pWindow->OpenFile( Good ) );
 
-  QString Title, Text;
+  QString Shown;
   VDialogCloser< QMessageBox > Closer(
       [&]( QMessageBox* i_pBox )
       {
-        Title = i_pBox->windowTitle();
-        Text = i_pBox->text();
+        Shown = i_pBox->windowTitle() + ": " + i_pBox->text();
         EXPECT_EQ( i_pBox->standardButtons(), QMessageBox::Ok );
       } );
   EXPECT_FALSE( m_pWindow->OpenFile( WriteFile( "bad.lvid", QByteArray( 5000, '\x5a' ) ) ) );
   EXPECT_EQ( Closer.GetCount(), 1 );
-  EXPECT_EQ( Title, "Invalid file" );
-  EXPECT_EQ( Text, "The video file could not be opened." );
+  EXPECT_EQ( Shown, "Invalid file: The video file could not be opened." );
   ExpectNoFileState();
   EXPECT_FALSE( Manager().IsPlaying() );
 
@@ -235,7 +366,8 @@ TEST_F( VideoWindow, BadFilesGetTheInvalidFileDialogAndLeaveNoFile )
   EXPECT_EQ( Closer.GetCount(), 3 );
   ExpectNoFileState();
 
-  for( int Cut : { 0, 16, 100, Bytes.size() / 3, Bytes.size() / 2, Bytes.size() - 8 } )
+  // Cut in the header, in the first frames, and just before the end.
+  for( int Cut : { 16, 100, Bytes.size() / 2, Bytes.size() - 8 } )
   {
     SCOPED_TRACE( Cut );
     if( m_pWindow->OpenFile( WriteFile( QString( "cut%1.lvid" ).arg( Cut ), Bytes.left( Cut ) ) ) )
@@ -301,15 +433,13 @@ TEST_F( VideoWindow, LensCorrectionFollowsTheFileAndKeepsTheWish )
 {
   QAction* pLens = Action( EAction::CorrectRadialDistortion );
   ASSERT_TRUE( Open( Recording( "plain.lvid" ) ) );
-  EXPECT_FALSE( pLens->isEnabled() );
-  EXPECT_FALSE( pLens->isChecked() );
+  EXPECT_FALSE( pLens->isEnabled() || pLens->isChecked() );
 
   VRecordingSpec Spec;
   Spec.bLens = Spec.bCamera = true;
   const std::string Lens = Recording( "lens.lvid", Spec );
   ASSERT_TRUE( Open( Lens ) );
-  EXPECT_TRUE( pLens->isEnabled() );
-  EXPECT_TRUE( pLens->isChecked() );
+  EXPECT_TRUE( pLens->isEnabled() && pLens->isChecked() );
 
   pLens->setChecked( false );
   ASSERT_TRUE( Open( Recording( "plain2.lvid" ) ) );
@@ -319,73 +449,60 @@ TEST_F( VideoWindow, LensCorrectionFollowsTheFileAndKeepsTheWish )
 }
 
 // A first start shows "Full Screen" checked while the window is normal: the first F only
-// unchecks it, and the second goes to full screen.
-TEST_F( VideoWindow, FullScreenKeysAndTheStoredMismatch )
+// unchecks it, and the second goes to full screen. There the menu bar is hidden, and the window's
+// own copies of the actions keep every key.
+TEST_F( VideoWindow, FullScreenKeepsEveryKeyAndTheStoredMismatch )
 {
+  ASSERT_TRUE( Open( Recording( "keys.lvid" ) ) );
   QAction* pFull = Action( EAction::FullScreen );
   EXPECT_TRUE( pFull->isChecked() );
   EXPECT_FALSE( IsFull() );
   Key( Qt::Key_F );
-  EXPECT_FALSE( pFull->isChecked() );
-  EXPECT_FALSE( IsFull() );
+  EXPECT_FALSE( pFull->isChecked() || IsFull() );
 
   // The menu bar is the window's own, in the central layout; QMainWindow keeps a hidden one.
   Key( Qt::Key_F );
   EXPECT_TRUE( IsFull() );
-  EXPECT_TRUE( Child< QMenuBar >( "MenuBar" )->isHidden() );
-  EXPECT_TRUE( Child< QWidget >( "Logo" )->isHidden() );
-  EXPECT_FALSE( Child< QGroupBox >( "Controls" )->isHidden() );
-  Key( Qt::Key_Escape );
-  EXPECT_FALSE( IsFull() );
-  EXPECT_FALSE( Child< QMenuBar >( "MenuBar" )->isHidden() );
-  EXPECT_FALSE( Child< QWidget >( "Logo" )->isHidden() );
-  Key( Qt::Key_Escape );
-  EXPECT_FALSE( pFull->isChecked() );
-
-  Key( Qt::Key_F5 );
-  EXPECT_TRUE( IsFull() );
-  Key( Qt::Key_F5 );
-  EXPECT_TRUE( pFull->isChecked() );
-  EXPECT_TRUE( IsFull() );
-
-  // A double click on the picture toggles the same action, and so does the button.
-  for( bool bFull : { false, true } )
-  {
-    SendMouse( m_pWindow->GetGLWidget(), QEvent::MouseButtonDblClick, { 20, 20 }, Qt::LeftButton, Qt::LeftButton );
-    EXPECT_EQ( IsFull(), bFull );
-  }
-  Child< QWidget >( "FullScreen" )->setEnabled( true );
-  QTest::mouseClick( Child< QWidget >( "FullScreen" ), Qt::LeftButton );
-  EXPECT_FALSE( IsFull() );
-}
-
-// In full screen the menu bar is hidden; the window's own copies of the actions keep every key.
-TEST_F( VideoWindow, KeysWorkWithTheMenuBarHidden )
-{
-  ASSERT_TRUE( Open( Recording( "keys.lvid" ) ) );
-  Key( Qt::Key_F );
-  Key( Qt::Key_F );
-  ASSERT_TRUE( Child< QMenuBar >( "MenuBar" )->isHidden() );
-
+  EXPECT_TRUE( Hidden( "MenuBar" ) && Hidden( "Logo" ) );
+  EXPECT_FALSE( Hidden( "Controls" ) );
   Key( Qt::Key_L );
   EXPECT_FALSE( Action( EAction::Looping )->isChecked() );
   Key( Qt::Key_S );
   EXPECT_FALSE( Manager().GetDropFrame() );
   Key( Qt::Key_C );
-  EXPECT_TRUE( Child< QWidget >( "Controls" )->isHidden() );
   Key( Qt::Key_I );
-  EXPECT_TRUE( Child< QWidget >( "InfoPanel" )->isHidden() );
+  EXPECT_TRUE( Hidden( "Controls" ) && Hidden( "InfoPanel" ) );
   Key( Qt::Key_Space );
   EXPECT_FALSE( Manager().IsPlaying() );
+  TypeFrame( 0 );
   Key( Qt::Key_Right );
-  EXPECT_EQ( Manager().GetCurrentFrame(), 1u );
+  EXPECT_EQ( Frame(), 1u );
   Key( Qt::Key_P );
   EXPECT_TRUE( m_pWindow->GetPropertiesDialog()->isVisible() );
   m_pWindow->GetPropertiesDialog()->hide();
   Key( Qt::Key_C );
   Key( Qt::Key_I );
-  EXPECT_FALSE( Child< QWidget >( "Controls" )->isHidden() );
-  EXPECT_FALSE( Child< QWidget >( "InfoPanel" )->isHidden() );
+  EXPECT_FALSE( Hidden( "Controls" ) || Hidden( "InfoPanel" ) );
+
+  Key( Qt::Key_Escape );
+  EXPECT_FALSE( IsFull() );
+  EXPECT_FALSE( Hidden( "MenuBar" ) || Hidden( "Logo" ) );
+  Key( Qt::Key_Escape );
+  EXPECT_FALSE( pFull->isChecked() );
+
+  Key( Qt::Key_F5 );
+  EXPECT_TRUE( IsFull() );
+  Key( Qt::Key_F5 );
+  EXPECT_TRUE( pFull->isChecked() && IsFull() );
+
+  // A double click on the picture toggles the same action, and so does the button.
+  for( bool bFull : { false, true } )
+  {
+    SendMouse( m_pWindow->GetGLWidget(), QEvent::MouseButtonDblClick, { 20, 20 }, Qt::LeftButton );
+    EXPECT_EQ( IsFull(), bFull );
+  }
+  QTest::mouseClick( Child< QWidget >( "FullScreen" ), Qt::LeftButton );
+  EXPECT_FALSE( IsFull() );
 }
 
 TEST_F( VideoWindow, ScaleModesFollowTheMenuAndFullScreenLeavesTheFixedSize )
@@ -397,23 +514,27 @@ TEST_F( VideoWindow, ScaleModesFollowTheMenuAndFullScreenLeavesTheFixedSize )
   ASSERT_TRUE( Open( Recording( "scale.lvid", Spec ) ) );
   VGLWidget* pSurface = m_pWindow->GetGLWidget();
   EXPECT_EQ( pSurface->GetScaleMode(), ScaleToWindow );
+  auto ExpectMode = [&]( EAction i_Menu, EScaleMode i_Mode )
+  {
+    EXPECT_EQ( pSurface->GetScaleMode(), i_Mode );
+    EXPECT_TRUE( Action( i_Menu )->isChecked() );
+    // Only the window's fit to the video fixes the size.
+    EXPECT_EQ( m_pWindow->minimumSize() == m_pWindow->maximumSize(), i_Mode == ScaleWindowToVideo );
+  };
   const std::pair< EAction, EScaleMode > Modes[] = { { EAction::ScaleFreely, ScaleFreely },
                                                      { EAction::ScaleOneToOne, ScaleOneToOne },
                                                      { EAction::ScaleToWindow, ScaleToWindow } };
   for( const auto& [Menu, Mode] : Modes )
   {
     Action( Menu )->trigger();
-    EXPECT_EQ( pSurface->GetScaleMode(), Mode );
-    EXPECT_TRUE( Action( Menu )->isChecked() );
-    EXPECT_NE( m_pWindow->minimumSize(), m_pWindow->maximumSize() );
+    ExpectMode( Menu, Mode );
   }
 
   // Dragging the picture frees the scale, and the menu follows.
-  SendMouse( pSurface, QEvent::MouseButtonPress, { 100, 100 }, Qt::LeftButton, Qt::LeftButton );
-  SendMouse( pSurface, QEvent::MouseMove, { 140, 110 }, Qt::NoButton, Qt::LeftButton );
-  SendMouse( pSurface, QEvent::MouseButtonRelease, { 140, 110 }, Qt::LeftButton, Qt::NoButton );
-  EXPECT_EQ( pSurface->GetScaleMode(), ScaleFreely );
-  EXPECT_TRUE( Action( EAction::ScaleFreely )->isChecked() );
+  SendMouse( pSurface, QEvent::MouseButtonPress, { 100, 100 }, Qt::LeftButton );
+  SendMouse( pSurface, QEvent::MouseMove, { 140, 110 }, Qt::LeftButton );
+  SendMouse( pSurface, QEvent::MouseButtonRelease, { 140, 110 }, Qt::NoButton );
+  ExpectMode( EAction::ScaleFreely, ScaleFreely );
   EXPECT_FALSE( Action( EAction::ScaleToWindow )->isChecked() );
 
   // Leaving the fixed size adds the maximise button; the close and minimise buttons must stay.
@@ -421,19 +542,15 @@ TEST_F( VideoWindow, ScaleModesFollowTheMenuAndFullScreenLeavesTheFixedSize )
     EXPECT_TRUE( m_pWindow->windowFlags().testFlag( Hint ) ) << Hint;
 
   Action( EAction::ScaleWindowToVideo )->trigger();
-  EXPECT_EQ( pSurface->GetScaleMode(), ScaleWindowToVideo );
-  EXPECT_EQ( m_pWindow->minimumSize(), m_pWindow->maximumSize() );
+  ExpectMode( EAction::ScaleWindowToVideo, ScaleWindowToVideo );
   Key( Qt::Key_F ); // unchecks the stored state
   Key( Qt::Key_F );
-  EXPECT_EQ( pSurface->GetScaleMode(), ScaleOneToOne );
-  EXPECT_TRUE( Action( EAction::ScaleOneToOne )->isChecked() );
-  EXPECT_NE( m_pWindow->minimumSize(), m_pWindow->maximumSize() );
+  ExpectMode( EAction::ScaleOneToOne, ScaleOneToOne );
   Key( Qt::Key_Escape );
 
   // A new file starts from the window's fit again.
   ASSERT_TRUE( Open( Recording( "scale2.lvid", Spec ) ) );
-  EXPECT_EQ( pSurface->GetScaleMode(), ScaleToWindow );
-  EXPECT_TRUE( Action( EAction::ScaleToWindow )->isChecked() );
+  ExpectMode( EAction::ScaleToWindow, ScaleToWindow );
 }
 
 TEST_F( VideoWindow, SettingsSurviveARestart )
@@ -449,14 +566,14 @@ TEST_F( VideoWindow, SettingsSurviveARestart )
   EXPECT_TRUE( Action( EAction::SoftwareDecoder )->isChecked() );
   EXPECT_FALSE( Action( EAction::HardwareDecoder )->isChecked() );
   EXPECT_FALSE( Action( EAction::Controls )->isChecked() );
-  EXPECT_TRUE( Child< QWidget >( "Controls" )->isHidden() );
-  EXPECT_FALSE( Child< QWidget >( "InfoPanel" )->isHidden() );
+  EXPECT_TRUE( Hidden( "Controls" ) );
+  EXPECT_FALSE( Hidden( "InfoPanel" ) );
   EXPECT_FALSE( Action( EAction::FullScreen )->isChecked() );
 
   // Without looping the end stops playback: the second window really loaded the value.
   ASSERT_TRUE( Open( Recording( "restart.lvid" ) ) );
   EXPECT_TRUE( m_pWindow->GetGLWidget()->GetDecoderName().contains( "Software" ) );
-  EXPECT_TRUE( WaitFor( [this] { return !Manager().IsPlaying(); } ) );
+  EXPECT_TRUE( QTest::qWaitFor( [this] { return !Manager().IsPlaying(); } ) );
 
   // A stored full screen is a checked action on a normal window.
   Key( Qt::Key_F );
@@ -466,8 +583,8 @@ TEST_F( VideoWindow, SettingsSurviveARestart )
   EXPECT_FALSE( IsFull() );
 }
 
-// The documentation of this release, its version, the legal page with the theme, and an answer to
-// the user's update check even with no server to ask (the error dialog).
+// The documentation of this release, its version, an answer to the user's update check even with
+// no server to ask (the error dialog), and the legal page with the theme and every licence.
 TEST_F( VideoWindow, TheHelpMenuAnswersEveryEntry )
 {
   VUrlCatcher Catcher;
@@ -477,47 +594,37 @@ TEST_F( VideoWindow, TheHelpMenuAnswersEveryEntry )
   ASSERT_EQ( Catcher.Urls.size(), 1 );
   EXPECT_EQ( Catcher.Urls.front().path(), "/display/LVV110/" );
 
-  {
-    QString VersionLine, UpdateText;
-    VDialogCloser< QDialog > Closer(
-        [&]( QDialog* i_pDialog )
-        {
-          if( QLabel* pLabel = i_pDialog->findChild< QLabel* >( "VersionLine" ) )
-            VersionLine = pLabel->text();
-          if( QTextBrowser* pBrowser = i_pDialog->findChild< QTextBrowser* >() )
-            UpdateText = pBrowser->toPlainText();
-        } );
-    Action( EAction::About )->trigger();
-    EXPECT_EQ( Closer.GetCount(), 1 );
-    EXPECT_EQ( VersionLine, "Lumek Video Viewer 1.10.0.137509h  x64" );
-    Action( EAction::CheckForUpdates )->trigger();
-    EXPECT_TRUE( WaitFor( [&] { return Closer.GetCount() == 2; } ) );
-    EXPECT_TRUE( UpdateText.contains( "Unable to contact version check server." ) ) << UpdateText.toStdString();
-  }
-
-  QString Title, Errors;
+  QString VersionLine, UpdateText, Title, Errors;
   QQuickWidget::Status Status = QQuickWidget::Null;
-  VDialogCloser< VLegalDialog > LegalCloser(
-      [&]( VLegalDialog* i_pDialog )
+  VDialogCloser< QDialog > Closer(
+      [&]( QDialog* i_pDialog )
       {
-        QQuickWidget* pPage = i_pDialog->GetQuickWidget();
-        Status = pPage->status();
-        for( const QQmlError& rError : pPage->errors() )
-          Errors += rError.toString() + "\n";
-        if( QQuickItem* pRoot = pPage->rootObject() )
-          if( QObject* pTitle = pRoot->findChild< QObject* >( "ComponentTitle" ) )
+        if( QLabel* pLabel = i_pDialog->findChild< QLabel* >( "VersionLine" ) )
+          VersionLine = pLabel->text();
+        if( QTextBrowser* pBrowser = i_pDialog->findChild< QTextBrowser* >() )
+          UpdateText = pBrowser->toPlainText();
+        if( auto* pLegal = qobject_cast< VLegalDialog* >( i_pDialog ) )
+        {
+          QQuickWidget* pPage = pLegal->GetQuickWidget();
+          Status = pPage->status();
+          for( const QQmlError& rError : pPage->errors() )
+            Errors += rError.toString() + "\n";
+          if( QObject* pTitle =
+                  pPage->rootObject() ? pPage->rootObject()->findChild< QObject* >( "ComponentTitle" ) : nullptr )
             Title = pTitle->property( "text" ).toString();
+        }
       } );
+  Action( EAction::About )->trigger();
+  EXPECT_EQ( Closer.GetCount(), 1 );
+  EXPECT_EQ( VersionLine, "Lumek Video Viewer 1.10.0.137509h  x64" );
+  Action( EAction::CheckForUpdates )->trigger();
+  EXPECT_TRUE( QTest::qWaitFor( [&] { return Closer.GetCount() == 2; } ) );
+  EXPECT_TRUE( UpdateText.contains( "Unable to contact version check server." ) ) << UpdateText.toStdString();
   Action( EAction::Licenses )->trigger();
-  EXPECT_EQ( LegalCloser.GetCount(), 1 );
+  EXPECT_EQ( Closer.GetCount(), 3 );
   EXPECT_EQ( Status, QQuickWidget::Ready ) << Errors.toStdString();
   EXPECT_TRUE( Title.startsWith( "Qt 5" ) ) << Title.toStdString();
-}
 
-TEST( LegalComponents, EveryLicenceTextIsThereWithItsCopyright )
-{
-  const QStringList Expected = { "Qt 5",          "Boost",    "libebml",     "libmatroska",
-                                 "libjpeg-turbo", "OpenH264", "ImageMagick", "RapidXml" };
   QStringList Names;
   for( const VLegalComponent& rComponent : LegalComponents() )
   {
@@ -529,7 +636,7 @@ TEST( LegalComponents, EveryLicenceTextIsThereWithItsCopyright )
     // Every one of these licences disclaims warranty; a text without it is cut short.
     EXPECT_TRUE( Text.contains( "warrant", Qt::CaseInsensitive ) );
   }
-  EXPECT_EQ( Names, Expected );
+  EXPECT_EQ( Names.join( ", " ), "Qt 5, Boost, libebml, libmatroska, libjpeg-turbo, OpenH264, ImageMagick, RapidXml" );
 }
 
 // The viewer must come up with a good file and with a bad one, under the test's own X server, and
@@ -539,15 +646,14 @@ TEST( ViewerProcess, StartsOnAGoodFileAndOnABadOne )
 {
   QTemporaryDir Dir;
   ASSERT_TRUE( Dir.isValid() );
-  const QString Good = QString::fromStdString( WriteRecording( Dir.filePath( "good.lvid" ).toStdString(), {} ) );
-  ASSERT_FALSE( Good.isEmpty() );
-  QFile Bad( Dir.filePath( "bad.lvid" ) );
-  ASSERT_TRUE( Bad.open( QIODevice::WriteOnly ) );
+  const QString Files[2] = { QString::fromStdString( WriteRecording( Dir.filePath( "good.lvid" ).toStdString(), {} ) ),
+                             Dir.filePath( "bad.lvid" ) };
+  QFile Bad( Files[1] );
+  ASSERT_TRUE( !Files[0].isEmpty() && Bad.open( QIODevice::WriteOnly ) );
   Bad.write( "not a recording" );
   Bad.close();
 
   QProcess Viewers[2];
-  const QString Files[2] = { Good, Bad.fileName() };
   for( int i = 0; i < 2; ++i )
   {
     Viewers[i].setProcessChannelMode( QProcess::MergedChannels );
