@@ -4,15 +4,66 @@
 
 #include <gtest/gtest.h>
 
+#include <set>
+
 using namespace ZOL;
 using CoreLumekTypes::VCameraHardware;
 using CoreLumekTypes::VLensDistortionCalibration;
 using LumekTest::Frame;
 using LumekTest::Lens;
-using LumekTest::ThroughBytes;
 
 namespace
 {
+  // A recording's header: one of every record, with the oddest fields (half-pixel offsets, an
+  // inverted interlaced frame of the largest width), written by the writers.
+  struct VHeader
+  {
+    const IVideoFrameInfo Frame{ 3,
+                                 65535,
+                                 2,
+                                 255,
+                                 0x7FFFFFFF,
+                                 1,
+                                 PixelFormat_BayerGB8,
+                                 IVideoFrameInfo::Flag_Inverted,
+                                 0.9,
+                                 InterlacedFormat_InterlacedFrameOddOlder };
+    const IAudioFrameInfo Audio{ AudioSampleFormat_Int24, 192000, 64 };
+    const IVideoTiming Timing{ 1080000000u, 9000000u, -123456789012345 };
+    const IVideoSettings Settings{ 0.25f, 2.2f };
+    const ITimecode Timecode{ TimecodeStandard_29_97_DF, 23, 59, 58, 29, 0xDEADBEEF, -3, 4504499, 1126125 };
+    const VLensDistortionCalibration Lens = LumekTest::Lens( RadialModel_Lumek2Parameter, { -0.2, 0.05 }, 960.5, 7 );
+    const VCameraHardware Camera{ "urn:lumek:camera:0042", "SN-12", "Vantage", "Vantage V16", 4096, 3072, 1.25 };
+    IVideoAttributes Store;
+
+    VHeader()
+    {
+      EXPECT_TRUE( WriteVideoFrameInfo( Store, Frame ) && WriteAudioFrameInfo( Store, "A.", Audio ) &&
+                   WriteVideoTiming( Store, Timing ) && WriteVideoSettings( Store, "P.", Settings ) &&
+                   WriteTimecode( Store, Timecode ) && WriteLensDistortionCalibration( Store, "Q.", Lens ) &&
+                   WriteCameraHardware( Store, Camera ) );
+    }
+  };
+
+  // Which of the header's records read from a store, in the order of VHeader's fields.
+  std::vector< bool > RecordsRead( const IVideoAttributes& i_rStore )
+  {
+    IVideoFrameInfo Frame;
+    IAudioFrameInfo Audio;
+    IVideoTiming Timing;
+    IVideoSettings Settings;
+    ITimecode Timecode;
+    VLensDistortionCalibration Calibration;
+    VCameraHardware Camera;
+    return { ReadVideoFrameInfo( i_rStore, i_rStore, Frame ),
+             ReadAudioFrameInfo( i_rStore, "A.", Audio ),
+             ReadVideoTiming( i_rStore, Timing ),
+             ReadVideoSettings( i_rStore, "P.", Settings ),
+             ReadTimecode( i_rStore, Timecode ),
+             ReadLensDistortionCalibration( i_rStore, "Q.", Calibration ),
+             ReadCameraHardware( i_rStore, Camera ) };
+  }
+
   // The keys of a written 8x8 BayerRG8 frame.
   IVideoAttributes FrameKeys()
   {
@@ -30,31 +81,71 @@ namespace
   }
 } // namespace
 
-// ---------------------------------------------------------------------------------------------
-// Frame description.
-
-TEST( FrameInfo, WriterAndReaderAgreeForEveryFormatAndTheOddestFields )
+TEST( AttributeRecords, EveryRecordReadsBackAsWritten )
 {
-  std::vector< IVideoFrameInfo > Cases;
-  for( std::uint32_t Format = 1; Format < PixelFormatCount; ++Format )
-    Cases.push_back( Frame( 640, 480, static_cast< EPixelFormat >( Format ) ) );
-  // Odd half-pixel offsets, an inverted interlaced frame, and the largest size.
-  Cases.push_back( { 3, 65535, 2, 255, 1, 1, PixelFormat_BayerGB8, IVideoFrameInfo::Flag_Inverted, 0.9,
-                     InterlacedFormat_InterlacedFrameOddOlder } );
-  Cases.push_back( { 0, 0, 1, 1, 0x7FFFFFFF, 0x7FFFFFFF, PixelFormat_U10Y10V10Y10, 0, 1.0,
-                     InterlacedFormat_InterlacedFrameUnspecifiedLineTiming } );
-  for( const IVideoFrameInfo& rWritten : Cases )
+  const VHeader Header;
+  IVideoFrameInfo Frame = LumekTest::Frame( 9, 9, PixelFormat_R5G6B5 );
+  Frame.Flags = ~0u; // both flags are decided by the read
+  IAudioFrameInfo Audio;
+  IVideoTiming Timing;
+  IVideoSettings Settings;
+  ITimecode Timecode;
+  VLensDistortionCalibration Calibration;
+  Calibration.RadialDistortionParameters = { 7, 7, 7, 7 };
+  VCameraHardware Camera;
+  const IVideoAttributes& rStore = Header.Store;
+  ASSERT_TRUE( ReadVideoFrameInfo( rStore, rStore, Frame ) && ReadAudioFrameInfo( rStore, "A.", Audio ) &&
+               ReadVideoTiming( rStore, Timing ) && ReadVideoSettings( rStore, "P.", Settings ) &&
+               ReadTimecode( rStore, Timecode ) && ReadLensDistortionCalibration( rStore, "Q.", Calibration ) &&
+               ReadCameraHardware( rStore, Camera ) );
+  EXPECT_EQ( Header.Frame, Frame );
+  EXPECT_EQ( Header.Audio, Audio );
+  EXPECT_TRUE( Header.Timing == Timing );
+  EXPECT_EQ( Header.Settings, Settings );
+  EXPECT_EQ( Header.Timecode, Timecode );
+  EXPECT_EQ( Header.Lens, Calibration );
+  EXPECT_EQ( Header.Camera, Camera );
+}
+
+// Every key of the header removed in turn: a required one fails its own record's read and no
+// other; an optional one fails nothing.
+TEST( AttributeRecords, EachRequiredKeyFailsItsOwnRecordAlone )
+{
+  const VHeader Header;
+  ASSERT_EQ( std::vector< bool >( 7, true ), RecordsRead( Header.Store ) );
+  const std::set< std::string > Optional = { "VideoFrameInfo.ImageX",
+                                             "VideoFrameInfo.ImageY",
+                                             "VideoFrameInfo.TwiceOffsetX",
+                                             "VideoFrameInfo.TwiceOffsetY",
+                                             "VideoFrameInfo.SensorPixelsPerImagePixelX",
+                                             "VideoFrameInfo.SensorPixelsPerImagePixelY",
+                                             "VideoFrameInfo.InterlacedFormat",
+                                             "StartOffsetInTicks",
+                                             "CameraHardware.SerialNumber" };
+  // The record a key belongs to, by its prefix; the timing's keys have none.
+  const char* const Prefixes[] = { "VideoFrameInfo.", "A.", "", "P.", "Timecode.", "Q.", "CameraHardware." };
+  std::vector< std::string > Keys;
+  Header.Store.GetKeys( Keys );
+  for( const std::string& rKey : Keys )
   {
-    SCOPED_TRACE( std::string( ToString( rWritten.PixelFormat ) ) + " " + std::to_string( rWritten.ImageWidth ) );
-    IVideoAttributes Store;
-    ASSERT_TRUE( WriteVideoFrameInfo( Store, rWritten ) );
-    const IVideoAttributes Read = ThroughBytes( Store );
-    IVideoFrameInfo Info = Frame( 9, 9, PixelFormat_R5G6B5 );
-    Info.Flags = ~0u;
-    EXPECT_TRUE( ReadVideoFrameInfo( Read, Read, Info ) );
-    EXPECT_EQ( rWritten, Info );
+    SCOPED_TRACE( rKey );
+    std::vector< bool > Expected( 7, true );
+    if( Optional.count( rKey ) == 0 )
+    {
+      std::size_t Owner = 2;
+      for( std::size_t i = 0; i < 7; ++i )
+        if( i != 2 && rKey.rfind( Prefixes[i], 0 ) == 0 )
+          Owner = i;
+      Expected[Owner] = false;
+    }
+    IVideoAttributes Partial = Header.Store;
+    ASSERT_TRUE( Partial.Remove( rKey ) );
+    EXPECT_EQ( Expected, RecordsRead( Partial ) );
   }
 }
+
+// ---------------------------------------------------------------------------------------------
+// Frame description.
 
 TEST( FrameInfo, NoVideoWritesOnlyPresentFalseAndUnusableDescriptionsNothing )
 {
@@ -75,24 +166,6 @@ TEST( FrameInfo, NoVideoWritesOnlyPresentFalseAndUnusableDescriptionsNothing )
     EXPECT_FALSE( WriteVideoFrameInfo( Unwritten, rInfo ) );
     EXPECT_TRUE( Unwritten.Empty() );
   }
-}
-
-// A required key missing fails the read; without the Present key the record is left as it was.
-TEST( FrameInfo, EachRequiredKeyMissingFailsTheRead )
-{
-  for( const char* pKey : { "Present", "ImageWidth", "ImageHeight", "PixelFormat", "Inverted", "PixelAspectRatio" } )
-  {
-    SCOPED_TRACE( pKey );
-    IVideoAttributes Store = FrameKeys();
-    ASSERT_TRUE( Store.Remove( std::string( "VideoFrameInfo." ) + pKey ) );
-    IVideoFrameInfo Info = Frame( 2, 2, PixelFormat_R8G8B8 );
-    EXPECT_FALSE( ReadVideoFrameInfo( Store, Store, Info ) );
-    EXPECT_TRUE( pKey != std::string( "Present" ) || Info == Frame( 2, 2, PixelFormat_R8G8B8 ) );
-  }
-  IVideoAttributes Store = FrameKeys();
-  Store.Set( "VideoFrameInfo.ImageWidth", 0x80000000u ); // beyond a signed 32-bit width
-  IVideoFrameInfo Info;
-  EXPECT_FALSE( ReadVideoFrameInfo( Store, Store, Info ) );
 }
 
 // The half-pixel offset wins over the older whole-pixel one; a key of the wrong type is absent.
@@ -152,6 +225,8 @@ TEST( FrameInfo, OptionalKeysTakeTheirDefaultsAndUnknownTextsKeepTheFormat )
   EXPECT_TRUE( ReadVideoFrameInfo( Store, Store, Reused ) );
   EXPECT_EQ( PixelFormat_Y8U8Y8V8, Reused.PixelFormat );
   EXPECT_EQ( InterlacedFormat_Unspecified, Reused.InterlacedFormat );
+  Store.Set( "VideoFrameInfo.ImageWidth", 0x80000000u ); // beyond a signed 32-bit width
+  EXPECT_FALSE( ReadVideoFrameInfo( Store, Store, Reused ) );
 }
 
 // The conversion distortion flag is decided by the outer store's history, never by the frame
@@ -187,7 +262,7 @@ TEST( FrameInfo, ConversionDistortionFlagFollowsTheHistory )
         Outer.Remove( std::string( "ConversionRecord.0." ) + pKey );
     IVideoFrameInfo Info;
     Info.Flags = rCase.Flag ? 0u : static_cast< std::uint32_t >( IVideoFrameInfo::Flag_HasConversionDistortion );
-    ASSERT_TRUE( ReadVideoFrameInfo( Keys, ThroughBytes( Outer ), Info ) );
+    ASSERT_TRUE( ReadVideoFrameInfo( Keys, Outer, Info ) );
     EXPECT_EQ( rCase.Flag, Info.HasConversionDistortion() );
   }
   IVideoFrameInfo Single;
@@ -196,105 +271,48 @@ TEST( FrameInfo, ConversionDistortionFlagFollowsTheHistory )
 }
 
 // ---------------------------------------------------------------------------------------------
-// Audio, timing, settings, timecode.
+// Audio, timing, timecode, lens.
 
-TEST( AudioFrameInfo, WriterAndReaderAgreeUnderAnyPrefix )
+TEST( AudioFrameInfo, NoAudioIsAnAnswerZeroChannelsAndUnknownFormatsAreNot )
 {
-  const IAudioFrameInfo Cases[] = { {}, // no audio
-                                    { AudioSampleFormat_Float32, 48000, 2 },
-                                    { AudioSampleFormat_UInt8, 8000, 1 },
-                                    { AudioSampleFormat_Int24, 192000, 64 },
-                                    { AudioSampleFormat_Int16, 44100, 0 } };
-  for( const std::string Prefix : { "", "ConversionRecord.3." } )
-    for( const IAudioFrameInfo& rWritten : Cases )
-    {
-      SCOPED_TRACE( Prefix + ToString( rWritten.SampleFormat ) + " " + std::to_string( rWritten.Channels ) );
-      IVideoAttributes Store;
-      ASSERT_TRUE( WriteAudioFrameInfo( Store, Prefix, rWritten ) );
-      const IVideoAttributes Read = ThroughBytes( Store );
-      IAudioFrameInfo Info{ AudioSampleFormat_Int8, 1, 1 };
-      // No audio is a usable answer; zero channels is not.
-      EXPECT_EQ( rWritten.Channels != 0 || rWritten == IAudioFrameInfo(), ReadAudioFrameInfo( Read, Prefix, Info ) );
-      EXPECT_EQ( rWritten, Info );
-      for( const auto& rEntry : Read.GetMap() )
-        EXPECT_EQ( 0u, rEntry.first.rfind( Prefix + "AudioFrameInfo.", 0 ) ) << rEntry.first;
-    }
-}
-
-// UInt8 is 7 and Float32 is 6: a table written in row order would swap them silently.
-TEST( AudioFrameInfo, EachSampleFormatNameMapsToItsOwnNumberUnknownOnesKeepTheField )
-{
-  for( std::uint32_t Value = 1; Value <= 9; ++Value )
+  for( const IAudioFrameInfo& rWritten : { IAudioFrameInfo(), IAudioFrameInfo{ AudioSampleFormat_Int16, 44100, 0 } } )
   {
     IVideoAttributes Store;
-    const IAudioFrameInfo Written{ static_cast< EAudioSampleFormat >( Value ), 48000, 2 };
-    ASSERT_TRUE( WriteAudioFrameInfo( Store, "", Written ) );
-    IAudioFrameInfo Read;
-    EXPECT_TRUE( ReadAudioFrameInfo( Store, "", Read ) );
-    EXPECT_EQ( Written, Read );
+    ASSERT_TRUE( WriteAudioFrameInfo( Store, "ConversionRecord.3.", rWritten ) );
+    IAudioFrameInfo Info{ AudioSampleFormat_Int8, 1, 1 };
+    EXPECT_EQ( rWritten == IAudioFrameInfo(), ReadAudioFrameInfo( Store, "ConversionRecord.3.", Info ) );
+    EXPECT_EQ( rWritten, Info );
   }
   IVideoAttributes Store;
-  WriteAudioFrameInfo( Store, "", { AudioSampleFormat_Float32, 48000, 2 } );
-  std::string Text;
-  Store.Get( "AudioFrameInfo.SampleFormat", Text );
-  EXPECT_EQ( "Float32", Text );
-
-  Store.Set( "AudioFrameInfo.SampleFormat", "float32" );
+  EXPECT_FALSE( WriteAudioFrameInfo( Store, "", { static_cast< EAudioSampleFormat >( 10 ), 48000, 2 } ) );
+  ASSERT_TRUE( WriteAudioFrameInfo( Store, "", { AudioSampleFormat_Float32, 48000, 2 } ) );
+  Store.Set( "AudioFrameInfo.SampleFormat", "float32" ); // names compare exactly
   IAudioFrameInfo Info{ AudioSampleFormat_Int32, 0, 0 };
   EXPECT_TRUE( ReadAudioFrameInfo( Store, "", Info ) );
   EXPECT_EQ( AudioSampleFormat_Int32, Info.SampleFormat );
-  for( const char* pKey : { "SampleFormat", "SampleRate", "Channels" } )
-  {
-    IVideoAttributes Missing = Store;
-    Missing.Remove( std::string( "AudioFrameInfo." ) + pKey );
-    EXPECT_FALSE( ReadAudioFrameInfo( Missing, "", Info ) ) << pKey;
-  }
-  IAudioFrameInfo Kept{ AudioSampleFormat_Int8, 5, 5 };
-  EXPECT_FALSE( ReadAudioFrameInfo( IVideoAttributes(), "", Kept ) );
-  EXPECT_EQ( ( IAudioFrameInfo{ AudioSampleFormat_Int8, 5, 5 } ), Kept );
 }
 
-TEST( VideoTimingAndSettings, RatesAreNeededTheRestIsOptional )
+TEST( VideoTimingAndSettings, AMissingStartOffsetIsZeroAndAMissingSettingKeepsTheOther )
 {
-  const IVideoTiming Written{ 1080000000u, 9000000u, -123456789012345 };
   IVideoAttributes Store;
-  ASSERT_TRUE( WriteVideoTiming( Store, Written ) );
-  IVideoTiming Read;
-  EXPECT_TRUE( ReadVideoTiming( ThroughBytes( Store ), Read ) );
-  EXPECT_TRUE( Written == Read );
+  ASSERT_TRUE( WriteVideoTiming( Store, { 25, 1, 99 } ) && WriteVideoSettings( Store, "", { 0.25f, 2.2f } ) );
   Store.Remove( "StartOffsetInTicks" );
-  EXPECT_TRUE( ReadVideoTiming( Store, Read ) );
-  EXPECT_EQ( 0, Read.StartOffsetInTicks );
-  for( const char* pKey : { "TicksPerSecond", "FramePeriodInTicks" } )
-  {
-    IVideoAttributes Missing = Store;
-    Missing.Remove( pKey );
-    IVideoTiming Default;
-    EXPECT_FALSE( ReadVideoTiming( Missing, Default ) ) << pKey;
-    EXPECT_TRUE( Default == IVideoTiming() ) << pKey;
-  }
-
-  ASSERT_TRUE( WriteVideoSettings( Store, "P.", { 0.25f, 2.2f } ) );
+  Store.Remove( "Saturation" );
+  IVideoTiming Timing{ 1, 1, 7 };
+  EXPECT_TRUE( ReadVideoTiming( Store, Timing ) );
+  EXPECT_TRUE( ( IVideoTiming{ 25, 1, 0 } ) == Timing );
   IVideoSettings Settings;
-  EXPECT_TRUE( ReadVideoSettings( ThroughBytes( Store ), "P.", Settings ) );
-  EXPECT_EQ( ( IVideoSettings{ 0.25f, 2.2f } ), Settings );
-  Store.Remove( "P.Saturation" );
-  IVideoSettings Partial;
-  EXPECT_FALSE( ReadVideoSettings( Store, "P.", Partial ) );
-  EXPECT_EQ( ( IVideoSettings{ 1.0f, 2.2f } ), Partial );
+  EXPECT_FALSE( ReadVideoSettings( Store, "", Settings ) );
+  EXPECT_EQ( ( IVideoSettings{ 1.0f, 2.2f } ), Settings );
 }
 
 // The keys are read in this order; the first one missing stops the read and leaves it and every
 // later field as they were.
-TEST( Timecode, RoundTripAndTheFirstMissingKeyStopsTheRead )
+TEST( Timecode, TheFirstMissingKeyStopsTheRead )
 {
   const ITimecode Written{ TimecodeStandard_29_97_DF, 23, 59, 58, 29, 0xDEADBEEF, -3, 4504499, 1126125 };
   IVideoAttributes Store;
   ASSERT_TRUE( WriteTimecode( Store, Written ) );
-  ITimecode Read;
-  EXPECT_TRUE( ReadTimecode( ThroughBytes( Store ), Read ) );
-  EXPECT_EQ( Written, Read );
-
   auto Fields = []( const ITimecode& i )
   {
     return std::vector< std::int64_t >{ i.Standards, i.Hours, i.Minutes,       i.Seconds,       i.Frames,
@@ -308,92 +326,44 @@ TEST( Timecode, RoundTripAndTheFirstMissingKeyStopsTheRead )
     SCOPED_TRACE( Keys[Missing] );
     IVideoAttributes Partial = Store;
     ASSERT_TRUE( Partial.Remove( std::string( "Timecode." ) + Keys[Missing] ) );
-    Read = Sentinel;
+    ITimecode Read = Sentinel;
     EXPECT_FALSE( ReadTimecode( Partial, Read ) );
     for( std::size_t i = 0; i < 9; ++i )
       EXPECT_EQ( Fields( i < Missing ? Written : Sentinel )[i], Fields( Read )[i] ) << Keys[i];
   }
 }
 
-// ---------------------------------------------------------------------------------------------
-// Lens, camera and conversion records.
-
-TEST( LensDistortion, WriterAndReaderAgree )
+TEST( LensDistortion, ModelsWithoutParametersReadWithoutThemAndAnUnknownModelFails )
 {
   const struct
   {
     const char* Name;
     VLensDistortionCalibration Lens;
-    bool Writes;
+    bool bWrites, bReads;
     VLensDistortionCalibration Expected;
-  } Cases[] = { { "two parameters", Lens( RadialModel_Lumek2Parameter, { -0.2, 0.05 }, 960.5, 540.25 ), true,
-                  Lens( RadialModel_Lumek2Parameter, { -0.2, 0.05 }, 960.5, 540.25 ) },
-                { "three parameters", Lens( RadialModel_Lumek3Parameter, { 1, 2, 3 }, -1, 0 ), true,
-                  Lens( RadialModel_Lumek3Parameter, { 1, 2, 3 }, -1, 0 ) },
-                { "zero parameters: the write fails but reads", Lens( RadialModel_Lumek0Parameter, { 4, 5 }, 1, 2 ),
-                  false, Lens( RadialModel_Lumek0Parameter, {}, 1, 2 ) },
-                { "bad model reads without parameters", Lens( RadialModel_BadRadialModel, {}, 3, 4 ), false,
-                  Lens( RadialModel_BadRadialModel, {}, 3, 4 ) } };
+  } Cases[] = {
+      { "three parameters", Lens( RadialModel_Lumek3Parameter, { 1, 2, 3 }, -1, 0 ), true, true,
+        Lens( RadialModel_Lumek3Parameter, { 1, 2, 3 }, -1, 0 ) },
+      { "fewer parameters than the model takes", Lens( RadialModel_Lumek3Parameter, { 1, 2 } ), false, false, {} },
+      { "zero parameters: the write fails but reads", Lens( RadialModel_Lumek0Parameter, { 4, 5 }, 1, 2 ), false, true,
+        Lens( RadialModel_Lumek0Parameter, {}, 1, 2 ) },
+      { "bad model reads without parameters", Lens( RadialModel_BadRadialModel, {}, 3, 4 ), false, true,
+        Lens( RadialModel_BadRadialModel, {}, 3, 4 ) } };
   for( const auto& rCase : Cases )
   {
     SCOPED_TRACE( rCase.Name );
     IVideoAttributes Store;
-    EXPECT_EQ( rCase.Writes, WriteLensDistortionCalibration( Store, "Q.", rCase.Lens ) );
+    EXPECT_EQ( rCase.bWrites, WriteLensDistortionCalibration( Store, "Q.", rCase.Lens ) );
     VLensDistortionCalibration Read;
     Read.RadialDistortionParameters = { 7, 7, 7, 7 };
-    EXPECT_TRUE( ReadLensDistortionCalibration( ThroughBytes( Store ), "Q.", Read ) );
-    EXPECT_EQ( rCase.Expected, Read );
+    EXPECT_EQ( rCase.bReads, ReadLensDistortionCalibration( Store, "Q.", Read ) );
+    EXPECT_TRUE( !rCase.bReads || rCase.Expected == Read );
   }
-}
-
-TEST( LensDistortion, ModelTextAndCentreAreRequired )
-{
   IVideoAttributes Store;
-  WriteLensDistortionCalibration( Store, "", Lens( RadialModel_Lumek2Parameter, { 1, 2 }, 3, 4 ) );
-  for( const char* pKey :
-       { "RadialModel", "RadialDistortionCentre_X", "RadialDistortionCentre_Y", "RadialDistortionParameters_1" } )
-  {
-    IVideoAttributes Missing = Store;
-    Missing.Remove( std::string( "LensDistortionCalibration." ) + pKey );
-    VLensDistortionCalibration Read;
-    EXPECT_FALSE( ReadLensDistortionCalibration( Missing, "", Read ) ) << pKey;
-  }
   Store.Set( "LensDistortionCalibration.RadialModel", "Lumek4Parameter" );
   VLensDistortionCalibration Read;
   EXPECT_FALSE( ReadLensDistortionCalibration( Store, "", Read ) );
   EXPECT_EQ( VLensDistortionCalibration(), Read );
-}
-
-// The required keys are read in this order and the first absent one stops the chain; the serial
-// number is not required and is read anyway.
-TEST( CameraHardware, RoundTripAndTheFirstAbsentKeyStopsTheChain )
-{
-  const VCameraHardware Camera{ "urn:lumek:camera:0042", "SN-12", "Vantage", "Vantage V16", 4096, 3072, 1.25 };
-  IVideoAttributes Store;
-  ASSERT_TRUE( WriteCameraHardware( Store, Camera ) );
-  VCameraHardware Read;
-  EXPECT_TRUE( ReadCameraHardware( ThroughBytes( Store ), Read ) );
-  EXPECT_EQ( Camera, Read );
-
-  const char* const Chain[] = { "DeviceURN",           "DisplayType", "PixelAspectRatio", "SensorHeightInPixels",
-                                "SensorWidthInPixels", "Type",        "SerialNumber" };
-  for( int Missing = 0; Missing < 7; ++Missing )
-  {
-    SCOPED_TRACE( Chain[Missing] );
-    IVideoAttributes Partial = Store;
-    Partial.Remove( std::string( "CameraHardware." ) + Chain[Missing] );
-    Read = { "old", "old", "old", "old", 9, 9, 9.0 };
-    EXPECT_EQ( Missing == 6, ReadCameraHardware( Partial, Read ) );
-    EXPECT_EQ( Missing == 6 ? "old" : Camera.SerialNumber, Read.SerialNumber );
-    const bool bRead[] = { Read.DeviceURN == Camera.DeviceURN,
-                           Read.DisplayType == Camera.DisplayType,
-                           Read.PixelAspectRatio == Camera.PixelAspectRatio,
-                           Read.SensorHeightInPixels == Camera.SensorHeightInPixels,
-                           Read.SensorWidthInPixels == Camera.SensorWidthInPixels,
-                           Read.Type == Camera.Type };
-    for( int i = 0; i < 6; ++i )
-      EXPECT_EQ( i < Missing, bRead[i] ) << Chain[i];
-  }
 }
 
 TEST( ConversionRecords, RoundTripInOrderAndAGapEndsTheList )
@@ -414,7 +384,7 @@ TEST( ConversionRecords, RoundTripInOrderAndAGapEndsTheList )
   EXPECT_EQ( "IMAGES", Container );
 
   std::vector< VConversionRecord > Read( 1 );
-  ReadConversionRecords( ThroughBytes( Store ), Read );
+  ReadConversionRecords( Store, Read );
   ASSERT_EQ( Records.size(), Read.size() );
   // Written again, what was read gives the same keys: no field lost, moved or changed.
   IVideoAttributes Again;

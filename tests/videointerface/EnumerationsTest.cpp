@@ -48,32 +48,19 @@ TEST( Enumerations, EveryTableLooksUpBothWaysExactlyAndFallsBackOutsideItsRows )
   }
 }
 
-TEST( Enumerations, SampleFormatNumbersAreOutOfStepWithTheRows )
+// Files store "Float32" and "UInt8"; the numbers in memory are 6 and 7, out of step with the rows.
+// A table written in row order would swap the two formats without any other symptom.
+TEST( Enumerations, TypedLookupsKeepTheValueOnFailureAndSampleFormatsKeepTheirNumbers )
 {
-  // Files store "Float32" and "UInt8"; the numbers in memory are 6 and 7. A table written in row
-  // order would swap the two formats without any other symptom.
-  EAudioSampleFormat Format = AudioSampleFormat_Unspecified;
-  ASSERT_TRUE( FromString( "Float32", Format ) );
-  EXPECT_EQ( 6u, Format );
-  ASSERT_TRUE( FromString( "UInt8", Format ) );
-  EXPECT_EQ( 7u, Format );
-  EXPECT_STREQ( "UInt16", ToString( static_cast< EAudioSampleFormat >( 5 ) ) );
-  EXPECT_STREQ( "UInt32", ToString( static_cast< EAudioSampleFormat >( 9 ) ) );
+  EXPECT_STREQ( "Float32", ToString( static_cast< EAudioSampleFormat >( 6 ) ) );
+  EXPECT_STREQ( "UInt8", ToString( static_cast< EAudioSampleFormat >( 7 ) ) );
   EXPECT_STREQ( "UInt8", AudioSampleFormatTable().Rows[5].Name );
-}
 
-TEST( Enumerations, TypedLookupsKeepTheValueOnFailureAndFallBackOutsideTheTable )
-{
-  EPixelFormat Format = PixelFormat_Unspecified;
-  EXPECT_FALSE( FromString( "bayerGB8", Format ) );
-  EXPECT_EQ( PixelFormat_Unspecified, Format );
   EVideoContainer Container = VideoContainer_LVID;
   EXPECT_FALSE( FromString( "lvid", Container ) );
   EXPECT_EQ( VideoContainer_LVID, Container );
   EXPECT_TRUE( FromString( "MKV", Container ) );
   EXPECT_EQ( VideoContainer_MKV, Container );
-
-  EXPECT_STREQ( "Unspecified", ToString( static_cast< EPixelFormat >( 20 ) ) );
   EXPECT_FALSE( ToStringOptional( static_cast< EPixelFormat >( 20 ) ) );
   EXPECT_EQ( std::string( "Unspecified" ), ToStringOptional( PixelFormat_Unspecified ) );
   EXPECT_STREQ( "?", ToString( static_cast< EVideoPayload >( 6 ), "?" ) );
