@@ -269,13 +269,17 @@ namespace
     const struct
     {
       const char* Name;
-      int ColourMode;
+      int ColourMode, AlphaMode;
       float BlendConstant;
       float R, G, B; // expected, before clamping
     } Cases[] = {
-        { "Replace", 0, 1.0f, 1.0f, 0.5f, 0.0f },        { "Alpha", 1, 1.0f, 0.6f, 0.45f, 0.3f },
-        { "AdditiveAlpha", 2, 1.0f, 0.7f, 0.65f, 0.6f }, { "ConstantAlphaAdditive", 3, 0.25f, 0.45f, 0.525f, 0.6f },
-        { "Premultiplied", 4, 1.0f, 1.1f, 0.7f, 0.3f },
+        { "Opaque", 0, 0, 1.0f, 1.0f, 0.5f, 0.0f },
+        // Alpha mode 1 turns blending on for colour mode 0 as well.
+        { "Replace", 0, 1, 1.0f, 1.0f, 0.5f, 0.0f },
+        { "Alpha", 1, 1, 1.0f, 0.6f, 0.45f, 0.3f },
+        { "AdditiveAlpha", 2, 1, 1.0f, 0.7f, 0.65f, 0.6f },
+        { "ConstantAlphaAdditive", 3, 1, 0.25f, 0.45f, 0.525f, 0.6f },
+        { "Premultiplied", 4, 1, 1.0f, 1.1f, 0.7f, 0.3f },
     };
     QMatrix4x4 Projection;
     Projection.scale( 0.5f, 1.0f, 1.0f );
@@ -285,8 +289,7 @@ namespace
       SCOPED_TRACE( rCase.Name );
       CoreGraphics::VRenderState State;
       State.ColourBlendMode = rCase.ColourMode;
-      // Alpha mode 1 turns blending on for colour mode 0 as well.
-      State.AlphaBlendMode = 1;
+      State.AlphaBlendMode = rCase.AlphaMode;
       State.BlendConstant = rCase.BlendConstant;
       const QImage Picture = DrawQuad( 8, QVector4D( 1.0f, 0.5f, 0.0f, 0.5f ), Clear, State, Projection );
       for( int x = 0; x < 8; ++x )

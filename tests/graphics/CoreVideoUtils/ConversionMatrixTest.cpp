@@ -119,17 +119,12 @@ namespace
       EPixelFormat From, Via, To;
     } Steps[] = {
         { PixelFormat_BayerRG8, PixelFormat_R8G8B8, PixelFormat_U8Y8V8Y8 },
-        { PixelFormat_BayerBG8, PixelFormat_R8G8B8, PixelFormat_R8G8B8u8 },
         { PixelFormat_BayerGR8, PixelFormat_R8G8B8, PixelFormat_PlanarR8G8B8 },
         { PixelFormat_U8Y8V8Y8, PixelFormat_R8G8B8, PixelFormat_B8G8R8u8 },
         { PixelFormat_Luminance7, PixelFormat_Luminance8, PixelFormat_R8G8B8 },
         { PixelFormat_R5G6B5, PixelFormat_R8G8B8, PixelFormat_Y8U8Y8V8 },
-        { PixelFormat_PlanarR8G8B8, PixelFormat_R8G8B8, PixelFormat_R5G6B5 },
         { PixelFormat_B8G8R8, PixelFormat_Luminance8, PixelFormat_Luminance6 },
         { PixelFormat_BayerGB7, PixelFormat_BayerGB8, PixelFormat_R8G8B8 },
-        { PixelFormat_BayerGB7, PixelFormat_BayerGB8, PixelFormat_Luminance8 },
-        { PixelFormat_BayerGB7, PixelFormat_BayerGB8, PixelFormat_PlanarY8U8V8 },
-        { PixelFormat_BayerGB6, PixelFormat_BayerGB8, PixelFormat_R8G8B8 },
         { PixelFormat_BayerGB6, PixelFormat_BayerGB8, PixelFormat_Luminance8 },
         { PixelFormat_BayerGB6, PixelFormat_BayerGB8, PixelFormat_PlanarY8U8V8 },
     };

@@ -4,7 +4,6 @@
 
 #include <cstdint>
 #include <random>
-#include <string>
 #include <vector>
 
 namespace CoreVideoUtilsTest
@@ -59,8 +58,6 @@ namespace CoreVideoUtilsTest
                             ZOL::EPixelFormat i_From, ZOL::EPixelFormat i_To )
   {
     Bytes Result;
-    if( !Convert( i_rSource, i_Width, i_Height, i_From, i_To, Result ) )
-      Result.clear();
-    return Result;
+    return Convert( i_rSource, i_Width, i_Height, i_From, i_To, Result ) ? Result : Bytes();
   }
 } // namespace CoreVideoUtilsTest

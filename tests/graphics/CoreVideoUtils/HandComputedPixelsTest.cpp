@@ -49,7 +49,6 @@ namespace
   const VHandCase s_HandCases[] = {
       { "Luminance8_to_R8G8B8", 2, 1, PixelFormat_Luminance8, { 10, 200 }, PixelFormat_R8G8B8,
         { 10, 10, 10, 200, 200, 200 } },
-      { "Luminance8_to_R8G8B8u8", 1, 1, PixelFormat_Luminance8, { 7 }, PixelFormat_R8G8B8u8, { 7, 7, 7, 255 } },
       { "Luminance8_to_PlanarR8G8B8", 2, 1, PixelFormat_Luminance8, { 7, 9 }, PixelFormat_PlanarR8G8B8,
         { 7, 9, 7, 9, 7, 9 } },
       { "BayerRG8_to_R8G8B8", 3, 3, PixelFormat_BayerRG8, s_Mosaic, PixelFormat_R8G8B8, s_FromRG },
@@ -75,7 +74,6 @@ namespace
       { "B8G8R8_to_R8G8B8", 1, 1, PixelFormat_B8G8R8, { 3, 2, 1 }, PixelFormat_R8G8B8, { 1, 2, 3 } },
       { "R8G8B8u8_to_R8G8B8", 1, 1, PixelFormat_R8G8B8u8, { 1, 2, 3, 99 }, PixelFormat_R8G8B8, { 1, 2, 3 } },
       { "B8G8R8u8_to_R8G8B8", 1, 1, PixelFormat_B8G8R8u8, { 3, 2, 1, 99 }, PixelFormat_R8G8B8, { 1, 2, 3 } },
-      { "B8G8R8u8_to_B8G8R8", 1, 1, PixelFormat_B8G8R8u8, { 3, 2, 1, 99 }, PixelFormat_B8G8R8, { 3, 2, 1 } },
       // Red then green: U from the red pixel, V from the green one, no averaging.
       { "R8G8B8_to_U8Y8V8Y8", 2, 1, PixelFormat_R8G8B8, { 255, 0, 0, 0, 255, 0 }, PixelFormat_U8Y8V8Y8,
         { 90, 76, 0, 149 } },
@@ -91,19 +89,14 @@ namespace
         { 16, 16, 16, 235, 235, 235 } },
       { "U8Y8V8Y8_to_Luminance8", 2, 1, PixelFormat_U8Y8V8Y8, { 90, 81, 240, 145 }, PixelFormat_Luminance8,
         { 81, 145 } },
-      { "U8Y8V8Y8_to_Y8U8Y8V8", 2, 1, PixelFormat_U8Y8V8Y8, { 1, 2, 3, 4 }, PixelFormat_Y8U8Y8V8, { 2, 1, 4, 3 } },
       { "U8Y8V8Y8_to_U10Y10V10Y10", 2, 1, PixelFormat_U8Y8V8Y8, { 90, 81, 240, 145 }, PixelFormat_U10Y10V10Y10,
         TenBitRow() },
       { "U10Y10V10Y10_to_R8G8B8", 2, 1, PixelFormat_U10Y10V10Y10, TenBitRow(), PixelFormat_R8G8B8,
         { 238, 14, 13, 255, 78, 77 } },
-      { "U10Y10V10Y10_to_U8Y8V8Y8", 2, 1, PixelFormat_U10Y10V10Y10, TenBitRow(), PixelFormat_U8Y8V8Y8,
-        { 90, 81, 240, 145 } },
       { "Luminance7_to_Luminance8", 8, 1, PixelFormat_Luminance7, { 0x02, 0x08, 0x18, 0x40, 0xA1, 0x83, 0x88 },
         PixelFormat_Luminance8, { 2, 4, 6, 8, 10, 12, 14, 16 } },
       { "Luminance6_to_R8G8B8", 4, 1, PixelFormat_Luminance6, { 0x04, 0x20, 0xC4 }, PixelFormat_R8G8B8,
         { 4, 4, 4, 8, 8, 8, 12, 12, 12, 16, 16, 16 } },
-      { "Luminance8_to_Luminance7", 3, 1, PixelFormat_Luminance8, { 0xFF, 0x01, 0xAB }, PixelFormat_Luminance7,
-        { 0xFE, 0x02, 0xAD } },
       { "PlanarY8U8V8_to_R8G8B8u8", 2, 1, PixelFormat_PlanarY8U8V8, { 81, 145, 90, 240 }, PixelFormat_R8G8B8u8,
         { 238, 14, 13, 255, 255, 78, 77, 255 } },
       { "PlanarR8G8B8_to_R8G8B8", 2, 1, PixelFormat_PlanarR8G8B8, { 1, 2, 3, 4, 5, 6 }, PixelFormat_R8G8B8,
@@ -165,8 +158,9 @@ namespace
                                                                 { PixelFormat_BayerGR8, "GRBG" },
                                                                 { PixelFormat_BayerBG8, "BGGR" } };
     for( const auto& [Format, pPattern] : Patterns )
-      for( const auto& [W, H] : { std::make_pair( 1, 1 ), std::make_pair( 2, 2 ), std::make_pair( 5, 3 ),
-                                  std::make_pair( 37, 9 ), std::make_pair( 64, 4 ) } )
+      // A lone site, and rows longer than a vector with an odd tail; the vector forms' other
+      // remainders are theirs to check against the scalar rule.
+      for( const auto& [W, H] : { std::make_pair( 1, 1 ), std::make_pair( 37, 9 ) } )
       {
         const Bytes Mosaic = RandomBytes( W * H, 77 );
         const Bytes Expected = ReferenceDemosaic( Mosaic, W, H, pPattern );

@@ -11,52 +11,41 @@ namespace
   using namespace CoreVideoUtilsTest;
   using namespace ZOL;
 
-  struct VRoundTrip
-  {
-    const char* Name;
-    EPixelFormat From, Via;
-    std::uint8_t Mask[4]; // the bits of each byte of a pixel of From that survive
-    unsigned Step;
-  };
-
-  const VRoundTrip s_RoundTrips[] = {
-      { "R8G8B8_via_B8G8R8", PixelFormat_R8G8B8, PixelFormat_B8G8R8, { 0xFF, 0xFF, 0xFF }, 3 },
-      { "R8G8B8_via_R8G8B8u8", PixelFormat_R8G8B8, PixelFormat_R8G8B8u8, { 0xFF, 0xFF, 0xFF }, 3 },
-      { "R8G8B8_via_B8G8R8u8", PixelFormat_R8G8B8, PixelFormat_B8G8R8u8, { 0xFF, 0xFF, 0xFF }, 3 },
-      { "R8G8B8_via_PlanarR8G8B8", PixelFormat_R8G8B8, PixelFormat_PlanarR8G8B8, { 0xFF, 0xFF, 0xFF }, 3 },
-      { "R8G8B8_via_R5G6B5", PixelFormat_R8G8B8, PixelFormat_R5G6B5, { 0xF8, 0xFC, 0xF8 }, 3 },
-      { "U8Y8V8Y8_via_Y8U8Y8V8", PixelFormat_U8Y8V8Y8, PixelFormat_Y8U8Y8V8, { 0xFF, 0xFF }, 2 },
-      { "U8Y8V8Y8_via_U10Y10V10Y10", PixelFormat_U8Y8V8Y8, PixelFormat_U10Y10V10Y10, { 0xFF, 0xFF }, 2 },
-      { "Y8U8Y8V8_via_U10Y10V10Y10", PixelFormat_Y8U8Y8V8, PixelFormat_U10Y10V10Y10, { 0xFF, 0xFF }, 2 },
-      { "Luminance8_via_Luminance7", PixelFormat_Luminance8, PixelFormat_Luminance7, { 0xFE }, 1 },
-      { "Luminance8_via_Luminance6", PixelFormat_Luminance8, PixelFormat_Luminance6, { 0xFC }, 1 },
-      { "BayerGB8_via_BayerGB7", PixelFormat_BayerGB8, PixelFormat_BayerGB7, { 0xFE }, 1 },
-      { "BayerGB8_via_BayerGB6", PixelFormat_BayerGB8, PixelFormat_BayerGB6, { 0xFC }, 1 },
-  };
-
-  void CheckRoundTrip( const VRoundTrip& Trip, int W, int H )
-  {
-    const Bytes Source = RandomBytes( CoreVideoUtils::FrameSizeInBytes( W, H, Trip.From ), W * 7 + H );
-    const Bytes Via = MustConvert( Source, W, H, Trip.From, Trip.Via );
-    ASSERT_FALSE( Via.empty() );
-    const Bytes Back = MustConvert( Via, W, H, Trip.Via, Trip.From );
-    ASSERT_EQ( Back.size(), Source.size() );
-    Bytes Expected = Source;
-    for( std::size_t i = 0; i < Expected.size(); ++i )
-      Expected[i] &= Trip.Mask[i % Trip.Step];
-    EXPECT_EQ( Back, Expected );
-  }
-
   TEST( RoundTrips, LoseOnlyTheNarrowFormatsBits )
   {
-    for( const VRoundTrip& rTrip : s_RoundTrips )
+    const struct
+    {
+      EPixelFormat From, Via;
+      std::uint8_t Mask[3]; // the bits of each byte of a pixel of From that survive
+      unsigned Step;
+    } Trips[] = {
+        { PixelFormat_R8G8B8, PixelFormat_B8G8R8, { 0xFF, 0xFF, 0xFF }, 3 },
+        { PixelFormat_R8G8B8, PixelFormat_R8G8B8u8, { 0xFF, 0xFF, 0xFF }, 3 },
+        { PixelFormat_R8G8B8, PixelFormat_B8G8R8u8, { 0xFF, 0xFF, 0xFF }, 3 },
+        { PixelFormat_R8G8B8, PixelFormat_PlanarR8G8B8, { 0xFF, 0xFF, 0xFF }, 3 },
+        { PixelFormat_R8G8B8, PixelFormat_R5G6B5, { 0xF8, 0xFC, 0xF8 }, 3 },
+        { PixelFormat_U8Y8V8Y8, PixelFormat_Y8U8Y8V8, { 0xFF }, 1 },
+        { PixelFormat_U8Y8V8Y8, PixelFormat_U10Y10V10Y10, { 0xFF }, 1 },
+        { PixelFormat_Y8U8Y8V8, PixelFormat_U10Y10V10Y10, { 0xFF }, 1 },
+        { PixelFormat_Luminance8, PixelFormat_Luminance7, { 0xFE }, 1 },
+        { PixelFormat_Luminance8, PixelFormat_Luminance6, { 0xFC }, 1 },
+        { PixelFormat_BayerGB8, PixelFormat_BayerGB7, { 0xFE }, 1 },
+        { PixelFormat_BayerGB8, PixelFormat_BayerGB6, { 0xFC }, 1 },
+    };
+    for( const auto& rTrip : Trips )
       // Widths around the 48-pixel rows of the 10-bit format and an odd run longer than the
       // converter's 4608-pixel runs.
-      for( const auto& [W, H] : { std::make_pair( 2, 1 ), std::make_pair( 47, 2 ), std::make_pair( 48, 3 ),
-                                  std::make_pair( 98, 2 ), std::make_pair( 4610, 2 ), std::make_pair( 7, 5 ) } )
+      for( const auto& [W, H] : { std::make_pair( 47, 2 ), std::make_pair( 48, 3 ), std::make_pair( 4610, 2 ) } )
       {
-        SCOPED_TRACE( std::string( rTrip.Name ) + " " + std::to_string( W ) + "x" + std::to_string( H ) );
-        CheckRoundTrip( rTrip, W, H );
+        SCOPED_TRACE( std::string( ToString( rTrip.From ) ) + " via " + ToString( rTrip.Via ) + " " +
+                      std::to_string( W ) + "x" + std::to_string( H ) );
+        const Bytes Source = RandomBytes( CoreVideoUtils::FrameSizeInBytes( W, H, rTrip.From ), W * 7 + H );
+        const Bytes Via = MustConvert( Source, W, H, rTrip.From, rTrip.Via );
+        ASSERT_FALSE( Via.empty() );
+        Bytes Expected = Source;
+        for( std::size_t i = 0; i < Expected.size(); ++i )
+          Expected[i] &= rTrip.Mask[i % rTrip.Step];
+        EXPECT_EQ( MustConvert( Via, W, H, rTrip.Via, rTrip.From ), Expected );
       }
   }
 
@@ -86,14 +75,11 @@ namespace
     Bytes Packed = Stream;
     CoreVideoUtils::Kernels::PackSamples( Values.data(), Bits, First, Count, Packed.data(), Packed.size() );
     for( std::uint64_t Bit = 0; Bit < StreamBytes * 8; ++Bit )
-    {
-      const bool bInSamples = Bit >= First * Bits && Bit < ( First + Count ) * Bits;
-      if( !bInSamples )
+      if( Bit < First * Bits || Bit >= ( First + Count ) * Bits )
       {
         ASSERT_EQ( ( Packed[Bit / 8] >> ( 7 - Bit % 8 ) ) & 1, ( Stream[Bit / 8] >> ( 7 - Bit % 8 ) ) & 1 )
             << "bit " << Bit;
       }
-    }
     for( int i = 0; i < Count; ++i )
       ASSERT_EQ( SampleByBits( Packed, Bits, First + i ), Values[i] & ( 0xFF << ( 8 - Bits ) ) ) << "sample " << i;
   }
@@ -102,8 +88,8 @@ namespace
   TEST( PackedSamples, UnpackMatchesBitByBitAndPackLeavesOtherBitsAlone )
   {
     for( unsigned Bits : { 6u, 7u } )
-      for( int First : { 0, 1, 5, 8, 13 } )
-        for( int Count : { 1, 7, 8, 9, 31, 32, 33, 100, 1001 } )
+      for( int First : { 0, 5, 13 } )
+        for( int Count : { 1, 8, 9, 33, 1001 } )
         {
           SCOPED_TRACE( std::to_string( Bits ) + " bits, first " + std::to_string( First ) + ", count " +
                         std::to_string( Count ) );

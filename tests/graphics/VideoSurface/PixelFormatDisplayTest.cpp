@@ -9,6 +9,7 @@
 namespace
 {
   using namespace SurfaceTest;
+  using LumekVideoViewer::Hardware;
   using LumekVideoViewer::Software;
 
   using PixelFormatDisplayTest = SurfaceDisplayTest;
@@ -28,22 +29,18 @@ namespace
       const char* DecoderName;
     } Cases[] = {
         // Widths of 37 and 33 make rows whose length is not a multiple of four bytes.
-        { ZOL::PixelFormat_Luminance8, 40, 24, 0, Grey },
         { ZOL::PixelFormat_Luminance8, 37, 21, 0, Grey },
         { ZOL::PixelFormat_Luminance8, 641, 5, 0, Grey },
         { ZOL::PixelFormat_Luminance7, 37, 21, 0, Grey },
         { ZOL::PixelFormat_Luminance6, 40, 24, 0, Grey },
         { ZOL::PixelFormat_BayerRG8, 40, 24, 2, Bayer },
         { ZOL::PixelFormat_BayerGB8, 40, 24, 2, Bayer },
-        { ZOL::PixelFormat_BayerGR8, 40, 24, 2, Bayer },
+        { ZOL::PixelFormat_BayerGR8, 37, 21, 2, Bayer },
         { ZOL::PixelFormat_BayerBG8, 40, 24, 2, Bayer },
-        { ZOL::PixelFormat_BayerBG8, 37, 21, 2, Bayer },
         { ZOL::PixelFormat_BayerGB7, 37, 24, 2, Bayer },
         { ZOL::PixelFormat_BayerGB6, 40, 21, 2, Bayer },
         // The card widens 5 and 6 bits by repeating the top bits, the processor by zeros.
-        { ZOL::PixelFormat_R5G6B5, 40, 24, 7, RGB },
         { ZOL::PixelFormat_R5G6B5, 37, 21, 7, RGB },
-        { ZOL::PixelFormat_R8G8B8, 40, 24, 0, RGB },
         { ZOL::PixelFormat_R8G8B8, 37, 21, 0, RGB },
         { ZOL::PixelFormat_B8G8R8, 33, 24, 0, RGB },
         { ZOL::PixelFormat_R8G8B8u8, 37, 24, 0, RGB },
@@ -58,23 +55,20 @@ namespace
       SCOPED_TRACE( std::string( ZOL::ToString( rCase.Format ) ) + " " + std::to_string( rCase.Width ) + "x" +
                     std::to_string( rCase.Height ) );
       const ZOL::IVideoFrame Frame = RandomFrame( rCase.Format, rCase.Width, rCase.Height );
-      Show( Frame, LumekVideoViewer::Hardware, false );
+      Show( Frame, Hardware, false );
       EXPECT_EQ( m_pWidget->GetDecoderName().toStdString(), rCase.DecoderName );
       EXPECT_TRUE(
           Shows( rCase.DecoderName == Bayer ? MalvarPicture( Frame ) : ProcessorPicture( Frame ), rCase.Tolerance ) );
     }
-  }
 
-  // The shader's 5 by 5 filter and the processor's bilinear one agree on smooth content, away
-  // from the border that the processor darkens.
-  TEST_F( PixelFormatDisplayTest, BayerAgreesWithTheProcessorOnSmoothContent )
-  {
+    // The shader's 5 by 5 filter and the processor's bilinear one agree on smooth content, away
+    // from the border that the processor darkens.
     for( ZOL::EPixelFormat Format : { ZOL::PixelFormat_BayerRG8, ZOL::PixelFormat_BayerGB8, ZOL::PixelFormat_BayerGR8,
                                       ZOL::PixelFormat_BayerBG8 } )
     {
       SCOPED_TRACE( ZOL::ToString( Format ) );
       const ZOL::IVideoFrame Frame = SmoothBayerFrame( Format, 48, 32 );
-      Show( Frame, LumekVideoViewer::Hardware, false );
+      Show( Frame, Hardware, false );
       EXPECT_TRUE( Shows( ProcessorPicture( Frame ), 4, 2 ) );
     }
   }
@@ -83,6 +77,8 @@ namespace
   // processor's picture in Software mode.
   TEST_F( PixelFormatDisplayTest, PlanarShowsNothingInHardwareAndThePictureInSoftware )
   {
+    QImage Black( 40, 24, QImage::Format_RGB32 );
+    Black.fill( Qt::black );
     for( ZOL::EPixelFormat Format : { ZOL::PixelFormat_PlanarY8U8V8, ZOL::PixelFormat_PlanarR8G8B8 } )
     {
       SCOPED_TRACE( ZOL::ToString( Format ) );
@@ -92,7 +88,7 @@ namespace
       Grab();
       m_pWidget->PrepareFrame( 1, Frame.VideoFrameInfo, Frame, false );
       EXPECT_EQ( m_pWidget->GetDecoderName().toStdString(), "Hardware Bayer Demosaic" ) << "unchanged";
-      EXPECT_TRUE( Shows( VRGBImage( 40, 24 ), 0 ) );
+      EXPECT_TRUE( Shows( Black, 0 ) );
 
       m_pWidget->SetDecoder( Software );
       m_pWidget->PrepareFrame( 1, Frame.VideoFrameInfo, Frame, false );
@@ -103,11 +99,10 @@ namespace
 
   TEST_F( PixelFormatDisplayTest, GammaAndSaturationApplyToBayerFramesOnly )
   {
-    for( const auto& [Gamma, Saturation] : { std::make_pair( 2.2f, 1.0f ), std::make_pair( 1.0f, 0.4f ),
-                                             std::make_pair( 1.0f, 1.6f ), std::make_pair( 0.7f, 1.3f ) } )
+    ZOL::IVideoSettings Settings;
+    for( const auto& [Gamma, Saturation] : { std::make_pair( 2.2f, 0.4f ), std::make_pair( 0.7f, 1.6f ) } )
     {
       SCOPED_TRACE( "gamma " + std::to_string( Gamma ) + ", saturation " + std::to_string( Saturation ) );
-      ZOL::IVideoSettings Settings;
       Settings.GammaCorrection = Gamma;
       Settings.Saturation = Saturation;
 
@@ -121,23 +116,21 @@ namespace
       // inside the converter and once more from the widget's own corrector.
       const ZOL::IVideoFrame Other = SmoothBayerFrame( ZOL::PixelFormat_BayerRG8, 40, 24 );
       Show( Other, Software );
-      const VRGBImage Plain = ProcessorPicture( Other );
+      const QImage Plain = ProcessorPicture( Other );
       EXPECT_TRUE( Shows( Plain, 0 ) );
       m_pWidget->SetVideoSettings( Settings );
       EXPECT_TRUE( Shows( Plain, 0 ) ) << "before the next frame";
       m_pWidget->PrepareFrame( 1, Other.VideoFrameInfo, Other, false );
-      VRGBImage Twice = Plain;
+      QImage Twice = Plain.convertToFormat( QImage::Format_RGB888 );
       CoreVideoUtils::VColourCorrector Corrector;
       Corrector.Set( Settings );
       for( int Time = 0; Time < 2; ++Time )
-        Corrector.Apply( Twice.Width, Twice.Height, ZOL::PixelFormat_R8G8B8, Twice.Bytes.data() );
+        for( int y = 0; y < Twice.height(); ++y )
+          Corrector.Apply( Twice.width(), 1, ZOL::PixelFormat_R8G8B8, Twice.scanLine( y ) );
       EXPECT_TRUE( Shows( Twice, 0 ) );
     }
 
     // Other formats are left as they are, by the shaders and by the software path.
-    ZOL::IVideoSettings Settings;
-    Settings.GammaCorrection = 2.2f;
-    Settings.Saturation = 0.3f;
     for( ZOL::EPixelFormat Format :
          { ZOL::PixelFormat_Luminance8, ZOL::PixelFormat_R8G8B8, ZOL::PixelFormat_Y8U8Y8V8 } )
     {

@@ -27,23 +27,16 @@ namespace SurfaceTest
 
     int Clamp8( double i_Value )
     {
-      return int( std::lround( std::min( std::max( i_Value, 0.0 ), 255.0 ) ) );
+      return int( std::lround( std::clamp( i_Value, 0.0, 255.0 ) ) );
     }
 
-    // The colours of the mosaic's 2 by 2 tile, row by row.
+    // The colours of the mosaic's 2 by 2 tile, row by row; BayerGB8 for its packed forms too.
     const char* BayerTile( ZOL::EPixelFormat i_Format )
     {
-      switch( i_Format )
-      {
-      case ZOL::PixelFormat_BayerRG8:
-        return "RGGB";
-      case ZOL::PixelFormat_BayerGR8:
-        return "GRBG";
-      case ZOL::PixelFormat_BayerBG8:
-        return "BGGR";
-      default: // BayerGB8 and its packed forms
-        return "GBRG";
-      }
+      return i_Format == ZOL::PixelFormat_BayerRG8   ? "RGGB"
+             : i_Format == ZOL::PixelFormat_BayerGR8 ? "GRBG"
+             : i_Format == ZOL::PixelFormat_BayerBG8 ? "BGGR"
+                                                     : "GBRG";
     }
 
     std::vector< std::uint8_t > Convert( const ZOL::IVideoFrame& i_rFrame, ZOL::EPixelFormat i_To, int i_Bytes )
@@ -73,34 +66,31 @@ namespace SurfaceTest
   {
     ZOL::IVideoFrame Frame = MakeFrame( i_Format, i_Width, i_Height );
     const char* pTile = BayerTile( i_Format );
-    std::uint8_t* p = Frame.Video->GetData();
     for( int y = 0; y < i_Height; ++y )
       for( int x = 0; x < i_Width; ++x )
       {
         const double Channels[3] = { 128 + 60 * std::sin( x / 9.0 ) * std::cos( y / 11.0 ), 100 + x * 2.0 + y,
                                      150 - 50 * std::cos( ( x + y ) / 13.0 ) };
         const char Site = pTile[( y & 1 ) * 2 + ( x & 1 )];
-        p[y * i_Width + x] = std::uint8_t( Clamp8( Channels[Site == 'R' ? 0 : Site == 'G' ? 1 : 2] ) );
+        Frame.Video->GetData()[y * i_Width + x] = std::uint8_t( Clamp8( Channels[Site == 'R'   ? 0
+                                                                                 : Site == 'G' ? 1
+                                                                                               : 2] ) );
       }
     return Frame;
   }
 
-  VRGBImage ProcessorPicture( const ZOL::IVideoFrame& i_rFrame )
+  QImage ProcessorPicture( const ZOL::IVideoFrame& i_rFrame )
   {
     const ZOL::IVideoFrameInfo& rInfo = i_rFrame.VideoFrameInfo;
-    VRGBImage Picture( rInfo.ImageWidth, rInfo.ImageHeight );
-    if( rInfo.PixelFormat != ZOL::PixelFormat_PlanarY8U8V8 )
-    {
-      Picture.Bytes = Convert( i_rFrame, ZOL::PixelFormat_R8G8B8, 3 );
-      return Picture;
-    }
-    const std::vector< std::uint8_t > RGBA = Convert( i_rFrame, ZOL::PixelFormat_R8G8B8u8, 4 );
-    for( std::size_t i = 0; i < Picture.Bytes.size() / 3; ++i )
-      std::copy( &RGBA[i * 4], &RGBA[i * 4] + 3, &Picture.Bytes[i * 3] );
-    return Picture;
+    const bool bFourBytes = rInfo.PixelFormat == ZOL::PixelFormat_PlanarY8U8V8;
+    const std::vector< std::uint8_t > Bytes =
+        Convert( i_rFrame, bFourBytes ? ZOL::PixelFormat_R8G8B8u8 : ZOL::PixelFormat_R8G8B8, bFourBytes ? 4 : 3 );
+    return QImage( Bytes.data(), rInfo.ImageWidth, rInfo.ImageHeight, rInfo.ImageWidth * ( bFourBytes ? 4 : 3 ),
+                   bFourBytes ? QImage::Format_RGBX8888 : QImage::Format_RGB888 )
+        .convertToFormat( QImage::Format_RGB32 );
   }
 
-  VRGBImage MalvarPicture( const ZOL::IVideoFrame& i_rFrame, float i_Gamma, float i_Saturation )
+  QImage MalvarPicture( const ZOL::IVideoFrame& i_rFrame, float i_Gamma, float i_Saturation )
   {
     const int W = i_rFrame.VideoFrameInfo.ImageWidth;
     const int H = i_rFrame.VideoFrameInfo.ImageHeight;
@@ -112,7 +102,7 @@ namespace SurfaceTest
     // Where red sits in the tile.
     const int Red = int( std::string( BayerTile( Format ) ).find( 'R' ) );
     auto P = [&]( int x, int y ) { return Mosaic[std::clamp( y, 0, H - 1 ) * W + std::clamp( x, 0, W - 1 )] / 255.0; };
-    VRGBImage Picture( W, H );
+    QImage Picture( W, H, QImage::Format_RGB32 );
     for( int y = 0; y < H; ++y )
       for( int x = 0; x < W; ++x )
       {
@@ -148,60 +138,44 @@ namespace SurfaceTest
           Grey += std::max( rValue, 0.0 ) / 3;
         }
         const double Amount = std::min( 1.0 - i_Saturation, 1.0 );
+        int Out[3];
         for( int i = 0; i < 3; ++i )
-          Picture.At( x, y )[i] = std::uint8_t( Clamp8( ( Colour[i] + ( Grey - Colour[i] ) * Amount ) * 255.0 ) );
+          Out[i] = Clamp8( ( Colour[i] + ( Grey - Colour[i] ) * Amount ) * 255.0 );
+        Picture.setPixel( x, y, qRgb( Out[0], Out[1], Out[2] ) );
       }
     return Picture;
   }
 
-  void SavePictures( const QImage& i_rActual, const VRGBImage& i_rExpected, QPoint i_Origin )
-  {
-    const ::testing::TestInfo* pInfo = ::testing::UnitTest::GetInstance()->current_test_info();
-    QString Name = QString( "%1_%2" ).arg( pInfo->test_suite_name(), pInfo->name() );
-    Name.replace( '/', '_' );
-    QImage Expected( i_rActual.size(), QImage::Format_RGB32 );
-    Expected.fill( Qt::black );
-    for( int y = 0; y < i_rExpected.Height; ++y )
-      for( int x = 0; x < i_rExpected.Width; ++x )
-      {
-        const std::uint8_t* p = i_rExpected.At( x, y );
-        if( Expected.rect().contains( i_Origin + QPoint( x, y ) ) )
-          Expected.setPixel( i_Origin + QPoint( x, y ), qRgb( p[0], p[1], p[2] ) );
-      }
-    i_rActual.save( Name + "_actual.png" );
-    Expected.save( Name + "_expected.png" );
-  }
-
-  ::testing::AssertionResult SamePicture( const QImage& i_rActual, const VRGBImage& i_rExpected, QPoint i_Origin,
+  ::testing::AssertionResult SamePicture( const QImage& i_rActual, const QImage& i_rExpected, QPoint i_Origin,
                                           int i_Tolerance, int i_Inset )
   {
     int Worst = 0, Differing = 0;
     QPoint WorstAt;
-    for( int y = i_Inset; y < i_rExpected.Height - i_Inset; ++y )
-      for( int x = i_Inset; x < i_rExpected.Width - i_Inset; ++x )
+    for( int y = i_Inset; y < i_rExpected.height() - i_Inset; ++y )
+      for( int x = i_Inset; x < i_rExpected.width() - i_Inset; ++x )
       {
         if( !i_rActual.rect().contains( i_Origin + QPoint( x, y ) ) )
           return ::testing::AssertionFailure() << "picture too small for " << x << ", " << y;
-        const std::uint8_t* p = i_rExpected.At( x, y );
-        const QRgb Got = i_rActual.pixel( i_Origin + QPoint( x, y ) );
-        const int D = std::max(
-            { std::abs( qRed( Got ) - p[0] ), std::abs( qGreen( Got ) - p[1] ), std::abs( qBlue( Got ) - p[2] ) } );
+        const QRgb Want = i_rExpected.pixel( x, y ), Got = i_rActual.pixel( i_Origin + QPoint( x, y ) );
+        const int D = std::max( { std::abs( qRed( Got ) - qRed( Want ) ), std::abs( qGreen( Got ) - qGreen( Want ) ),
+                                  std::abs( qBlue( Got ) - qBlue( Want ) ) } );
         Differing += D > i_Tolerance ? 1 : 0;
         if( D > Worst )
           Worst = D, WorstAt = QPoint( x, y );
       }
-    // LUMEK_SAVE_PICTURES=1 keeps the pictures of passing comparisons too, to look at.
     if( Differing != 0 || qEnvironmentVariableIsSet( "LUMEK_SAVE_PICTURES" ) )
-      SavePictures( i_rActual, i_rExpected, i_Origin );
+    {
+      const ::testing::TestInfo* pInfo = ::testing::UnitTest::GetInstance()->current_test_info();
+      const QString Name = QString( "%1_%2" ).arg( pInfo->test_suite_name(), pInfo->name() ).replace( '/', '_' );
+      i_rActual.save( Name + "_actual.png" );
+      i_rExpected.save( Name + "_expected.png" );
+    }
     if( Differing == 0 )
       return ::testing::AssertionSuccess() << "largest difference " << Worst;
-    const std::uint8_t* p = i_rExpected.At( WorstAt.x(), WorstAt.y() );
-    const QRgb Got = i_rActual.pixel( i_Origin + WorstAt );
     return ::testing::AssertionFailure() << Differing << " pixels differ by more than " << i_Tolerance << "; worst "
                                          << Worst << " at image pixel (" << WorstAt.x() << ", " << WorstAt.y()
-                                         << "): got (" << qRed( Got ) << ", " << qGreen( Got ) << ", " << qBlue( Got )
-                                         << "), expected (" << int( p[0] ) << ", " << int( p[1] ) << ", " << int( p[2] )
-                                         << ")";
+                                         << "): got " << std::hex << i_rActual.pixel( i_Origin + WorstAt )
+                                         << ", expected " << i_rExpected.pixel( WorstAt );
   }
 
   LumekVideoViewer::VGLWidget& SurfaceDisplayTest::MakeWidget( int i_Width, int i_Height )
@@ -213,25 +187,20 @@ namespace SurfaceTest
     return *m_pWidget;
   }
 
-  LumekVideoViewer::VGLWidget& SurfaceDisplayTest::Show( const ZOL::IVideoFrame& i_rFrame,
-                                                         LumekVideoViewer::EDecoder i_Decoder, bool i_bNewWidget )
+  void SurfaceDisplayTest::Show( const ZOL::IVideoFrame& i_rFrame, LumekVideoViewer::EDecoder i_Decoder,
+                                 bool i_bNewWidget )
   {
     const ZOL::IVideoFrameInfo& rInfo = i_rFrame.VideoFrameInfo;
     const QSize Size( rInfo.ImageWidth + 2 * Margin, rInfo.ImageHeight + 2 * Margin );
     const bool bReuse = !i_bNewWidget && m_pWidget;
     if( bReuse )
       m_pWidget->setFixedSize( Size );
-    LumekVideoViewer::VGLWidget& rWidget = bReuse ? *m_pWidget : MakeWidget( Size.width(), Size.height() );
-    rWidget.SetScaleMode( LumekVideoViewer::ScaleOneToOne );
+    else
+      MakeWidget( Size.width(), Size.height() );
+    m_pWidget->SetScaleMode( LumekVideoViewer::ScaleOneToOne );
     // A new widget starts in Hardware mode, as the viewer's does.
     if( bReuse || i_Decoder != LumekVideoViewer::Hardware )
-      rWidget.SetDecoder( i_Decoder );
-    rWidget.PrepareFrame( 0, rInfo, i_rFrame, false );
-    return rWidget;
-  }
-
-  QImage SurfaceDisplayTest::Grab()
-  {
-    return m_pWidget->grabFramebuffer().convertToFormat( QImage::Format_RGB32 );
+      m_pWidget->SetDecoder( i_Decoder );
+    m_pWidget->PrepareFrame( 0, rInfo, i_rFrame, false );
   }
 } // namespace SurfaceTest

@@ -16,22 +16,6 @@
 
 namespace SurfaceTest
 {
-  // An 8-bit RGB picture, rows top first.
-  struct VRGBImage
-  {
-    int Width = 0;
-    int Height = 0;
-    std::vector< std::uint8_t > Bytes;
-
-    VRGBImage() = default;
-    VRGBImage( int i_Width, int i_Height )
-        : Width( i_Width ), Height( i_Height ), Bytes( std::size_t( i_Width ) * i_Height * 3 )
-    {
-    }
-    std::uint8_t* At( int i_X, int i_Y ) { return &Bytes[( std::size_t( i_Y ) * Width + i_X ) * 3]; }
-    const std::uint8_t* At( int i_X, int i_Y ) const { return &Bytes[( std::size_t( i_Y ) * Width + i_X ) * 3]; }
-  };
-
   inline CoreLumekTypes::VCameraHardware Camera( int i_Width, int i_Height )
   {
     CoreLumekTypes::VCameraHardware Hardware;
@@ -55,23 +39,22 @@ namespace SurfaceTest
   // A frame of random bytes; i_Fill, when not negative, sets every byte to it instead.
   ZOL::IVideoFrame RandomFrame( ZOL::EPixelFormat i_Format, int i_Width, int i_Height, std::uint32_t i_Seed = 1,
                                 int i_Fill = -1 );
-  // A Bayer mosaic of a smooth colour picture, so that different demosaics agree closely.
+  // An 8-bit Bayer mosaic of a smooth colour picture, so that different demosaics agree closely.
   ZOL::IVideoFrame SmoothBayerFrame( ZOL::EPixelFormat i_Format, int i_Width, int i_Height );
 
   // The processor's picture of a frame (the converter to R8G8B8, or to R8G8B8u8 for planar YUV,
   // which converts to the four-byte formats only).
-  VRGBImage ProcessorPicture( const ZOL::IVideoFrame& i_rFrame );
+  QImage ProcessorPicture( const ZOL::IVideoFrame& i_rFrame );
   // The 5 by 5 demosaic of Malvar, He and Cutler on a mosaic (widened to 8 bits first if packed),
   // edges clamped, followed by gamma and saturation as the display applies them; computed here in
   // double precision.
-  VRGBImage MalvarPicture( const ZOL::IVideoFrame& i_rFrame, float i_Gamma = 1.0f, float i_Saturation = 1.0f );
+  QImage MalvarPicture( const ZOL::IVideoFrame& i_rFrame, float i_Gamma = 1.0f, float i_Saturation = 1.0f );
 
   // Compares the part of the picture at i_Origin with the expected one, leaving i_Inset pixels
-  // of the expected picture's border out. On a difference both pictures are saved as PNG files
-  // named after the running test.
-  ::testing::AssertionResult SamePicture( const QImage& i_rActual, const VRGBImage& i_rExpected, QPoint i_Origin,
+  // of the expected picture's border out. On a difference (or with LUMEK_SAVE_PICTURES set) both
+  // pictures are saved as PNG files named after the running test.
+  ::testing::AssertionResult SamePicture( const QImage& i_rActual, const QImage& i_rExpected, QPoint i_Origin,
                                           int i_Tolerance, int i_Inset = 1 );
-  void SavePictures( const QImage& i_rActual, const VRGBImage& i_rExpected, QPoint i_Origin );
 
   // The display tests: a shown widget of a fixed size, skipped when there is no display.
   class SurfaceDisplayTest : public ::testing::Test
@@ -85,13 +68,12 @@ namespace SurfaceTest
     LumekVideoViewer::VGLWidget& MakeWidget( int i_Width, int i_Height );
     // A widget Margin larger than the frame on each side, showing it at 1:1; a new one, or the
     // last one resized, as the viewer's widget is given frames of one format after another.
-    LumekVideoViewer::VGLWidget& Show( const ZOL::IVideoFrame& i_rFrame,
-                                       LumekVideoViewer::EDecoder i_Decoder = LumekVideoViewer::Hardware,
-                                       bool i_bNewWidget = true );
+    void Show( const ZOL::IVideoFrame& i_rFrame, LumekVideoViewer::EDecoder i_Decoder = LumekVideoViewer::Hardware,
+               bool i_bNewWidget = true );
     // Paints the widget and reads its picture back, RGB only.
-    QImage Grab();
+    QImage Grab() { return m_pWidget->grabFramebuffer().convertToFormat( QImage::Format_RGB32 ); }
     // The widget's picture at 1:1 against the expected one.
-    ::testing::AssertionResult Shows( const VRGBImage& i_rExpected, int i_Tolerance, int i_Inset = 1 )
+    ::testing::AssertionResult Shows( const QImage& i_rExpected, int i_Tolerance, int i_Inset = 1 )
     {
       return SamePicture( Grab(), i_rExpected, QPoint( Margin, Margin ), i_Tolerance, i_Inset );
     }
