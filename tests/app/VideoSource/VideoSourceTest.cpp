@@ -1,3 +1,5 @@
+// The viewer's one way to a recording's frames and texts, on recordings written by the test.
+
 #include "tests/app/AppTestSupport.h"
 
 #include "app/VideoSource/VVideoSource.h"
@@ -8,6 +10,7 @@
 
 #include <gtest/gtest.h>
 
+#include <list>
 #include <map>
 
 using namespace AppTest;
@@ -15,49 +18,60 @@ using LumekVideoViewer::VVideoSource;
 
 namespace
 {
-  VRecordingSpec Bayer( std::vector< std::uint64_t > i_Frames, double i_FramesPerSecond = 50.0 )
-  {
-    VRecordingSpec Spec;
-    Spec.Width = 8;
-    Spec.Height = 4;
-    Spec.Format = ZOL::PixelFormat_BayerGB8;
-    Spec.Frames = std::move( i_Frames );
-    Spec.FramePeriodInTicks = TicksAt( i_FramesPerSecond );
-    return Spec;
-  }
+  using Index = std::optional< std::uint64_t >;
 
-  // A recording whose reader names a payload no decoder knows.
+  // A reader whose recording names a payload no decoder knows.
   class VUnknownPayloadReader : public LumekVideo::VReader
   {
   public:
     ZOL::EVideoPayload GetVideoPayload() const override { return static_cast< ZOL::EVideoPayload >( 99 ); }
   };
+
+  class VideoSource : public testing::Test
+  {
+  protected:
+    // An 8 x 4 Bayer recording at 50 Hz with the given frames stored, opened in Source.
+    static VRecordingSpec Bayer( std::vector< std::uint64_t > i_Frames )
+    {
+      VRecordingSpec Spec;
+      Spec.Width = 8;
+      Spec.Height = 4;
+      Spec.Format = ZOL::PixelFormat_BayerGB8;
+      Spec.Frames = std::move( i_Frames );
+      Spec.FramePeriodInTicks = TicksAt( 50.0 );
+      return Spec;
+    }
+    bool Open( const VRecordingSpec& i_rSpec, std::shared_ptr< ZOL::IVideoReader > i_pReader = nullptr )
+    {
+      const std::string& rPath = m_Files.emplace_back( i_rSpec ).Path;
+      return i_pReader ? Source.Open( rPath, std::move( i_pReader ) ) : Source.Open( rPath );
+    }
+
+    std::list< VTempRecording > m_Files;
+    VVideoSource Source;
+    ZOL::IVideoFrame Frame;
+  };
 } // namespace
 
 // The window shows these while no file is open.
-TEST( VideoSource, WithoutAFileAnswersFromDefaults )
+TEST_F( VideoSource, WithoutAFileAnswersFromDefaults )
 {
-  VVideoSource Source;
   EXPECT_FALSE( Source.IsOpen() );
   EXPECT_EQ( Source.GetVideoPayload(), ZOL::VideoPayload_None );
-  ZOL::IVideoFrame Frame;
   EXPECT_FALSE( Source.GetFrame( 0, Frame ) );
   EXPECT_EQ( Source.FindFrameAtOrBefore( 1 ), std::nullopt );
   EXPECT_EQ( LumekVideoViewer::ComposeInfoPanelTexts( Source, 0 ).Timecode, "No file open" );
   EXPECT_TRUE( LumekVideoViewer::ComposePropertyRows( Source ).empty() );
 }
 
-TEST( VideoSource, CountsMissingFramesAndReadsWhatIsThere )
+TEST_F( VideoSource, CountsMissingFramesAndReadsWhatIsThere )
 {
   VRecordingSpec Spec = Bayer( { 0, 1, 5 } );
   Spec.bAudio = true;
-  const VTempRecording Recording( Spec );
-  VVideoSource Source;
-  ASSERT_TRUE( Source.Open( Recording.Path ) );
+  ASSERT_TRUE( Open( Spec ) );
   EXPECT_EQ( Source.GetFrameCount(), 6u );
   EXPECT_EQ( Source.GetMissingFrameCount(), 3 );
 
-  ZOL::IVideoFrame Frame;
   EXPECT_FALSE( Source.GetFrame( 3, Frame ) );
   EXPECT_FALSE( Frame.Video ); // left as it stood
   EXPECT_FALSE( Source.GetFrame( 6, Frame ) );
@@ -72,106 +86,88 @@ TEST( VideoSource, CountsMissingFramesAndReadsWhatIsThere )
   EXPECT_EQ( Frame.AudioFrameInfo.SampleRate, 48000 );
 }
 
-TEST( VideoSource, AFailedOpenLeavesNoFileAndAnEmptyRecordingOpens )
+TEST_F( VideoSource, AFailedOpenLeavesNoFileAndAnEmptyRecordingOpens )
 {
-  const VTempRecording Recording( Bayer( { 0, 1, 2 } ) );
-  VVideoSource Source;
-  ASSERT_TRUE( Source.Open( Recording.Path ) );
-  const std::string Upper = Recording.Path.substr( 0, Recording.Path.size() - 4 ) + "LVID";
-  std::filesystem::copy_file( Recording.Path, Upper );
+  ASSERT_TRUE( Open( Bayer( { 0, 1, 2 } ) ) );
+  const std::string& rPath = m_Files.back().Path;
+  const std::string Upper = rPath.substr( 0, rPath.size() - 4 ) + "LVID";
+  std::filesystem::copy_file( rPath, Upper );
   EXPECT_FALSE( Source.Open( Upper ) ); // the name decides, and the comparison does not fold case
   std::filesystem::remove( Upper );
   EXPECT_FALSE( Source.IsOpen() );
   EXPECT_EQ( Source.GetVideoPayload(), ZOL::VideoPayload_None );
-  EXPECT_FALSE( Source.Open( Recording.Path + ".absent.lvid" ) );
+  EXPECT_FALSE( Source.Open( rPath + ".absent.lvid" ) );
 
-  const VTempRecording Empty( Bayer( {} ) );
-  ASSERT_TRUE( Source.Open( Empty.Path ) );
+  ASSERT_TRUE( Open( Bayer( {} ) ) );
   EXPECT_EQ( Source.GetFrameCount(), 0u );
   EXPECT_EQ( Source.GetMissingFrameCount(), 0 );
 }
 
-TEST( VideoSource, LensDistortionNeedsBothRecords )
+TEST_F( VideoSource, LensDistortionNeedsBothRecords )
 {
   VRecordingSpec Spec = Bayer( { 0 } );
   Spec.bLens = true;
-  const VTempRecording LensOnly( Spec );
-  VVideoSource Source;
-  ASSERT_TRUE( Source.Open( LensOnly.Path ) );
+  ASSERT_TRUE( Open( Spec ) );
   EXPECT_FALSE( Source.HasLensDistortion() );
-
   Spec.bCamera = true;
-  const VTempRecording Both( Spec );
-  ASSERT_TRUE( Source.Open( Both.Path ) );
+  ASSERT_TRUE( Open( Spec ) );
   EXPECT_TRUE( Source.HasLensDistortion() );
   Source.Close();
   EXPECT_TRUE( Source.HasLensDistortion() ); // kept until the next open
 }
 
-TEST( VideoSource, TextsOfTheInformationPanel )
+// The information panel's golden texts, and the properties listing every key of the records.
+TEST_F( VideoSource, TextsOfTheInformationPanelAndTheProperties )
 {
   VRecordingSpec Spec = Bayer( { 0, 2 } );
   ZOL::ITimecode Timecode;
   Timecode.Standards = ZOL::TimecodeStandard_30;
   Timecode.Minutes = 5;
   ZOL::WriteTimecode( Spec.Attributes, Timecode );
-  const VTempRecording Recording( Spec );
-  VVideoSource Source;
-  ASSERT_TRUE( Source.Open( Recording.Path ) );
+  ASSERT_TRUE( Open( Spec ) );
   const auto Texts = LumekVideoViewer::ComposeInfoPanelTexts( Source, 1 );
   EXPECT_EQ( Texts.Video, "V: 8 x 4 / BayerGB8 / 50.00Hz / 3 frames (1 missing) / 0.06s" );
   EXPECT_EQ( Texts.Audio, "" );
   // 50 Hz divides the 25 fps period: half a timecode frame per video frame.
   EXPECT_EQ( Texts.Timecode, "T: 00:05:00:00+50 [25 fps]" );
   EXPECT_EQ( LumekVideoViewer::ComposeDecoderText( "Hardware (GPU)", 99.84 ), "Hardware (GPU) @ 99.8fps" );
-}
 
-TEST( VideoSource, PropertiesListEveryKeyWithTheRecords )
-{
-  const VTempRecording Recording( Bayer( { 0 } ) );
-  VVideoSource Source;
-  ASSERT_TRUE( Source.Open( Recording.Path ) );
   const auto Rows = LumekVideoViewer::ComposePropertyRows( Source );
   std::map< std::string, std::string > Map( Rows.begin(), Rows.end() );
   EXPECT_EQ( Map.size(), Rows.size() );
-  EXPECT_EQ( Map["VideoFrameInfo.PixelFormat"], "BayerGB8" );
-  EXPECT_EQ( Map["VideoFrameInfo.ImageWidth"], "8" );
-  EXPECT_EQ( Map["AudioFrameInfo.Present"], "0" );
-  EXPECT_EQ( Map["GammaCorrection"], "1" );
-  EXPECT_EQ( Map["FramePeriodInTicks"], "2700000" );
-  EXPECT_TRUE( std::is_sorted( Rows.begin(), Rows.end(),
-                               []( const auto& i_rA, const auto& i_rB ) { return i_rA.first < i_rB.first; } ) );
+  EXPECT_TRUE( std::is_sorted( Rows.begin(), Rows.end() ) );
+  for( const auto& [Key, Value] : { std::pair( "VideoFrameInfo.PixelFormat", "BayerGB8" ),
+                                    { "VideoFrameInfo.ImageWidth", "8" },
+                                    { "AudioFrameInfo.Present", "0" },
+                                    { "GammaCorrection", "1" },
+                                    { "FramePeriodInTicks", "2700000" } } )
+    EXPECT_EQ( Map[Key], Value ) << Key;
 }
 
-TEST( VideoSource, FindsStoredFramesEitherSideOfAGap )
+TEST_F( VideoSource, FindsStoredFramesEitherSideOfAGap )
 {
-  const VTempRecording Recording( Bayer( { 1, 2 } ) );
-  VVideoSource Source;
-  ASSERT_TRUE( Source.Open( Recording.Path ) );
+  ASSERT_TRUE( Open( Bayer( { 1, 2 } ) ) );
   EXPECT_EQ( Source.FindFrameAtOrBefore( 0 ), std::nullopt );
-  EXPECT_EQ( Source.FindFrameAtOrBefore( 99 ), std::optional< std::uint64_t >( 2 ) ); // past the end: the last
-  EXPECT_EQ( Source.FindFrameAtOrAfter( 0 ), std::optional< std::uint64_t >( 1 ) );
+  EXPECT_EQ( Source.FindFrameAtOrBefore( 99 ), Index( 2 ) ); // past the end: the last
+  EXPECT_EQ( Source.FindFrameAtOrAfter( 0 ), Index( 1 ) );
 
   // A damaged index naming frame 2^40: opening, the fallback to an earlier frame and the next
   // stored frame all answer from the index at once, without walking to it.
   const std::uint64_t Far = std::uint64_t( 1 ) << 40;
-  const VTempRecording Damaged( Bayer( { 0, 7, Far } ) );
-  ASSERT_TRUE( Source.Open( Damaged.Path ) );
+  ASSERT_TRUE( Open( Bayer( { 0, 7, Far } ) ) );
   EXPECT_EQ( Source.GetFrameCount(), Far + 1 );
   EXPECT_EQ( Source.GetMissingFrameCount(), INT32_MAX );
-  EXPECT_EQ( Source.FindFrameAtOrBefore( 6 ), std::optional< std::uint64_t >( 0 ) );
-  EXPECT_EQ( Source.FindFrameAtOrBefore( 1000000000 ), std::optional< std::uint64_t >( 7 ) );
-  EXPECT_EQ( Source.FindFrameAtOrAfter( 8 ), std::optional< std::uint64_t >( Far ) );
+  EXPECT_EQ( Source.FindFrameAtOrBefore( 6 ), Index( 0 ) );
+  EXPECT_EQ( Source.FindFrameAtOrBefore( 1000000000 ), Index( 7 ) );
+  EXPECT_EQ( Source.FindFrameAtOrAfter( 8 ), Index( Far ) );
   EXPECT_EQ( Source.FindFrameAtOrAfter( Far + 1 ), std::nullopt );
 }
 
-TEST( VideoSource, APayloadWithoutADecodedFormatGivesNoFrame )
+// The stored bytes once came back as the frame when the payload was one no decoder knows.
+TEST_F( VideoSource, APayloadWithoutADecodedFormatGivesNoFrame )
 {
-  const VTempRecording Recording( Bayer( { 0 } ) );
-  VVideoSource Source;
-  ASSERT_TRUE( Source.Open( Recording.Path, std::make_shared< VUnknownPayloadReader >() ) );
+  ASSERT_TRUE( Open( Bayer( { 0 } ), std::make_shared< VUnknownPayloadReader >() ) );
   LumekTest::VLogCapture Log( "", ZOL::LogFailure );
-  ZOL::IVideoFrame Frame;
   EXPECT_FALSE( Source.GetFrame( 0, Frame ) );
   EXPECT_FALSE( Frame.Video );
   ASSERT_FALSE( Log.Messages.empty() );
@@ -180,18 +176,14 @@ TEST( VideoSource, APayloadWithoutADecodedFormatGivesNoFrame )
 
 // Playback reads and drops frames dozens of times a second: after warm-up the path from file to
 // decoded frame must not go back to the heap.
-TEST( SteadyPlayback, NoFrameSizedAllocationAfterWarmUp )
+TEST_F( VideoSource, NoAllocationOnTheSteadyPath )
 {
   VRecordingSpec Spec = Bayer( FramesWithout( 40, {} ) );
   Spec.Width = 640;
   Spec.Height = 480;
   Spec.bAudio = true;
-  const VTempRecording Recording( Spec );
-  VVideoSource Source;
-  ASSERT_TRUE( Source.Open( Recording.Path ) );
-
+  ASSERT_TRUE( Open( Spec ) );
   // The window keeps one frame record and replaces its contents frame by frame.
-  ZOL::IVideoFrame Frame;
   for( int i = 0; i < 80; ++i )
     ASSERT_TRUE( Source.GetFrame( static_cast< std::uint64_t >( i % 40 ), Frame ) );
 
