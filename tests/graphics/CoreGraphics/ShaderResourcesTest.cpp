@@ -89,55 +89,51 @@ namespace
   };
 
   // The viewer's programs and the general-purpose stages in the pairs they are written for:
-  // every stage compiles, is in one pair, and each pair links once. A uniform each is driven
-  // through is found by name and by hash.
+  // every stage compiles, is in one pair, and each pair links once.
   TEST_F( ShaderResourcesTest, EveryStageCompilesAndEveryProgramLinks )
   {
     LumekTest::VLogCapture Log( "CoreGraphics" );
     VResources Resources( false, QDir::currentPath() );
     Resources.Load();
     EXPECT_FALSE( Log.Contains( "Failed" ) );
-    const struct
-    {
-      const char *Vertex, *Fragment, *Uniform;
-    } Programs[] = {
-        { "Video", "VideoRaw", "u_RadialDistortionParameters" },
-        { "Video", "VideoBayer", "u_FirstRed" },
-        { "Video", "VideoLuminance", "u_Inverted" },
-        { "Video", "VideoYUV", "u_Swizzle" },
-        { "Video", "UniformColour", "u_View2D" },
-        { "Video", "ImageSet", "u_ColourTint" },
-        { "Simple", "UniformColour", "u_colour" },
-        { "SimpleColour", "Colour", nullptr },
-        { "Simple3D", "UniformColour", "u_ViewProjection" },
-        { "Simple3DPointSize", "UniformColour", "u_PointSize" },
-        { "Simple3DUniformColour", "Colour", "u_Colour" },
-        { "Simple3DVertexColour", "Colour", "u_ViewProjection" },
-        { "Simple3DModel", "SimpleLighting", "u_Up" },
-        { "Simple3DModelColour", "SimpleLighting", "u_ModelColour" },
-        { "Simple3DModelWireframe", "Colour", "u_ModelTransform" },
-        { "ColoredLine", "StippledLine", "u_SourcePoint" },
-    };
+    // Vertex and fragment stage of each pair.
+    const char* const Programs[] = { "Video VideoRaw",
+                                     "Video VideoBayer",
+                                     "Video VideoLuminance",
+                                     "Video VideoYUV",
+                                     "Video UniformColour",
+                                     "Video ImageSet",
+                                     "Simple UniformColour",
+                                     "SimpleColour Colour",
+                                     "Simple3D UniformColour",
+                                     "Simple3DPointSize UniformColour",
+                                     "Simple3DUniformColour Colour",
+                                     "Simple3DVertexColour Colour",
+                                     "Simple3DModel SimpleLighting",
+                                     "Simple3DModelColour SimpleLighting",
+                                     "Simple3DModelWireframe Colour",
+                                     "ColoredLine StippledLine" };
     std::set< QString > Vertex, Fragment;
-    for( const auto& rCase : Programs )
+    for( const char* pProgram : Programs )
     {
-      SCOPED_TRACE( std::string( rCase.Vertex ) + "_" + rCase.Fragment );
-      Vertex.insert( rCase.Vertex );
-      Fragment.insert( rCase.Fragment );
-      std::shared_ptr< VShaderProgram > pProgram = Resources.GetProgram( rCase.Vertex, rCase.Fragment );
-      ASSERT_TRUE( pProgram && pProgram->IsLinked() );
-      EXPECT_EQ( Resources.GetProgram( rCase.Vertex, rCase.Fragment ), pProgram ) << "a pair is linked once";
-      for( const char* pName : { rCase.Uniform, "u_NotThere" } )
-      {
-        if( pName == nullptr )
-          continue;
-        const int Location = pProgram->UniformLocation( pName );
-        EXPECT_EQ( Location >= 0, pName == rCase.Uniform ) << pName;
-        EXPECT_EQ( pProgram->UniformLocationByHash( CoreGraphics::MurmurHash3_32( pName ) ), Location ) << pName;
-      }
+      const QStringList Stages = QString( pProgram ).split( ' ' );
+      Vertex.insert( Stages[0] );
+      Fragment.insert( Stages[1] );
+      std::shared_ptr< VShaderProgram > pLinked = Resources.GetProgram( Stages[0], Stages[1] );
+      EXPECT_TRUE( pLinked && pLinked->IsLinked() ) << pProgram;
+      EXPECT_EQ( Resources.GetProgram( Stages[0], Stages[1] ), pLinked ) << "a pair is linked once";
     }
     EXPECT_EQ( Resources.GetShaderNames( VShader::Kind_Vertex ), QStringList( Vertex.begin(), Vertex.end() ) );
     EXPECT_EQ( Resources.GetShaderNames( VShader::Kind_Fragment ), QStringList( Fragment.begin(), Fragment.end() ) );
+
+    // Uniforms are found by name and by the hash of the name.
+    const std::shared_ptr< VShaderProgram > pVideo = Resources.GetProgram( "Video", "VideoBayer" );
+    for( const char* pName : { "u_View2D", "u_FirstRed", "t_DiffuseTexture", "u_NotThere" } )
+      EXPECT_EQ( pVideo->UniformLocationByHash( CoreGraphics::MurmurHash3_32( pName ) ),
+                 pVideo->UniformLocation( pName ) )
+          << pName;
+    EXPECT_GE( pVideo->UniformLocation( "u_FirstRed" ), 0 );
+    EXPECT_EQ( pVideo->UniformLocation( "u_NotThere" ), -1 );
   }
 
   // Stage files of the user's own: a broken or missing one gives no program and a log line; an

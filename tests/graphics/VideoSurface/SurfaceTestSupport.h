@@ -9,7 +9,10 @@
 #include <gtest/gtest.h>
 
 #include <QImage>
+#include <QMarginsF>
 
+#include <algorithm>
+#include <cmath>
 #include <cstdint>
 #include <memory>
 #include <vector>
@@ -34,6 +37,18 @@ namespace SurfaceTest
     Calibration.RadialDistortionCentre_X = i_X;
     Calibration.RadialDistortionCentre_Y = i_Y;
     return Calibration;
+  }
+
+  // The sides of a rectangle within i_Tolerance of the expected ones.
+  inline ::testing::AssertionResult NearRect( const QRectF& i_rActual, const QRectF& i_rExpected, double i_Tolerance )
+  {
+    const QMarginsF D( i_rActual.left() - i_rExpected.left(), i_rActual.top() - i_rExpected.top(),
+                       i_rActual.right() - i_rExpected.right(), i_rActual.bottom() - i_rExpected.bottom() );
+    if( std::max( { std::abs( D.left() ), std::abs( D.top() ), std::abs( D.right() ), std::abs( D.bottom() ) } ) <=
+        i_Tolerance )
+      return ::testing::AssertionSuccess();
+    return ::testing::AssertionFailure() << "sides off by (" << D.left() << ", " << D.top() << ", " << D.right() << ", "
+                                         << D.bottom() << ")";
   }
 
   // A frame of random bytes; i_Fill, when not negative, sets every byte to it instead.
