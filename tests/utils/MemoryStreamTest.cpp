@@ -5,30 +5,9 @@
 #include <gtest/gtest.h>
 
 #include <limits>
-#include <tuple>
 
 using UtilsIO::VMemoryInputStream;
 using UtilsIO::VMemoryStream;
-
-// Bytes by hand: an integer of each sign and both widths of floating point, which take their own path.
-TEST( MemoryStream, LittleEndianValuesRoundTripAndHaveTheirByteLayout )
-{
-  VMemoryStream Stream;
-  ASSERT_TRUE( ZOL::WriteLE( Stream, std::uint16_t( 0x0102 ) ) && ZOL::WriteLE( Stream, std::int32_t( -2 ) ) &&
-               ZOL::WriteLE( Stream, 1.0f ) && ZOL::WriteLE( Stream, -2.0 ) );
-  const std::vector< std::uint8_t > Expected = { 0x02, 0x01, 0xFE, 0xFF, 0xFF, 0xFF, 0x00, 0x00, 0x80,
-                                                 0x3F, 0x00, 0x00, 0x00, 0x00, 0x00, 0x00, 0x00, 0xC0 };
-  EXPECT_EQ( Expected, Stream.GetData() );
-
-  VMemoryInputStream Input( Expected.data(), Expected.size() );
-  std::tuple< std::uint16_t, std::int32_t, float, double > Read;
-  ASSERT_TRUE( ZOL::ReadLE( Input, std::get< 0 >( Read ) ) && ZOL::ReadLE( Input, std::get< 1 >( Read ) ) &&
-               ZOL::ReadLE( Input, std::get< 2 >( Read ) ) && ZOL::ReadLE( Input, std::get< 3 >( Read ) ) );
-  EXPECT_EQ( std::make_tuple( std::uint16_t( 0x0102 ), -2, 1.0f, -2.0 ), Read );
-  EXPECT_FALSE( Input.IsAtEnd() );
-  EXPECT_FALSE( ZOL::ReadLE( Input, std::get< 0 >( Read ) ) );
-  EXPECT_TRUE( Input.IsAtEnd() );
-}
 
 TEST( MemoryStream, ReadAndWriteShareOnePosition )
 {
