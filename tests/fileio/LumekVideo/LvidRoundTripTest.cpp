@@ -74,7 +74,7 @@ namespace
       const std::uint64_t Alignment = Alignments[Row % std::size( Alignments )];
       SCOPED_TRACE( std::string( ZOL::ToString( rCase.Format ) ) + ", alignment " + std::to_string( Alignment ) );
       const ZOL::IVideoFrameInfo Video = MakeVideo( rCase.Format, 7, 3 );
-      const ZOL::IAudioFrameInfo Audio = MakeAudio( rCase.Audio, rCase.Channels );
+      const ZOL::IAudioFrameInfo Audio = ZOL::IAudioFrameInfo{ rCase.Audio, 48000, rCase.Channels };
       const bool bHasAudio = rCase.Channels > 0;
       const std::vector< VFrameContent > Frames = MakeFrames( rCase.FrameBytes, rCase.GroupBytes );
       // The writer takes frames of its own idea of the size only.
@@ -270,7 +270,7 @@ namespace
 
     LumekVideo::VReader Reader;
     EXPECT_FALSE( Reader.Open( Dir.File( "missing.lvid" ) ) );
-    EXPECT_FALSE( Reader.Open( Dir.Path() ) );
+    EXPECT_FALSE( Reader.Open( Dir.Path.string() ) );
     ASSERT_TRUE( Reader.Open( Path ) );
     EXPECT_EQ( Reader.GetFrameCount(), 1u );
   }

@@ -4,39 +4,11 @@
 #include "utils/MemoryStream.h"
 #include "videointerface/AttributeRecords.h"
 
-#include <boost/filesystem.hpp>
-
 #include <fstream>
 #include <iterator>
 
 namespace LumekVideoTest
 {
-  VByteWriter& VByteWriter::Int( std::uint64_t i_Value, int i_Bytes )
-  {
-    for( int i = 0; i < i_Bytes; ++i )
-      Bytes.push_back( static_cast< std::uint8_t >( i_Value >> ( 8 * i ) ) );
-    return *this;
-  }
-
-  VByteWriter& VByteWriter::Raw( const VBytes& i_rBytes )
-  {
-    Bytes.insert( Bytes.end(), i_rBytes.begin(), i_rBytes.end() );
-    return *this;
-  }
-
-  VByteWriter& VByteWriter::PadTo( std::uint64_t i_Alignment )
-  {
-    while( Bytes.size() % i_Alignment != 0 )
-      Bytes.push_back( 0 );
-    return *this;
-  }
-
-  void Patch( VBytes& io_rBytes, std::size_t i_Offset, std::uint64_t i_Value, int i_Bytes )
-  {
-    for( int i = 0; i < i_Bytes; ++i )
-      io_rBytes.at( i_Offset + i ) = static_cast< std::uint8_t >( i_Value >> ( 8 * i ) );
-  }
-
   VBytes PatternBytes( std::size_t i_Size, std::uint32_t i_Seed )
   {
     // A small xorshift: every byte position and every seed gives different content, so a frame
@@ -53,10 +25,10 @@ namespace LumekVideoTest
     return Bytes;
   }
 
-  VBytes SerialiseStore( const ZOL::IVideoAttributes& i_rStore )
+  // No bytes at all when the store cannot be written: every block built from them fails to read.
+  static VBytes SerialiseStore( const ZOL::IVideoAttributes& i_rStore )
   {
     UtilsIO::VMemoryStream Stream;
-    // No bytes at all when the store cannot be written: every block built from them fails to read.
     return i_rStore.WriteTo( Stream ) ? Stream.GetData() : VBytes();
   }
 
@@ -73,27 +45,48 @@ namespace LumekVideoTest
   VAssembled Assemble( const VRecordingPlan& i_rPlan, std::vector< std::pair< std::uint64_t, std::size_t > > i_Index )
   {
     VAssembled Result;
-    VByteWriter File;
-    File.Text( "###LumekVideoFile###" ).U32( 0xF355BDACu ).U32( 1 ).U32( 3 ).U64( i_rPlan.Alignment ).U64( 0 );
-    File.Raw( i_rPlan.DescriptionBlock ).Raw( i_rPlan.AttributeBlock ).PadTo( i_rPlan.Alignment );
+    VBytes& rFile = Result.Bytes;
+    const auto Put = [&]( std::uint64_t i_Value, int i_Bytes )
+    {
+      rFile.resize( rFile.size() + i_Bytes );
+      Patch( rFile, rFile.size() - i_Bytes, i_Value, i_Bytes );
+    };
+    const auto Raw = [&]( const VBytes& i_rBytes ) { rFile.insert( rFile.end(), i_rBytes.begin(), i_rBytes.end() ); };
+    const auto Pad = [&]
+    { rFile.resize( ( rFile.size() + i_rPlan.Alignment - 1 ) / i_rPlan.Alignment * i_rPlan.Alignment ); };
+    const std::string Magic = "###LumekVideoFile###";
+    rFile.assign( Magic.begin(), Magic.end() );
+    Put( 0xF355BDACu, 4 );
+    Put( 1, 4 );
+    Put( 3, 4 );
+    Put( i_rPlan.Alignment, 8 );
+    Put( 0, 8 ); // the index offset, known at the end
+    Raw( i_rPlan.DescriptionBlock );
+    Raw( i_rPlan.AttributeBlock );
+    Pad();
     for( const VRecord& rRecord : i_rPlan.Records )
     {
-      Result.RecordOffsets.push_back( File.Size() );
-      File.Raw( rRecord.Video ).PadTo( i_rPlan.Alignment );
+      Result.RecordOffsets.push_back( rFile.size() );
+      Raw( rRecord.Video );
+      Pad();
       if( rRecord.Audio )
-        File.U32( static_cast< std::uint32_t >( rRecord.Audio->size() ) )
-            .Raw( *rRecord.Audio )
-            .PadTo( i_rPlan.Alignment );
+      {
+        Put( rRecord.Audio->size(), 4 );
+        Raw( *rRecord.Audio );
+        Pad();
+      }
     }
-    Result.IndexOffset = File.Size();
+    Result.IndexOffset = rFile.size();
     if( i_Index.empty() )
       for( std::size_t i = 0; i < i_rPlan.Records.size(); ++i )
         i_Index.emplace_back( i_rPlan.Records[i].FrameNumber, i );
-    File.U64( i_Index.size() );
+    Put( i_Index.size(), 8 );
     for( const auto& [Frame, Record] : i_Index )
-      File.U64( Frame ).U64( Result.RecordOffsets.at( Record ) );
-    PatchU64( File.Bytes, 40, Result.IndexOffset );
-    Result.Bytes = std::move( File.Bytes );
+    {
+      Put( Frame, 8 );
+      Put( Result.RecordOffsets.at( Record ), 8 );
+    }
+    Patch( rFile, 40, Result.IndexOffset );
     return Result;
   }
 
@@ -105,15 +98,6 @@ namespace LumekVideoTest
     Info.PixelFormat = i_Format;
     Info.PixelAspectRatio = 1.0;
     Info.InterlacedFormat = ZOL::InterlacedFormat_NotInterlaced;
-    return Info;
-  }
-
-  ZOL::IAudioFrameInfo MakeAudio( ZOL::EAudioSampleFormat i_Format, int i_Channels, int i_Rate )
-  {
-    ZOL::IAudioFrameInfo Info;
-    Info.SampleFormat = i_Format;
-    Info.SampleRate = i_Rate;
-    Info.Channels = i_Channels;
     return Info;
   }
 
@@ -176,25 +160,6 @@ namespace LumekVideoTest
     for( const auto& rpBlock : Audio )
       Result.Audio.push_back( BytesOf( *rpBlock ) );
     return Result;
-  }
-
-  VTempDir::VTempDir()
-  {
-    const boost::filesystem::path Dir =
-        boost::filesystem::temp_directory_path() / boost::filesystem::unique_path( "lvid-test-%%%%-%%%%-%%%%" );
-    boost::filesystem::create_directories( Dir );
-    m_Path = Dir.string();
-  }
-
-  VTempDir::~VTempDir()
-  {
-    boost::system::error_code Error;
-    boost::filesystem::remove_all( m_Path, Error );
-  }
-
-  std::string VTempDir::File( const std::string& i_rName ) const
-  {
-    return ( boost::filesystem::path( m_Path ) / i_rName ).string();
   }
 
   bool WriteFile( const std::string& i_rPath, const VBytes& i_rBytes )

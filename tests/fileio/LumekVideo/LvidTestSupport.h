@@ -7,8 +7,9 @@
 #include "videointerface/IVideoAttributes.h"
 #include "videointerface/IVideoFrameInfo.h"
 
+#include <boost/filesystem.hpp>
+
 #include <cstdint>
-#include <memory>
 #include <optional>
 #include <string>
 #include <vector>
@@ -17,37 +18,16 @@ namespace LumekVideoTest
 {
   using VBytes = std::vector< std::uint8_t >;
 
-  // Little-endian assembly with its own encoding.
-  class VByteWriter
-  {
-  public:
-    VByteWriter& Int( std::uint64_t i_Value, int i_Bytes );
-    VByteWriter& U32( std::uint32_t i_Value ) { return Int( i_Value, 4 ); }
-    VByteWriter& U64( std::uint64_t i_Value ) { return Int( i_Value, 8 ); }
-    VByteWriter& Raw( const VBytes& i_rBytes );
-    VByteWriter& Text( const std::string& i_rText ) { return Raw( VBytes( i_rText.begin(), i_rText.end() ) ); }
-    VByteWriter& PadTo( std::uint64_t i_Alignment );
-
-    std::size_t Size() const { return Bytes.size(); }
-    VBytes Bytes;
-  };
-
   // Overwrites a little-endian number of i_Bytes bytes.
-  void Patch( VBytes& io_rBytes, std::size_t i_Offset, std::uint64_t i_Value, int i_Bytes );
-  inline void PatchU32( VBytes& io_rBytes, std::size_t i_Offset, std::uint32_t i_Value )
+  inline void Patch( VBytes& io_rBytes, std::size_t i_Offset, std::uint64_t i_Value, int i_Bytes = 8 )
   {
-    Patch( io_rBytes, i_Offset, i_Value, 4 );
-  }
-  inline void PatchU64( VBytes& io_rBytes, std::size_t i_Offset, std::uint64_t i_Value )
-  {
-    Patch( io_rBytes, i_Offset, i_Value, 8 );
+    for( int i = 0; i < i_Bytes; ++i )
+      io_rBytes.at( i_Offset + i ) = static_cast< std::uint8_t >( i_Value >> ( 8 * i ) );
   }
 
   // Deterministic bytes that differ from frame to frame and from seed to seed.
   VBytes PatternBytes( std::size_t i_Size, std::uint32_t i_Seed );
 
-  // The serial form of a store, as its own WriteTo gives it.
-  VBytes SerialiseStore( const ZOL::IVideoAttributes& i_rStore );
   // The frame description block of a recording with this video and audio, less one key if named.
   VBytes DescriptionBlock( const ZOL::IVideoFrameInfo& i_rVideo, const ZOL::IAudioFrameInfo& i_rAudio,
                            const std::string& i_rWithoutKey = "" );
@@ -82,14 +62,13 @@ namespace LumekVideoTest
 
   // A frame description for tests: a size and a format, all else at the usual values.
   ZOL::IVideoFrameInfo MakeVideo( ZOL::EPixelFormat i_Format, int i_Width, int i_Height );
-  ZOL::IAudioFrameInfo MakeAudio( ZOL::EAudioSampleFormat i_Format, int i_Channels, int i_Rate = 48000 );
   // File attributes with timing, settings and a key of the recording's own.
   ZOL::IVideoAttributes MakeFileAttributes();
 
   // Frames 0, 1 and 2 of 5 x 3 Luminance8 with 16-bit stereo sound, aligned to 16: small enough
   // to cut and damage at every byte.
   inline const ZOL::IVideoFrameInfo s_SmallVideo = MakeVideo( ZOL::PixelFormat_Luminance8, 5, 3 );
-  inline const ZOL::IAudioFrameInfo s_Stereo16 = MakeAudio( ZOL::AudioSampleFormat_Int16, 2 );
+  inline const ZOL::IAudioFrameInfo s_Stereo16 = { ZOL::AudioSampleFormat_Int16, 48000, 2 };
   VRecordingPlan SmallPlan();
 
   struct VFrameContent
@@ -126,17 +105,15 @@ namespace LumekVideoTest
   std::optional< VFrameBytes > ReadBytes( LumekVideo::VReader& io_rReader, std::uint64_t i_Frame, bool i_bVideo = true,
                                           bool i_bAudio = true );
 
-  // A folder of its own under the test temp folder, removed with everything in it.
-  class VTempDir
+  // A folder of its own under the temp folder, removed with everything in it.
+  struct VTempDir
   {
-  public:
-    VTempDir();
-    ~VTempDir();
-    std::string File( const std::string& i_rName ) const;
-    const std::string& Path() const { return m_Path; }
-
-  private:
-    std::string m_Path;
+    VTempDir() { boost::filesystem::create_directories( Path ); }
+    ~VTempDir() { boost::filesystem::remove_all( Path, Error ); }
+    std::string File( const std::string& i_rName ) const { return ( Path / i_rName ).string(); }
+    const boost::filesystem::path Path =
+        boost::filesystem::temp_directory_path() / boost::filesystem::unique_path( "lvid-test-%%%%-%%%%-%%%%" );
+    boost::system::error_code Error;
   };
 
   bool WriteFile( const std::string& i_rPath, const VBytes& i_rBytes );

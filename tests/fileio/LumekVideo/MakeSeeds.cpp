@@ -49,7 +49,7 @@ int main( int argc, char** argv )
       // A packed format whose size is not a whole number of pixels, with 24-bit audio.
       { "packed.lvid",
         MakeVideo( ZOL::PixelFormat_BayerGB7, 3, 3 ),
-        MakeAudio( ZOL::AudioSampleFormat_Int24, 1 ),
+        ZOL::IAudioFrameInfo{ ZOL::AudioSampleFormat_Int24, 48000, 1 },
         4,
         { 2, 0 },
         6 },
