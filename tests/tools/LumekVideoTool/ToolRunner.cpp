@@ -10,8 +10,6 @@
 
 #include <gtest/gtest.h>
 
-#include <sys/wait.h>
-
 #include <fstream>
 #include <sstream>
 
@@ -25,14 +23,10 @@ namespace LumekVideoToolTest
     std::string Command = LumekTest::ShellQuote( LUMEK_TOOL_PATH );
     for( const std::string& rArgument : i_rArguments )
       Command += " " + LumekTest::ShellQuote( rArgument );
-    Command += " >" + LumekTest::ShellQuote( Streams.Path( "out" ) ) + " 2>" +
-               LumekTest::ShellQuote( Streams.Path( "err" ) ) + " </dev/null";
-    // The shell reports a child killed by a signal as 128 + the signal.
-    const int Status = std::system( Command.c_str() );
     VRun Run;
-    Run.ExitCode = WIFEXITED( Status ) && WEXITSTATUS( Status ) <= 128 ? WEXITSTATUS( Status ) : -1;
-    const VBytes Out = ReadFileBytes( Streams.Path( "out" ) ), Err = ReadFileBytes( Streams.Path( "err" ) );
-    Run.Out.assign( Out.begin(), Out.end() );
+    Run.Out = LumekTest::RunCommand( Command + " 2>" + LumekTest::ShellQuote( Streams.Path( "err" ) ) + " </dev/null",
+                                     &Run.ExitCode );
+    const VBytes Err = ReadFileBytes( Streams.Path( "err" ) );
     Run.Err.assign( Err.begin(), Err.end() );
     return Run;
   }

@@ -19,12 +19,12 @@ namespace LumekVideoToolTest
 
   struct VRun
   {
-    int ExitCode = -1; // -1 for a program killed by a signal
+    int ExitCode = -1; // the shell gives 128 + the signal for a program killed by one
     std::string Out;
     std::string Err;
   };
 
-  // Runs the real lumekvideotool program with the arguments.
+  // Runs the real lumekvideotool program with the arguments, its standard output a pipe.
   VRun RunTool( const std::vector< std::string >& i_rArguments );
   // Runs the command in this process, with the log kept off standard error.
   VRun RunInProcess( const std::vector< std::string >& i_rArguments );
