@@ -65,20 +65,15 @@ namespace MovTest
       w.U32( 0x10000 ).Zeros( 12 ).U32( 0x10000 ).Zeros( 12 ).U32( 0x40000000 );
     }
 
-    VAtomWriter& Tkhd( VAtomWriter& w, std::uint32_t i_Id, std::uint32_t i_Duration, std::uint32_t i_Volume,
-                       std::uint32_t i_Width, std::uint32_t i_Height )
-    {
-      w.BeginFull( "tkhd", 15 ).Zeros( 8 ).U32( i_Id ).U32( 0 ).U32( i_Duration ).Zeros( 12 ).U16( i_Volume ).U16( 0 );
-      Matrix( w );
-      return w.U32( i_Width << 16 ).U32( i_Height << 16 ).End();
-    }
-
     // A track's tkhd, elst, and its mdia up to the hdlr, left open.
     void BeginTrack( VAtomWriter& w, std::uint32_t i_Id, std::uint32_t i_MovieDuration, std::uint32_t i_Volume,
                      std::uint32_t i_Width, std::uint32_t i_Height, std::uint32_t i_Scale, std::uint32_t i_Duration,
                      const char* i_pHandler, bool i_bEmptyMdiaFirst = false )
     {
-      Tkhd( w.Begin( "trak" ), i_Id, i_MovieDuration, i_Volume, i_Width, i_Height );
+      w.Begin( "trak" ).BeginFull( "tkhd", 15 ).Zeros( 8 ).U32( i_Id ).U32( 0 ).U32( i_MovieDuration ).Zeros( 12 );
+      w.U16( i_Volume ).U16( 0 );
+      Matrix( w );
+      w.U32( i_Width << 16 ).U32( i_Height << 16 ).End();
       w.Begin( "edts" ).BeginFull( "elst" ).U32( 1 ).U32( i_MovieDuration ).U32( 0 ).U32( 0x10000 ).End().End();
       // The reader must step back out of an mdia without minf and take the next.
       if( i_bEmptyMdiaFirst )
@@ -89,13 +84,9 @@ namespace MovTest
 
     // stts, stsc, stsz and stco of equal samples in chunks of i_PerChunk, then the track closed.
     void SampleTables( VAtomWriter& w, std::uint32_t i_Count, std::uint32_t i_Duration, std::uint32_t i_Size,
-                       std::uint32_t i_PerChunk, const std::vector< std::uint64_t >& i_rOffsets, bool i_b64 = false,
-                       bool i_bLastLonger = false )
+                       std::uint32_t i_PerChunk, const std::vector< std::uint64_t >& i_rOffsets, bool i_b64 = false )
     {
-      if( i_bLastLonger )
-        w.BeginFull( "stts" ).U32( 2 ).U32( i_Count - 1 ).U32( i_Duration ).U32( 1 ).U32( i_Duration * 2 ).End();
-      else
-        w.BeginFull( "stts" ).U32( 1 ).U32( i_Count ).U32( i_Duration ).End();
+      w.BeginFull( "stts" ).U32( 1 ).U32( i_Count ).U32( i_Duration ).End();
       w.BeginFull( "stsc" ).U32( 1 ).U32( 1 ).U32( i_PerChunk ).U32( 1 ).End();
       w.BeginFull( "stsz" ).U32( i_Size ).U32( i_Count ).End();
       w.BeginFull( i_b64 ? "co64" : "stco" ).U32( static_cast< std::uint32_t >( i_rOffsets.size() ) );
@@ -109,21 +100,15 @@ namespace MovTest
   {
     VAtomWriter w;
     w.Begin( "ftyp" ).Text( "qt  " ).U32( 0x200 ).Text( "qt  " ).End();
-
     const std::uint64_t Bytes = FrameBytes( s );
-    const std::uint32_t Duration = s.Frames * s.SampleDuration;
+    const std::uint32_t Duration = s.Frames * SampleDuration;
     const auto InScale = [&]( std::uint32_t i_Scale )
-    { return static_cast< std::uint32_t >( std::uint64_t( Duration ) * i_Scale / s.Timescale ); };
-    const std::uint32_t MovieDuration = InScale( 600 );
+    { return static_cast< std::uint32_t >( std::uint64_t( Duration ) * i_Scale / Timescale ); };
     const std::uint32_t AudioSamples = InScale( s.AudioRate );
-    const std::uint32_t TimecodeDuration = InScale( s.TimecodeScale );
 
     // The media data: frames, then the audio chunk, then the timecode sample.
     const std::size_t MdatStart = w.Size();
-    if( s.bLargeMdatFirst )
-      w.U32( 1 ).Text( "mdat" ).U64( 0 );
-    else
-      w.U32( 0 ).Text( "mdat" );
+    s.bLargeMdatFirst ? w.U32( 1 ).Text( "mdat" ).U64( 0 ) : w.U32( 0 ).Text( "mdat" );
     const std::uint64_t VideoStart = w.Size();
     for( std::uint32_t f = 0; f < s.Frames; ++f )
       for( std::uint64_t b = 0; b < Bytes; ++b )
@@ -134,53 +119,43 @@ namespace MovTest
     const std::uint64_t TimecodeStart = w.Size();
     if( s.TimecodeFrame >= 0 )
       w.U32( static_cast< std::uint32_t >( s.TimecodeFrame ) );
-    if( s.bLargeMdatFirst )
-      w.PatchU32( MdatStart + 12, static_cast< std::uint32_t >( w.Size() - MdatStart ) );
-    else if( !s.bMdatSizeZero )
-      w.PatchU32( MdatStart, static_cast< std::uint32_t >( w.Size() - MdatStart ) );
+    w.PatchU32( MdatStart + ( s.bLargeMdatFirst ? 12 : 0 ), static_cast< std::uint32_t >( w.Size() - MdatStart ) );
 
-    w.Begin( "moov" ).BeginFull( "mvhd" ).Zeros( 8 ).U32( 600 ).U32( MovieDuration );
-    w.U32( 0x10000 ).U16( 0x100 ).Zeros( 10 );
+    w.Begin( "moov" ).BeginFull( "mvhd" ).Zeros( 8 ).U32( 600 ).U32( Duration ).U32( 0x10000 ).U16( 0x100 ).Zeros( 10 );
     Matrix( w );
     w.Zeros( 24 ).U32( 4 ).End();
-    if( s.bTrakWithoutMdia )
-      Tkhd( w.Begin( "trak" ), 9, MovieDuration, 0, 0, 0 ).End();
     if( !s.bNoVideo )
     {
-      BeginTrack( w, 1, MovieDuration, 0, s.Width, s.Height, s.Timescale, Duration, "vide", s.bTwoMdiaFirstEmpty );
+      BeginTrack( w, 1, Duration, 0, s.Width, s.Height, Timescale, Duration, "vide", s.bTwoMdiaFirstEmpty );
       // The sample description, with its extensions.
       w.Begin( "minf" ).BeginFull( "vmhd", 1 ).Zeros( 8 ).End().Begin( "stbl" ).BeginFull( "stsd" ).U32( 1 );
       w.Begin( "2vuy" ).Zeros( 6 ).U16( 1 ).U32( 0 ).Text( "lumk" ).U32( 0 ).U32( 512 ).U16( s.Width );
       w.U16( s.Height ).U32( 72 << 16 ).U32( 72 << 16 ).U32( 0 ).U16( 1 ).Zeros( 32 ).U16( 24 ).U16( 0xFFFF );
       w.Begin( "pasp" ).U32( 1 ).U32( 1 ).End().Begin( "colr" ).Text( "nclc" ).U16( 1 ).U16( 1 ).U16( 1 ).End();
       w.End().End(); // 2vuy, stsd
-      if( s.bBrokenCo64WithGoodStco )
-        w.BeginFull( "co64", 0x01000000 ).U32( 1 ).U64( 0 ).End();
       const std::uint32_t PerChunk = s.SamplesPerChunk ? s.SamplesPerChunk : s.Frames;
       std::vector< std::uint64_t > Offsets;
       for( std::uint32_t f = 0; f < s.Frames; f += PerChunk )
         Offsets.push_back( VideoStart + f * Bytes );
-      SampleTables( w, s.Frames, s.SampleDuration, static_cast< std::uint32_t >( Bytes ), PerChunk, Offsets,
-                    s.bCo64Only, s.bTwoSttsEntries );
+      SampleTables( w, s.Frames, SampleDuration, std::uint32_t( Bytes ), PerChunk, Offsets, s.bCo64Only );
     }
     if( s.AudioRate != 0 )
     {
-      BeginTrack( w, 2, MovieDuration, 0x100, 0, 0, s.AudioRate, AudioSamples, "soun" );
+      BeginTrack( w, 2, Duration, 0x100, 0, 0, s.AudioRate, AudioSamples, "soun" );
       w.Begin( "minf" ).Begin( "smhd" ).Zeros( 8 ).End().Begin( "stbl" ).BeginFull( "stsd" ).U32( 1 ).Begin( "sowt" );
       w.Zeros( 6 ).U16( 1 ).Zeros( 8 ).U16( 2 ).U16( 16 ).U32( 0 ).U32( s.AudioRate << 16 ).End().End();
       SampleTables( w, AudioSamples, 1, 4, AudioSamples, { AudioStart } );
     }
     if( s.TimecodeFrame >= 0 )
     {
-      BeginTrack( w, 3, MovieDuration, 0, 0, 0, s.TimecodeScale, TimecodeDuration, "tmcd" );
+      const std::uint32_t TimecodeDuration = InScale( s.TimecodeScale );
+      BeginTrack( w, 3, Duration, 0, 0, 0, s.TimecodeScale, TimecodeDuration, "tmcd" );
       w.Begin( "minf" ).Begin( "gmhd" ).Begin( "tmcd" ).BeginFull( "tcmi" ).U32( 0 ).U16( 12 );
       w.Zeros( 15 ).End().End().End();
       w.Begin( "stbl" ).BeginFull( "stsd" ).U32( 1 ).Begin( "tmcd" ).Zeros( 6 ).U16( 1 ).Zeros( 8 );
       w.U32( s.TimecodeScale ).U32( 1 ).U8( 25 ).Zeros( 3 ).End().End();
       SampleTables( w, 1, TimecodeDuration, 4, 1, { TimecodeStart } );
     }
-    if( s.bMoovEndsWithZeroWord )
-      w.U32( 0 );
     w.End();
     if( !s.Qmdt.empty() )
     {
@@ -190,12 +165,10 @@ namespace MovTest
     return w.Zeros( s.StrayBytes ).Data();
   }
 
-  void PatchMoov( VBytes& io_rFile, const std::string& i_rType, std::size_t i_Offset, std::uint32_t i_Value )
+  void Patch( VBytes& io_rFile, const std::string& i_rType, std::size_t i_Offset, std::uint32_t i_Value )
   {
-    const std::string Moov = "moov";
-    const auto Start = std::search( io_rFile.begin(), io_rFile.end(), Moov.begin(), Moov.end() );
-    const auto Found = std::search( Start, io_rFile.end(), i_rType.begin(), i_rType.end() );
-    if( Start == io_rFile.end() || Found == io_rFile.end() )
+    const auto Found = std::search( io_rFile.begin(), io_rFile.end(), i_rType.begin(), i_rType.end() );
+    if( Found == io_rFile.end() )
       throw std::logic_error( "no " + i_rType + " atom" );
     for( std::size_t i = 0; i < 4; ++i )
       *( Found - 4 + static_cast< std::ptrdiff_t >( i_Offset + i ) ) =

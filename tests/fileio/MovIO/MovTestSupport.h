@@ -17,7 +17,6 @@ namespace MovTest
   public:
     VAtomWriter& U8( std::uint32_t i_Value );
     VAtomWriter& U16( std::uint32_t i_Value ) { return U8( i_Value >> 8 ).U8( i_Value ); }
-    VAtomWriter& U24( std::uint32_t i_Value ) { return U8( i_Value >> 16 ).U16( i_Value ); }
     VAtomWriter& U32( std::uint32_t i_Value ) { return U16( i_Value >> 16 ).U16( i_Value ); }
     VAtomWriter& U64( std::uint64_t i_Value ) { return U32( std::uint32_t( i_Value >> 32 ) ).U32( i_Value ); }
     VAtomWriter& Text( const std::string& i_rFourCC );
@@ -28,7 +27,6 @@ namespace MovTest
     VAtomWriter& End();
     // Overwrites a 32-bit value already written.
     void PatchU32( std::size_t i_Offset, std::uint32_t i_Value );
-
     std::size_t Size() const { return m_Data.size(); }
     VBytes& Data() { return m_Data; }
 
@@ -37,14 +35,12 @@ namespace MovTest
     std::vector< std::size_t > m_Open;
   };
 
-  // What the small MOV writer puts in a file. The defaults make a valid 2vuy file.
+  // What the small MOV writer puts in a file: 2vuy frames of 24 ticks of 600 a second.
   struct VMovSpec
   {
     std::uint32_t Width = 16;
     std::uint32_t Height = 8;
     std::uint32_t Frames = 6;
-    std::uint32_t Timescale = 600;
-    std::uint32_t SampleDuration = 24;
     std::uint32_t BytesPerPixelTimes2 = 4;
     // 16-bit stereo sowt at this rate; 0 for no audio.
     std::uint32_t AudioRate = 0;
@@ -54,25 +50,20 @@ namespace MovTest
     // The frame store and attribute store, serialised, for a QMDT atom; empty for none.
     VBytes Qmdt;
     std::uint32_t SamplesPerChunk = 0; // 0: all frames in one chunk
-
-    // Deliberate faults and variants.
-    bool bTwoSttsEntries = false;
-    bool bBrokenCo64WithGoodStco = false;
+    // Variants of the layout.
     bool bCo64Only = false;
     bool bTwoMdiaFirstEmpty = false;
     bool bLargeMdatFirst = false;
-    bool bMdatSizeZero = false;
-    std::uint32_t StrayBytes = 0;
-    bool bMoovEndsWithZeroWord = false;
     bool bNoVideo = false;
-    bool bTrakWithoutMdia = false;
+    std::uint32_t StrayBytes = 0;
   };
+  constexpr std::uint32_t Timescale = 600;
+  constexpr std::uint32_t SampleDuration = 24;
 
   // The byte i of frame f, as the writer fills frames.
   std::uint8_t PixelByte( std::uint32_t i_Frame, std::uint64_t i_Byte );
   std::uint64_t FrameBytes( const VMovSpec& i_rSpec );
   VBytes WriteMov( const VMovSpec& i_rSpec );
-  // Overwrites a 32-bit field of the first atom of that type in the movie header, i_Offset bytes
-  // from the atom's start.
-  void PatchMoov( VBytes& io_rFile, const std::string& i_rType, std::size_t i_Offset, std::uint32_t i_Value );
+  // Overwrites a 32-bit field of the first atom of that type, i_Offset bytes from its start.
+  void Patch( VBytes& io_rFile, const std::string& i_rType, std::size_t i_Offset, std::uint32_t i_Value );
 } // namespace MovTest
