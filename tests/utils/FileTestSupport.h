@@ -48,11 +48,6 @@ namespace LumekTest
     std::ofstream( i_rPath, std::ios::binary | std::ios::trunc ) << i_rText;
   }
 
-  inline void WriteBytes( const std::string& i_rPath, const std::vector< std::uint8_t >& i_rBytes )
-  {
-    WriteText( i_rPath, std::string( i_rBytes.begin(), i_rBytes.end() ) );
-  }
-
   inline std::string ReadText( const std::string& i_rPath )
   {
     std::ifstream File( i_rPath, std::ios::binary );

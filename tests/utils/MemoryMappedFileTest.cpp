@@ -25,7 +25,7 @@ namespace
     void MakeFile( std::uint64_t i_Size )
     {
       m_Bytes = LumekTest::PatternBytes( i_Size );
-      LumekTest::WriteBytes( m_Path, m_Bytes );
+      LumekTest::WriteText( m_Path, std::string( m_Bytes.begin(), m_Bytes.end() ) );
     }
     std::vector< std::uint8_t > Slice( std::uint64_t i_Offset, std::uint64_t i_Size ) const
     {

@@ -314,8 +314,6 @@ TEST( LensDistortion, ModelsWithoutParametersReadWithoutThemAndAnUnknownModelFai
     bool bWrites, bReads;
     VLensDistortionCalibration Expected;
   } Cases[] = {
-      { "three parameters", Lens( RadialModel_Lumek3Parameter, { 1, 2, 3 }, -1, 0 ), true, true,
-        Lens( RadialModel_Lumek3Parameter, { 1, 2, 3 }, -1, 0 ) },
       { "fewer parameters than the model takes", Lens( RadialModel_Lumek3Parameter, { 1, 2 } ), false, false, {} },
       { "zero parameters: the write fails but reads", Lens( RadialModel_Lumek0Parameter, { 4, 5 }, 1, 2 ), false, true,
         Lens( RadialModel_Lumek0Parameter, {}, 1, 2 ) },

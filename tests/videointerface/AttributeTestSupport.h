@@ -17,17 +17,6 @@ namespace LumekTest
     return Stream.GetData();
   }
 
-  // Writes, serialises, reads the bytes back: what a store goes through between a writer and a
-  // reader in two different programs.
-  inline ZOL::IVideoAttributes ThroughBytes( const ZOL::IVideoAttributes& i_rStore )
-  {
-    const std::vector< std::uint8_t > Bytes = Serialise( i_rStore );
-    UtilsIO::VMemoryInputStream Input( Bytes.data(), Bytes.size() );
-    ZOL::IVideoAttributes Read;
-    EXPECT_TRUE( Read.ReadFrom( Input ) );
-    return Read;
-  }
-
   inline ZOL::IVideoFrameInfo Frame( std::int32_t i_Width, std::int32_t i_Height, ZOL::EPixelFormat i_Format )
   {
     return { 0, 0, 1, 1, i_Width, i_Height, i_Format, 0, 1.0, ZOL::InterlacedFormat_Unspecified };

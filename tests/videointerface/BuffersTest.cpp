@@ -127,50 +127,35 @@ TEST( Recycler, ManyThreadsNeverShareAnObject )
 // ---------------------------------------------------------------------------------------------
 // Allocators over the recycler.
 
-TEST( BufferAllocator, ARecycledBufferKeepsItsCapacityAndOldBytes )
+// N is 1, so the buffer released is the next one acquired on this thread: it keeps its capacity
+// and its old bytes. Buffers hold their allocator, so it outlives the reader that made it, and one
+// not owned by a shared pointer cannot hand any out.
+TEST( BufferAllocator, ARecycledBufferKeepsItsCapacityAndBuffersKeepTheirAllocatorAlive )
 {
-  // N is 1, so the buffer released is the next one acquired on this thread.
   using VAllocator = IStandardBufferAllocator< UtilsMemory::VThreadSafeRecycler< IStandardBuffer, 1 > >;
   auto pAllocator = std::make_shared< VAllocator >();
+  const std::weak_ptr< VAllocator > pWeak = pAllocator;
   std::shared_ptr< IBuffer > pBuffer;
   pAllocator->Allocate( pBuffer, 100 );
   for( int i = 0; i < 100; ++i )
     pBuffer->GetData()[i] = static_cast< std::uint8_t >( i + 1 );
   const IBuffer* pFirst = pBuffer.get();
   pBuffer.reset();
-
   pAllocator->Allocate( pBuffer, 10 );
   ASSERT_EQ( pFirst, pBuffer.get() );
   const std::uint8_t* pData = pBuffer->GetData();
   pBuffer.reset();
-
   pAllocator->Allocate( pBuffer, 100 );
   ASSERT_EQ( pFirst, pBuffer.get() );
   EXPECT_EQ( pData, pBuffer->GetData() ) << "no reallocation for a size it has held";
   for( int i = 0; i < 100; ++i )
     EXPECT_EQ( i < 10 ? i + 1 : 0, pBuffer->GetData()[i] ) << i;
-}
 
-TEST( BufferAllocator, BuffersKeepTheirAllocatorAlive )
-{
-  std::weak_ptr< VFrameBufferAllocator > pWeak;
-  std::vector< std::shared_ptr< IBuffer > > Frames( 6 );
-  {
-    auto pAllocator = std::make_shared< VFrameBufferAllocator >();
-    pWeak = pAllocator;
-    for( auto& rpFrame : Frames )
-      pAllocator->Allocate( rpFrame, 64 );
-  } // the reader that made the allocator is gone
+  pAllocator.reset();
   EXPECT_FALSE( pWeak.expired() );
-  // Released on another thread, as the drawing side would.
-  OnOtherThread( [&] { Frames.resize( 1 ); } );
-  EXPECT_FALSE( pWeak.expired() );
-  Frames.clear();
+  OnOtherThread( [&] { pBuffer.reset(); } ); // released on the drawing side
   EXPECT_TRUE( pWeak.expired() );
-
-  // Buffers hold their allocator, so one not owned by a shared pointer cannot hand any out.
   VReaderBufferAllocator Unowned;
-  std::shared_ptr< IBuffer > pBuffer;
   EXPECT_THROW( Unowned.Allocate( pBuffer, 8 ), std::bad_weak_ptr );
 }
 

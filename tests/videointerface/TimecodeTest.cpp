@@ -15,19 +15,13 @@ namespace
              0,          i_Remainder,         i_SubFramePeriod };
   }
 
-  const char* const s_Standards[] = { "Film24", "Film23_98", "Pal25", "True30", "Ntsc29_97", "DropFrame29_97" };
-
-  std::uint32_t FramesPerSecond( std::uint32_t i_Standard )
-  {
-    static const std::uint32_t s_Counted[] = { 24, 24, 25, 30, 30, 30 };
-    return s_Counted[i_Standard];
-  }
+  const std::uint32_t s_FramesPerSecond[] = { 24, 24, 25, 30, 30, 30 }; // by standard, as labels count
 
   // A second, independent way to count labels: step one frame at a time, as a timecode
   // generator does, skipping labels 0 and 1 at each minute but every tenth under drop frame.
   void Step( ITimecode& io_rLabel )
   {
-    if( ++io_rLabel.Frames < FramesPerSecond( io_rLabel.Standards ) )
+    if( ++io_rLabel.Frames < s_FramesPerSecond[io_rLabel.Standards] )
       return;
     io_rLabel.Frames = 0;
     if( ++io_rLabel.Seconds < 60 )
@@ -78,7 +72,7 @@ TEST( TimecodeStandards, TicksToLabelMatchesFrameByFrameCounting )
 {
   for( std::uint32_t Standard = 0; Standard < 6; ++Standard )
   {
-    SCOPED_TRACE( s_Standards[Standard] );
+    SCOPED_TRACE( "standard " + std::to_string( Standard ) );
     // Covers a whole day and a little more, where the day wraps and Days counts up. Every frame is
     // compared over the first eleven minutes (a whole drop-frame cycle) and around the wrap; in
     // between, the frames either side of each second's carry, where a label goes wrong first.
@@ -86,7 +80,7 @@ TEST( TimecodeStandards, TicksToLabelMatchesFrameByFrameCounting )
     const std::uint64_t Period = Counted.GetTicksPerFrame();
     const std::uint64_t FramesPerDay = Counted.GetTicksPerDay() / Period;
     const std::uint64_t Dense = 11 * 60 * 30;
-    const std::uint32_t LastLabel = FramesPerSecond( Standard ) - 1;
+    const std::uint32_t LastLabel = s_FramesPerSecond[Standard] - 1;
     for( std::uint64_t Frame = 0; Frame < FramesPerDay + 40000; Step( Counted ), ++Frame )
     {
       if( Frame >= Dense && Frame + Dense < FramesPerDay && Counted.Frames > 2 && Counted.Frames != LastLabel )
