@@ -1,5 +1,5 @@
-// Which pairs of formats convert, what bad sizes do, and the conversions that are defined as
-// compositions of others.
+// Which pairs of formats convert, what bad sizes do, the conversions that are defined as
+// compositions of others, and 4:2:0 planes packed to 4:2:2.
 
 #include "ConversionTestSupport.h"
 #include "tests/support/LogCapture.h"
@@ -12,46 +12,9 @@ namespace
 {
   using namespace CoreVideoUtilsTest;
   using namespace ZOL;
+  using CoreVideoUtils::PlanarYUV420ToInterleaved;
 
-  bool IsBayer( EPixelFormat F )
-  {
-    return ( F >= 2 && F <= 5 ) || F == 14 || F == 15;
-  }
-
-  // The pairs that answer true, from the rules: Bayer sources demosaic to 1, 7 to 12, 18 and
-  // 19 and unpack or pack only between BayerGB8 and its packed forms; planar YUV goes only to
-  // 9, 10 and 13; every other source reaches every non-Bayer target.
-  bool IsConvertible( EPixelFormat S, EPixelFormat T )
-  {
-    if( S == T )
-      return true;
-    if( IsBayer( S ) )
-    {
-      if( IsBayer( T ) )
-        return ( T == 3 && ( S == 14 || S == 15 ) ) || ( S == 3 && ( T == 14 || T == 15 ) );
-      return T == 1 || ( T >= 7 && T <= 12 ) || T == 18 || T == 19;
-    }
-    if( S == PixelFormat_PlanarY8U8V8 )
-      return T == 9 || T == 10 || T == 13;
-    return !IsBayer( T );
-  }
-
-  // Every source to every target, so that the converter and the rules cannot disagree on any pair.
-  TEST( Conversion, ConvertsExactlyTheDefinedPairs )
-  {
-    const int W = 50, H = 3; // more than one 10-bit group a row, and rows that do not end on a byte
-    for( int Source = 1; Source < 20; ++Source )
-      for( int Target = 1; Target < 20; ++Target )
-      {
-        const EPixelFormat S = static_cast< EPixelFormat >( Source ), T = static_cast< EPixelFormat >( Target );
-        Bytes Converted;
-        EXPECT_EQ(
-            Convert( RandomBytes( CoreVideoUtils::FrameSizeInBytes( W, H, S ), S * 100 + T ), W, H, S, T, Converted ),
-            IsConvertible( S, T ) )
-            << ToString( S ) << " to " << ToString( T );
-      }
-  }
-
+  // Pairs with no conversion, and calls whose sizes or pointers don't hold a frame.
   TEST( Conversion, MalformedCallsFailWithoutTouchingTheTarget )
   {
     const struct
@@ -72,6 +35,18 @@ namespace
         { "UnknownTarget", 4, 4, PixelFormat_R8G8B8, static_cast< EPixelFormat >( 77 ), 0, 64 },
         { "HugeFrameSmallBuffers", INT_MAX, INT_MAX, PixelFormat_BayerGB8, PixelFormat_R8G8B8, -1, -1 },
         { "HugeWidthOneRow", INT_MAX, 1, PixelFormat_U8Y8V8Y8, PixelFormat_R8G8B8, -( 1ll << 31 ), 0 },
+        // Bayer sources demosaic to Luminance8, the 8-bit RGB family and the planar forms, and
+        // unpack or pack only between BayerGB8 and its packed forms; planar YUV goes only to the
+        // four-byte RGB formats and the 10-bit one; nothing else becomes Bayer.
+        { "BayerToR5G6B5", 8, 2, PixelFormat_BayerRG8, PixelFormat_R5G6B5, 0, 0 },
+        { "BayerToYUV10", 8, 2, PixelFormat_BayerGB7, PixelFormat_U10Y10V10Y10, 0, 0 },
+        { "BayerToOtherPhase", 8, 2, PixelFormat_BayerRG8, PixelFormat_BayerGB7, 0, 0 },
+        { "PackedToPacked", 8, 2, PixelFormat_BayerGB7, PixelFormat_BayerGB6, 0, 0 },
+        { "BayerToBayer", 8, 2, PixelFormat_BayerGB8, PixelFormat_BayerRG8, 0, 0 },
+        { "PlanarYUVToR8G8B8", 8, 2, PixelFormat_PlanarY8U8V8, PixelFormat_R8G8B8, 0, 0 },
+        { "PlanarYUVToLuminance", 8, 2, PixelFormat_PlanarY8U8V8, PixelFormat_Luminance8, 0, 0 },
+        { "RGBToBayer", 8, 2, PixelFormat_R8G8B8, PixelFormat_BayerGB8, 0, 0 },
+        { "PackedLuminanceToPackedBayer", 8, 2, PixelFormat_Luminance7, PixelFormat_BayerGB7, 0, 0 },
     };
     CoreVideoUtils::VPixelFormatConverter Converter;
     for( const auto& rCall : Calls )
@@ -156,5 +131,49 @@ namespace
                                             CoreLumekTypes::VLensDistortionCalibration() );
     EXPECT_EQ( Log.Lines(),
                std::vector< std::string >( 2, "3 Lens distortion correction not supported in software converter." ) );
+  }
+
+  // Odd sizes fail with their log line, other formats silently; the output stays untouched.
+  TEST( PlanarYUV420ToInterleaved, OddSizesAndOtherFormatsFail )
+  {
+    LumekTest::VLogCapture Log( "CoreVideoUtils" );
+    const Bytes Y( 12, 1 ), U( 3, 2 ), V( 3, 3 );
+    Bytes Output( 32, 0xCD );
+    EXPECT_FALSE(
+        PlanarYUV420ToInterleaved( Y.data(), U.data(), V.data(), Output.data(), PixelFormat_U8Y8V8Y8, 3, 2, 6, 3 ) );
+    EXPECT_FALSE(
+        PlanarYUV420ToInterleaved( Y.data(), U.data(), V.data(), Output.data(), PixelFormat_Y8U8Y8V8, 4, 1, 6, 3 ) );
+    EXPECT_EQ( Log.Lines(),
+               ( std::vector< std::string >{
+                   "2 Cannot convert image with dimensions 3 x 2. Both width and height must be even numbers.",
+                   "2 Cannot convert image with dimensions 4 x 1. Both width and height must be even numbers." } ) );
+    for( EPixelFormat F : { PixelFormat_R8G8B8, PixelFormat_PlanarY8U8V8, PixelFormat_U10Y10V10Y10 } )
+      EXPECT_FALSE( PlanarYUV420ToInterleaved( Y.data(), U.data(), V.data(), Output.data(), F, 4, 2, 6, 3 ) );
+    EXPECT_EQ( Log.Lines().size(), 2u );
+    EXPECT_EQ( Output, Bytes( 32, 0xCD ) );
+  }
+
+  // Wide rows go 32 pixels at a time with a tail: every byte must still be where the pair rule
+  // puts it, in both layouts, with padded strides.
+  TEST( PlanarYUV420ToInterleaved, WideRowsFollowThePairRule )
+  {
+    const std::int32_t Width = 102, Height = 4, StrideY = 110, StrideUV = 60;
+    const Bytes Y = RandomBytes( StrideY * Height, 1 ), U = RandomBytes( StrideUV * Height / 2, 2 ),
+                V = RandomBytes( StrideUV * Height / 2, 3 );
+    for( const EPixelFormat F : { PixelFormat_U8Y8V8Y8, PixelFormat_Y8U8Y8V8 } )
+    {
+      Bytes Output( Width * Height * 2 );
+      ASSERT_TRUE( PlanarYUV420ToInterleaved( Y.data(), U.data(), V.data(), Output.data(), F, Width, Height, StrideY,
+                                              StrideUV ) );
+      const bool bLumaFirst = F == PixelFormat_Y8U8Y8V8;
+      for( std::int32_t y = 0; y < Height; ++y )
+        for( std::int32_t x = 0; x < Width; ++x )
+        {
+          const std::uint8_t* p = Output.data() + ( y * Width + x ) * 2;
+          ASSERT_EQ( p[bLumaFirst ? 0 : 1], Y[y * StrideY + x] ) << "x " << x << " y " << y;
+          ASSERT_EQ( p[bLumaFirst ? 1 : 0], ( x % 2 == 0 ? U : V )[( y / 2 ) * StrideUV + x / 2] )
+              << "x " << x << " y " << y;
+        }
+    }
   }
 } // namespace

@@ -19,7 +19,7 @@ namespace
   // The bounding box of the outline's pixels, from the first to the last. The outline's colour is
   // (0.78, 0.6, 0.06): wherever the line covers a pixel only partly, mixed with the grey picture
   // or the black around it, red stays over green over blue.
-  QRectF OutlineBox( const QImage& i_rPicture, int i_Margin = 0 )
+  QRectF OutlineBox( const QImage& i_rPicture )
   {
     QRect Box;
     for( int y = 0; y < i_rPicture.height(); ++y )
@@ -29,8 +29,7 @@ namespace
         if( qRed( C ) > qGreen( C ) + 8 && qGreen( C ) > qBlue( C ) + 20 )
           Box |= QRect( x, y, 1, 1 );
       }
-    return QRectF( QPointF( Box.left() - i_Margin, Box.top() - i_Margin ),
-                   QPointF( Box.right() - i_Margin, Box.bottom() - i_Margin ) );
+    return QRectF( Box.topLeft(), Box.bottomRight() );
   }
 
   TEST_F( GeometryDisplayTest, InvertedFramesFlipTheLookupOnly )
@@ -42,43 +41,9 @@ namespace
     EXPECT_TRUE( Shows( QImage( Frame.Video->GetData(), 36, 20, 36, QImage::Format_Grayscale8 ).mirrored(), 0 ) );
   }
 
-  // A 20 by 10 image at (30, 5) on a 64 by 48 sensor: it is drawn at its place and nothing of
-  // it reaches the rest of the sensor. A lens with no parameters moves nothing.
-  TEST_F( GeometryDisplayTest, ImageSmallerThanTheSensorKeepsToItsPlace )
-  {
-    const ZOL::IVideoFrame Frame = RandomFrame( ZOL::PixelFormat_Luminance8, 20, 10 );
-    ZOL::IVideoFrameInfo Geometry = Frame.VideoFrameInfo;
-    Geometry.TwiceOffsetX = 60;
-    Geometry.TwiceOffsetY = 10;
-    VGLWidget& rWidget = MakeWidget( 64 + 2 * Margin, 48 + 2 * Margin );
-    rWidget.SetScaleMode( LumekVideoViewer::ScaleOneToOne );
-    rWidget.SetLensDistortionCalibration( Camera( 64, 48 ), Lens( { 0.0, 0.0 }, 32, 24 ) );
-    rWidget.SetLensDistortionCorrectionEnabled( true );
-    rWidget.PrepareFrame( 0, Geometry, Frame, false );
-    // The view in 1:1 stays centred on the sensor.
-    rWidget.SetScaleMode( LumekVideoViewer::ScaleOneToOne );
-
-    const QImage Picture = Grab();
-    EXPECT_TRUE( SamePicture( Picture, ProcessorPicture( Frame ), QPoint( Margin + 30, Margin + 5 ), 0 ) );
-    // The black sensor around it, apart from the outline's rows and columns.
-    int Stray = 0;
-    for( int y = 0; y < 48; ++y )
-      for( int x = 0; x < 64; ++x )
-      {
-        const bool bNearImage = x >= 28 && x <= 51 && y >= 3 && y <= 16;
-        Stray += !bNearImage && qGray( Picture.pixel( Margin + x, Margin + y ) ) != 0 ? 1 : 0;
-      }
-    EXPECT_EQ( Stray, 0 );
-
-    // With correction on, the outline is the distorted bounds, which even without distortion
-    // reach a pixel further up and to the left.
-    EXPECT_TRUE( NearRect( OutlineBox( Picture, Margin ),
-                           LumekVideoViewer::DistortedBounds( QRectF( 30, 5, 20, 10 ), QVector2D( 32, 24 ), {} ),
-                           1.0 ) );
-  }
-
-  // Barrel distortion moves the picture's corners out, and the outline becomes the distorted
-  // bounds; with correction off both stay where the image is.
+  // A white 48 by 32 image at (24, 32) on a 96 by 96 sensor, shown at 1:1. Straight, it keeps to
+  // its place with its outline around it. Barrel distortion moves the picture's corners out, and
+  // the outline becomes the distorted bounds.
   TEST_F( GeometryDisplayTest, LensCalibrationBendsThePictureAndTheOutline )
   {
     const int W = 48, H = 32, Size = 96;
@@ -91,10 +56,18 @@ namespace
     rWidget.SetScaleMode( LumekVideoViewer::ScaleOneToOne );
     rWidget.SetLensDistortionCalibration( Camera( Size, Size ), Lens( { K1, 0.0 }, 48, 48 ) );
     rWidget.PrepareFrame( 0, Geometry, Frame, false );
-    const QRectF Straight = OutlineBox( Grab() );
+    const QImage Picture = Grab();
+    EXPECT_TRUE( SamePicture( Picture, ProcessorPicture( Frame ), QPoint( 24, 32 ), 0 ) );
+    int Stray = 0; // the black sensor, apart from the outline's rows and columns
+    for( int y = 0; y < Size; ++y )
+      for( int x = 0; x < Size; ++x )
+        Stray += !QRect( 22, 30, W + 4, H + 4 ).contains( x, y ) && qGray( Picture.pixel( x, y ) ) != 0 ? 1 : 0;
+    EXPECT_EQ( Stray, 0 );
+    const QRectF Straight = OutlineBox( Picture );
     EXPECT_TRUE( NearRect( Straight, QRectF( 24, 32, W, H ), 1.0 ) );
 
     rWidget.SetLensDistortionCorrectionEnabled( true );
+    // The view in 1:1 stays centred on the sensor.
     rWidget.SetScaleMode( LumekVideoViewer::ScaleOneToOne );
     const QImage Bent = Grab();
     const QVector3D Parameters( float( K1 ), 0, 0 );
@@ -110,6 +83,16 @@ namespace
     EXPECT_GT( qGray( Bent.pixel( int( Corner.x() ) + 2, int( Corner.y() ) + 2 ) ), 200 );
     EXPECT_GT( qGray( Bent.pixel( 21, 34 ) ), 200 ) << "outside the straight image, inside the bent one";
     EXPECT_EQ( qGray( Bent.pixel( 48, 29 ) ), 0 ) << "above the middle of the top edge";
+
+    // A lens with no parameters moves nothing, though the outline, as distorted bounds, reaches a
+    // pixel further up and to the left.
+    rWidget.SetLensDistortionCalibration( Camera( Size, Size ), Lens( { 0.0, 0.0 }, 48, 48 ) );
+    rWidget.PrepareFrame( 1, Geometry, Frame, false );
+    const QImage Unbent = Grab();
+    EXPECT_TRUE( SamePicture( Unbent, ProcessorPicture( Frame ), QPoint( 24, 32 ), 0 ) );
+    EXPECT_TRUE( NearRect( OutlineBox( Unbent ),
+                           LumekVideoViewer::DistortedBounds( QRectF( 24, 32, W, H ), QVector2D( 48, 48 ), {} ),
+                           1.0 ) );
 
     // A distortion centre of exactly (0, 0) switches the shader's distortion off, whatever the
     // parameters say.
