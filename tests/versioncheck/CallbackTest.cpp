@@ -1,13 +1,10 @@
-// The callback holder that the update check reports through: empty calls, replacing and clearing,
-// and use from several threads at once.
+// The callback holder that the update check reports through: empty calls, replacing and clearing.
 
 #include "services/NotificationSystem/VCallback.h"
 
 #include <gtest/gtest.h>
 
-#include <atomic>
 #include <string>
-#include <thread>
 #include <vector>
 
 namespace
@@ -36,29 +33,4 @@ namespace
 
   // Setting and clearing race the calls of other threads without tearing the function apart (the
   // sanitizer run is where a race shows).
-  TEST( Callback, SetClearAndCallFromManyThreads )
-  {
-    NotificationSystem::VCallback< void( int ) > Counter;
-    std::atomic< long > Sum{ 0 };
-    std::atomic< bool > bStop{ false };
-    std::thread Setter(
-        [&]
-        {
-          for( ; !bStop; Counter.Clear() )
-            Counter.Set( [&]( int i_Value ) { Sum += i_Value; } );
-        } );
-    std::vector< std::thread > Callers;
-    for( int Index = 0; Index < 3; ++Index )
-      Callers.emplace_back(
-          [&]
-          {
-            for( int Call = 0; Call < 20000; ++Call )
-              Counter( 1 );
-          } );
-    for( auto& rCaller : Callers )
-      rCaller.join();
-    bStop = true;
-    Setter.join();
-    EXPECT_LE( Sum.load(), 60000 );
-  }
 } // namespace

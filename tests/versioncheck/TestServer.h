@@ -1,12 +1,11 @@
 #pragma once
 
 #include <QByteArray>
-#include <QString>
 #include <QStringList>
 #include <QTcpServer>
 #include <QTcpSocket>
 
-#include <memory>
+#include <string>
 
 // A version server for the tests: plain HTTP on 127.0.0.1 at a port of its own choice, one reply
 // per connection.
@@ -30,23 +29,15 @@ public:
                         while( QTcpSocket* pSocket = m_Server.nextPendingConnection() )
                         {
                           QObject::connect( pSocket, &QTcpSocket::disconnected, pSocket, &QObject::deleteLater );
-                          // Everything up to the blank line that ends the request's header; nothing
-                          // is read after it.
-                          auto pHeader = std::make_shared< QByteArray >();
-                          QObject::connect( pSocket, &QTcpSocket::readyRead, pSocket,
-                                            [this, pSocket, pHeader]
-                                            {
-                                              if( pHeader->endsWith( "\r\n\r\n" ) )
-                                                return;
-                                              pHeader->append( pSocket->readAll() );
-                                              if( pHeader->contains( "\r\n\r\n" ) )
-                                                Answer( *pSocket, pHeader->left( pHeader->indexOf( "\r\n\r\n" ) + 4 ) );
-                                            } );
+                          QObject::connect( pSocket, &QTcpSocket::readyRead, pSocket, [=] { Answer( *pSocket ); } );
                         }
                       } );
   }
 
-  void SetReply( int i_Status, const QByteArray& i_rBody ) { m_Status = i_Status, m_Body = i_rBody; }
+  void Serve( const std::string& i_rBody, int i_Status = 200 )
+  {
+    m_Status = i_Status, m_Body = QByteArray::fromStdString( i_rBody );
+  }
   void SetMode( EMode i_Mode ) { m_Mode = i_Mode; }
 
   // "http://127.0.0.1:<port>/"
@@ -55,17 +46,16 @@ public:
   const QStringList& Requests() const { return m_Requests; }
 
   // The address of a port on 127.0.0.1 where nothing listens.
-  static std::string ClosedUrl()
-  {
-    QTcpServer Probe;
-    Probe.listen( QHostAddress::LocalHost, 0 );
-    return QStringLiteral( "http://127.0.0.1:%1/" ).arg( Probe.serverPort() ).toStdString();
-  }
+  static std::string ClosedUrl() { return VTestServer().Url().toStdString(); }
 
 private:
-  void Answer( QTcpSocket& io_rSocket, const QByteArray& i_rHeader )
+  void Answer( QTcpSocket& io_rSocket )
   {
-    m_Requests << QString::fromLatin1( i_rHeader.left( i_rHeader.indexOf( "\r\n" ) ).split( ' ' ).value( 1 ) );
+    // Nothing before the blank line that ends the request's header; a GET sends nothing after it.
+    if( !io_rSocket.peek( 1 << 16 ).contains( "\r\n\r\n" ) )
+      return;
+    const QByteArray Request = io_rSocket.readAll();
+    m_Requests << QString::fromLatin1( Request.left( Request.indexOf( "\r\n" ) ).split( ' ' ).value( 1 ) );
     if( m_Mode == EMode::Silent )
       return;
     const bool bLarge = m_Mode == EMode::Flood || m_Mode == EMode::Stream;

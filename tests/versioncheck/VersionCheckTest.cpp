@@ -18,20 +18,19 @@
 #include <QDesktopServices>
 #include <QEventLoop>
 #include <QLabel>
+#include <QNetworkProxy>
 #include <QPushButton>
 #include <QSettings>
 #include <QStyle>
+#include <QTemporaryDir>
 #include <QTextBrowser>
 #include <QTimer>
 #include <QUrl>
 
 #include <algorithm>
 #include <functional>
-#include <memory>
-#include <optional>
-#include <string>
 #include <thread>
-#include <vector>
+#include <tuple>
 
 namespace
 {
@@ -51,16 +50,13 @@ namespace
     return i_Done();
   }
 
-  bool Idle( const VVersionCheck& i_rCheck )
+  bool Idle( const QObject& i_rCheck )
   {
     return i_rCheck.findChildren< VVersionCheckListener* >().isEmpty();
   }
 
-  struct IOutcome
-  {
-    int Status;
-    std::string Body, MessageType, Error;
-  };
+  // What a check reports at its end: status, message type, error text and the body.
+  using IOutcome = std::tuple< int, std::string, std::string, std::string >;
 
   // The application's settings over the test's store, with each check's outcome kept aside.
   struct VRecordingSettings : public VVersionCheckSettings
@@ -69,36 +65,26 @@ namespace
     void Report( int i_Status, const std::string& i_rBody, const std::string& i_rType,
                  const std::string& i_rError ) override
     {
-      Outcomes.push_back( { i_Status, i_rBody, i_rType, i_rError } );
-      VVersionCheckSettings::Report( i_Status, i_rBody, i_rType, i_rError );
+      Outcomes.emplace_back( i_Status, i_rType, i_rError, i_rBody );
     }
 
     std::vector< IOutcome > Outcomes;
   };
 
-  // A dialog as the user sees it; the icon is the style's own message box icon at the size the
-  // style gives them: "information" or "critical".
-  struct IShownDialog
+  // A dialog as the user sees it: "<icon>[+box]: <text>", the icon being the one of the style's
+  // message box icons it shows at the size the style gives them, "+box" the box to tick.
+  std::string Describe( const VVersionCheckMessageBox& i_rBox )
   {
-    QString Title, Text;
-    bool bCheckBox;
+    EXPECT_EQ( i_rBox.windowTitle(), "Checking LumekVideoViewer Version" );
     std::string Icon;
-  };
-
-  IShownDialog Describe( const VVersionCheckMessageBox& i_rBox )
-  {
-    IShownDialog Shown{ i_rBox.windowTitle(), i_rBox.GetTextBrowser()->toPlainText(), i_rBox.GetCheckBox() != nullptr,
-                        "" };
     const int Size = i_rBox.style()->pixelMetric( QStyle::PM_MessageBoxIconSize );
-    for( const auto& [Icon, pName] : { std::pair( QStyle::SP_MessageBoxInformation, "information" ),
+    for( const auto& [Kind, pName] : { std::pair( QStyle::SP_MessageBoxInformation, "information" ),
                                        std::pair( QStyle::SP_MessageBoxCritical, "critical" ) } )
-    {
-      const QImage Wanted = i_rBox.style()->standardIcon( Icon ).pixmap( Size, Size ).toImage();
       for( const QLabel* pLabel : i_rBox.findChildren< QLabel* >() )
-        if( pLabel->pixmap( Qt::ReturnByValue ).toImage() == Wanted )
-          Shown.Icon += pName;
-    }
-    return Shown;
+        if( pLabel->pixmap( Qt::ReturnByValue ).toImage() ==
+            i_rBox.style()->standardIcon( Kind ).pixmap( Size, Size ).toImage() )
+          Icon += pName;
+    return Icon + ( i_rBox.GetCheckBox() ? "+box: " : ": " ) + i_rBox.GetTextBrowser()->toPlainText().toStdString();
   }
 
   // A reply page as the server sends it: a message to show, the record in a comment.
@@ -132,11 +118,6 @@ namespace
     }
     ~VCheckHarness() { Store.clear(); }
 
-    void Serve( const std::string& i_rBody, int i_Status = 200 )
-    {
-      Server.SetReply( i_Status, QByteArray::fromStdString( i_rBody ) );
-    }
-
     bool Send( bool i_bStartupCheck, unsigned i_TimeoutSeconds = 10 )
     {
       return Check.Check( "LumekVideoViewer", "1.10.0.137509h", "Debian+GNU/Linux+12+64Bit", i_bStartupCheck, pSettings,
@@ -156,8 +137,7 @@ namespace
     VTestServer Server;
     VVersionCheck Check{ nullptr, "" };
     bool bTickBox = false;
-    std::vector< IShownDialog > Shown;
-    std::vector< std::string > Versions;
+    std::vector< std::string > Shown, Versions;
     std::vector< std::vector< std::string > > Whitelists;
     std::vector< bool > Completions;
   };
@@ -167,7 +147,6 @@ namespace
   };
 
   const std::string Optional = Page( "1.0", "OPTIONAL", "A" );
-  const std::string Required = Page( "1.0", "REQUIRED", "A" );
   const std::string None = Page( "1.0", "NONE", "A" );
 
   // One exchange with the server and everything that should follow from it.
@@ -182,155 +161,130 @@ namespace
       std::string Body;
       int HttpStatus; // 0: nothing listens
       bool bStartupCheck;
-      std::optional< std::string > StoredId;
-      std::optional< bool > StoredShowOnStartup;
+      bool bDeclined; // the store holds this message's id and the user's "do not show again"
       // Expected:
-      std::string Dialog; // "", "plain", "box" (with the box to tick) or "error"
+      std::string Dialog; // empty: none
       int Status;
       std::string MessageType; // empty: no outcome and no completion
       std::string Error;       // checked when not empty
       std::vector< std::string > Versions;
       std::vector< std::vector< std::string > > Whitelists;
     } Cases[] = {
-        // Each row: name, reply body, HTTP status, at start, stored id and show-at-start; then the
-        // dialog shown, the reported status, message type and error, the versions and whitelists
-        // announced. What a user's earlier choice does is DoNotShowAgainHoldsUntilTheIdChanges.
         // clang-format off
-        { "OptionalNewAtStart", Optional, 200, true, {}, {}, "box", 0, "OPTIONAL", "", Newest, {} },
-        { "NoneAtStart", None, 200, true, {}, {}, "", 0, "NONE", "", Newest, {} },
-        { "NoneOnRequest", None, 200, false, "A", true, "plain", 0, "NONE", "", Newest, {} },
+        { "OptionalNewAtStart", Optional, 200, true, false, "information+box: Message A", 0, "OPTIONAL", "",
+          Newest, {} },
+        { "NoneAtStart", None, 200, true, false, "", 0, "NONE", "", Newest, {} },
+        { "NoneOnRequest", None, 200, false, false, "information: Message A", 0, "NONE", "", Newest, {} },
         // A "2.0" reply is answered by silence.
-        { "Format2AtStart", Page( "2.0", "REQUIRED", "A" ), 200, true, {}, {}, "", 0, "", "", {}, {} },
-        { "Format3NewAtStart", Whitelisted, 200, true, {}, {}, "", 0, "NONE", "", Newest, Listed },
-        { "Format3DeclinedAtStart", Whitelisted, 200, true, "A", false, "", 0, "NONE", "", {}, {} },
-        { "Format3WithoutWhitelistDeclinedOnRequest", Page( "3.0", "NONE", "A" ), 200, false, "A", false,
-          "", 0, "NONE", "", Newest, { {} } },
-        { "UnknownFormatOnRequest", Page( "4.0", "REQUIRED", "A" ), 200, false, {}, {},
-          "", 0, "REQUIRED", "", {}, {} },
-        { "NoCommentAtStart", "<html><body>Down for maintenance</body></html>", 200, true, {}, {},
-          "", 0, "NONE", "Error parsing JSON data: expected value on line 1", {}, {} },
+        { "Format2AtStart", Page( "2.0", "REQUIRED", "A" ), 200, true, false, "", 0, "", "", {}, {} },
+        { "Format3NewAtStart", Whitelisted, 200, true, false, "", 0, "NONE", "", Newest, Listed },
+        { "Format3DeclinedAtStart", Whitelisted, 200, true, true, "", 0, "NONE", "", {}, {} },
+        { "Format3WithoutWhitelistDeclinedOnRequest", Page( "3.0", "NONE", "A" ), 200, false, true, "", 0, "NONE", "",
+          Newest, { {} } },
+        { "UnknownFormatOnRequest", Page( "4.0", "REQUIRED", "A" ), 200, false, false, "", 0, "REQUIRED", "", {}, {} },
+        { "NoCommentAtStart", "<html><body>Down for maintenance</body></html>", 200, true, false, "", 0, "NONE",
+          "Error parsing JSON data: expected value on line 1", {}, {} },
         // Nothing at start depends on the server: only a user who asked hears that it failed.
-        { "NotFoundAtStart", Required, 404, true, {}, {}, "", 203, "NONE", "", {}, {} },
-        { "RefusedOnRequest", "", 0, false, {}, {}, "error", 1, "NONE", "", {}, {} },
+        { "NotFoundAtStart", Page( "1.0", "REQUIRED", "A" ), 404, true, false, "", 203, "NONE", "", {}, {} },
+        { "RefusedOnRequest", "", 0, false, false, "critical: Unable to contact version check server.\n"
+          "Please check your network connection and try again.\nhttps://support.lumek.example/LumekVideoViewer/",
+          1, "NONE", "", {}, {} },
         // clang-format on
     };
     for( const auto& rCase : Cases )
     {
       SCOPED_TRACE( rCase.Name );
       VCheckHarness H;
-      if( rCase.StoredId )
-        H.pSettings->SetMessageId( *rCase.StoredId );
-      if( rCase.StoredShowOnStartup )
-        H.pSettings->SetShowOnStartup( *rCase.StoredShowOnStartup );
-      if( rCase.HttpStatus == 0 )
-        H.Check.SetServer( VTestServer::ClosedUrl() );
-      H.Serve( rCase.Body, rCase.HttpStatus );
+      if( rCase.bDeclined )
+      {
+        H.pSettings->SetMessageId( "A" );
+        H.pSettings->SetShowOnStartup( false );
+      }
+      H.Check.SetServer( rCase.HttpStatus == 0 ? VTestServer::ClosedUrl() : H.Server.Url().toStdString() );
+      H.Server.Serve( rCase.Body, rCase.HttpStatus );
       ASSERT_TRUE( H.RunCheck( rCase.bStartupCheck ) );
 
-      ASSERT_EQ( H.Shown.size(), rCase.Dialog.empty() ? 0u : 1u );
-      for( const auto& rShown : H.Shown )
-      {
-        EXPECT_EQ( rShown.Title, "Checking LumekVideoViewer Version" );
-        EXPECT_EQ( rShown.bCheckBox, rCase.Dialog == "box" );
-        EXPECT_EQ( rShown.Icon, rCase.Dialog == "error" ? "critical" : "information" );
-        if( rCase.Dialog == "error" )
-          EXPECT_TRUE( rShown.Text.startsWith( "Unable to contact version check server.\n"
-                                               "Please check your network connection and try again.\n" ) )
-              << rShown.Text.toStdString();
-        else
-          EXPECT_EQ( rShown.Text, "Message A" );
-      }
+      EXPECT_EQ( H.Shown, rCase.Dialog.empty() ? std::vector< std::string >{} : std::vector{ rCase.Dialog } );
       EXPECT_EQ( H.Versions, rCase.Versions );
       EXPECT_EQ( H.Whitelists, rCase.Whitelists );
-
       const bool bOutcome = !rCase.MessageType.empty();
-      EXPECT_EQ( H.Completions, bOutcome ? std::vector< bool >{ rCase.bStartupCheck } : std::vector< bool >{} );
+      EXPECT_EQ( H.Completions, bOutcome ? std::vector{ rCase.bStartupCheck } : std::vector< bool >{} );
       ASSERT_EQ( H.pSettings->Outcomes.size(), bOutcome ? 1u : 0u );
       if( !bOutcome )
         continue;
-      const IOutcome& rOutcome = H.pSettings->Outcomes[0];
-      EXPECT_EQ( rOutcome.Status, rCase.Status ) << rOutcome.Error;
-      EXPECT_EQ( rOutcome.MessageType, rCase.MessageType );
-      EXPECT_EQ( rOutcome.Body, rCase.Body );
-      if( !rCase.Error.empty() )
-      {
-        EXPECT_EQ( rOutcome.Error, rCase.Error );
-      }
+      IOutcome Outcome = H.pSettings->Outcomes[0];
+      if( rCase.Error.empty() )
+        std::get< 2 >( Outcome ) = "";
+      EXPECT_EQ( Outcome, IOutcome( rCase.Status, rCase.MessageType, rCase.Error, rCase.Body ) );
     }
   }
 
   TEST_F( VersionCheckTest, DoNotShowAgainHoldsUntilTheIdChanges )
   {
-    Serve( Optional );
+    EXPECT_TRUE( pSettings->GetShowOnStartup() ) << "nothing declined yet";
+    Server.Serve( Optional );
     bTickBox = true;
     RunCheck( true );
-    ASSERT_EQ( Shown.size(), 1u );
-    EXPECT_TRUE( Shown.back().bCheckBox );
     EXPECT_FALSE( pSettings->GetShowOnStartup() );
 
-    // Two checks at once, each with its own answer; a check returns before its answer comes.
+    // Two checks at once, each with its own answer; a check returns before its answer comes. The
+    // declined message stays away at start; a user's check shows it anyway, without the box.
     ASSERT_TRUE( Send( true ) );
     EXPECT_EQ( pSettings->Outcomes.size(), 1u );
     RunCheck( false );
-    ASSERT_EQ( Shown.size(), 2u ) << "the declined message stays away at start; a user's check shows it anyway";
-    EXPECT_FALSE( Shown.back().bCheckBox );
-    EXPECT_FALSE( pSettings->GetShowOnStartup() );
     EXPECT_EQ( pSettings->Outcomes.size(), 3u );
     std::sort( Completions.begin(), Completions.end() );
-    EXPECT_EQ( Completions, ( std::vector< bool >{ false, true, true } ) );
+    EXPECT_EQ( Completions, ( std::vector{ false, true, true } ) );
+    EXPECT_FALSE( pSettings->GetShowOnStartup() );
 
-    Serve( Page( "1.0", "OPTIONAL", "B" ) );
+    // A new message clears the choice; not declined, it comes back at the next start.
+    Server.Serve( Page( "1.0", "OPTIONAL", "B" ) );
     bTickBox = false;
     RunCheck( true );
-    ASSERT_EQ( Shown.size(), 3u ) << "a new message clears the choice";
-    EXPECT_EQ( Shown.back().Text, "Message B" );
     EXPECT_TRUE( pSettings->GetShowOnStartup() );
     EXPECT_EQ( Store.value( "LumekVideoViewer.MessageId" ).toString(), "B" );
-
-    // Not declined, it comes back at the next start; now declined, and then required.
     bTickBox = true;
     RunCheck( true );
-    ASSERT_EQ( Shown.size(), 4u );
-    EXPECT_TRUE( Shown.back().bCheckBox );
     EXPECT_FALSE( pSettings->GetShowOnStartup() );
-    EXPECT_EQ( Server.Requests().size(), 5 );
 
-    // A required message offers no box to tick and comes back at every start.
-    Serve( Page( "1.0", "REQUIRED", "B" ) );
+    // A required message, declined or not, offers no box to tick and comes back at every start.
+    Server.Serve( Page( "1.0", "REQUIRED", "B" ) );
     for( int Start = 0; Start < 2; ++Start )
       RunCheck( true );
-    ASSERT_EQ( Shown.size(), 6u );
-    EXPECT_FALSE( Shown[4].bCheckBox || Shown[5].bCheckBox );
+    EXPECT_EQ( Shown, ( std::vector< std::string >{ "information+box: Message A", "information: Message A",
+                                                    "information+box: Message B", "information+box: Message B",
+                                                    "information: Message B", "information: Message B" } ) );
+    EXPECT_EQ( Server.Requests().size(), 7 );
+
+    // A forced setting shows at start whatever the store says; without a store nothing is kept.
+    EXPECT_TRUE( VVersionCheckSettings( &Store, "LumekVideoViewer", true ).GetShowOnStartup() );
+    VVersionCheckSettings Nowhere( nullptr, "LumekVideoViewer", false );
+    Nowhere.SetMessageId( "x" );
+    Nowhere.SetShowOnStartup( false );
+    EXPECT_EQ( Nowhere.GetMessageId(), "" );
+    EXPECT_TRUE( Nowhere.GetShowOnStartup() );
   }
 
-  TEST_F( VersionCheckTest, SilentServerTimesOutWithoutADialog )
+  // A server that never answers is given up when the time is up, without a word to the user even
+  // when asked; one that sends too much is cut off by the length it announces or by what it sends.
+  TEST_F( VersionCheckTest, SilentOrFloodingServerFailsQuietly )
   {
     Server.SetMode( VTestServer::EMode::Silent );
     ASSERT_TRUE( RunCheck( false, 1 ) );
-    ASSERT_EQ( pSettings->Outcomes.size(), 1u );
-    const IOutcome& rOutcome = pSettings->Outcomes[0];
-    EXPECT_EQ( rOutcome.Status, 4 );
-    EXPECT_EQ( rOutcome.Body, "" );
-    EXPECT_EQ( rOutcome.MessageType, "NONE" );
-    EXPECT_EQ( rOutcome.Error, "Version check request timeout" );
-    EXPECT_TRUE( Shown.empty() ) << "not even a user's check reports the silence";
+    EXPECT_EQ( pSettings->Outcomes, ( std::vector< IOutcome >{ { 4, "NONE", "Version check request timeout", "" } } ) );
     EXPECT_TRUE( Completions.empty() );
     EXPECT_EQ( Server.Requests().size(), 1 );
-  }
 
-  TEST_F( VersionCheckTest, FloodingServerIsCutOff )
-  {
-    // Flood is cut off by the announced length, Stream by the bytes that came.
     for( const auto Mode : { VTestServer::EMode::Flood, VTestServer::EMode::Stream } )
     {
       pSettings->Outcomes.clear();
       Server.SetMode( Mode );
       RunCheck( true );
-      EXPECT_TRUE( Shown.empty() );
       ASSERT_EQ( pSettings->Outcomes.size(), 1u );
-      EXPECT_EQ( pSettings->Outcomes[0].Status, 5 ); // QNetworkReply::OperationCanceledError
-      EXPECT_LE( pSettings->Outcomes[0].Body.size(), static_cast< std::size_t >( VVersionCheck::MaximumReplyBytes ) );
+      EXPECT_EQ( std::get< 0 >( pSettings->Outcomes[0] ), 5 ); // QNetworkReply::OperationCanceledError
+      EXPECT_LE( std::get< 3 >( pSettings->Outcomes[0] ).size(), std::size_t( VVersionCheck::MaximumReplyBytes ) );
     }
+    EXPECT_TRUE( Shown.empty() );
   }
 
   TEST_F( VersionCheckTest, RefusesWithoutSettingsOrOffTheMainThread )
@@ -345,9 +299,7 @@ namespace
     VVersionCheckListener Listener( "LumekVideoViewer", true, pSettings, nullptr, {}, nullptr );
     Listener.OnReplyFinished();
     Listener.OnTimeout();
-    ASSERT_EQ( pSettings->Outcomes.size(), 1u );
-    EXPECT_EQ( pSettings->Outcomes[0].Status, 99 );
-    EXPECT_EQ( pSettings->Outcomes[0].Error, "Unknown error" );
+    EXPECT_EQ( pSettings->Outcomes, ( std::vector< IOutcome >{ { 99, "NONE", "Unknown error", "" } } ) );
   }
 
   // Stands in for the system's browser.
@@ -367,59 +319,38 @@ namespace
   TEST_F( VersionCheckTest, ModalDialogAnsweredLikeAUser )
   {
     Check.SetDialogRunner( {} );
-    Serve( Optional );
+    Server.Serve( Optional );
     VUrlCatcher Browser;
     QDesktopServices::setUrlHandler( "https", &Browser, "Open" );
     const QUrl News( "https://www.lumek.example/news" );
+    const auto AnswerLikeAUser = [&]
+    {
+      auto* pBox = qobject_cast< VVersionCheckMessageBox* >( QApplication::activeModalWidget() );
+      if( pBox == nullptr )
+        return;
+      Shown.push_back( Describe( *pBox ) );
+      EXPECT_FALSE( pBox->windowFlags().testFlag( Qt::WindowContextHelpButtonHint ) );
+      EXPECT_FALSE( pBox->GetTextBrowser()->openLinks() ) << "links go to the system's browser";
+      emit pBox->GetTextBrowser()->anchorClicked( News );
+      EXPECT_TRUE( pBox->isVisible() ) << "the dialog stays while the browser opens";
+      EXPECT_EQ( pBox->GetCheckBox()->text(), "Do not show this message again." );
+      EXPECT_FALSE( pBox->GetCheckBox()->isChecked() );
+      pBox->GetCheckBox()->setChecked( true );
+      const auto Buttons = pBox->findChildren< QPushButton* >();
+      EXPECT_EQ( Buttons.size(), 1 );
+      EXPECT_EQ( Buttons.value( 0 )->text(), "OK" );
+      Buttons.value( 0 )->click();
+      EXPECT_FALSE( pBox->isVisible() );
+    };
     QTimer Answer;
-    QObject::connect( &Answer, &QTimer::timeout,
-                      [&]
-                      {
-                        for( QWidget* pWidget : QApplication::topLevelWidgets() )
-                        {
-                          auto* pBox = qobject_cast< VVersionCheckMessageBox* >( pWidget );
-                          if( pBox == nullptr || !pBox->isVisible() )
-                            continue;
-                          Shown.push_back( Describe( *pBox ) );
-                          EXPECT_FALSE( pBox->windowFlags().testFlag( Qt::WindowContextHelpButtonHint ) );
-                          EXPECT_FALSE( pBox->GetTextBrowser()->openLinks() ) << "links go to the system's browser";
-                          emit pBox->GetTextBrowser()->anchorClicked( News );
-                          EXPECT_TRUE( pBox->isVisible() ) << "the dialog stays while the browser opens";
-                          EXPECT_EQ( pBox->GetCheckBox()->text(), "Do not show this message again." );
-                          EXPECT_FALSE( pBox->GetCheckBox()->isChecked() );
-                          pBox->GetCheckBox()->setChecked( true );
-                          const auto Buttons = pBox->findChildren< QPushButton* >();
-                          EXPECT_EQ( Buttons.size(), 1 );
-                          EXPECT_EQ( Buttons.value( 0 )->text(), "OK" );
-                          Buttons.value( 0 )->click();
-                          EXPECT_FALSE( pBox->isVisible() );
-                        }
-                      } );
+    QObject::connect( &Answer, &QTimer::timeout, AnswerLikeAUser );
     Answer.start( 20 );
     RunCheck( true );
     QDesktopServices::unsetUrlHandler( "https" );
-    ASSERT_EQ( Shown.size(), 1u );
-    EXPECT_EQ( Shown[0].Title, "Checking LumekVideoViewer Version" );
-    EXPECT_EQ( Shown[0].Icon, "information" );
+    EXPECT_EQ( Shown, std::vector< std::string >{ "information+box: Message A" } );
     EXPECT_EQ( Browser.Urls, QList< QUrl >{ News } );
     EXPECT_FALSE( pSettings->GetShowOnStartup() );
-    EXPECT_EQ( Completions, std::vector< bool >{ true } );
-  }
-
-  // Without a store nothing is kept and the defaults are read; a forced setting shows at start
-  // whatever the store says.
-  TEST( VersionCheckSettings, WithoutAStoreOrForced )
-  {
-    VVersionCheckSettings Nowhere( nullptr, "LumekVideoViewer", false );
-    Nowhere.SetMessageId( "x" );
-    Nowhere.SetShowOnStartup( false );
-    EXPECT_EQ( Nowhere.GetMessageId(), "" );
-    EXPECT_TRUE( Nowhere.GetShowOnStartup() );
-
-    QSettings Store( "Lumek Labs Ltd", "LumekVideoViewer" );
-    VVersionCheckSettings( &Store, "LumekVideoViewer", false ).SetShowOnStartup( false );
-    EXPECT_TRUE( VVersionCheckSettings( &Store, "LumekVideoViewer", true ).GetShowOnStartup() );
-    Store.clear();
+    EXPECT_EQ( Completions, std::vector{ true } );
   }
 
   // The object the window holds: the release and system it tells the server, or the version it is
@@ -429,7 +360,7 @@ namespace
     VApplicationVersionCheck Unreleased( nullptr, nullptr, nullptr, "http://127.0.0.1:9/", "" );
     EXPECT_FALSE( Unreleased.CheckAtStartup() || Unreleased.CheckOnRequest() ) << "no release record, nothing sent";
 
-    Serve( None );
+    Server.Serve( None );
     VApplicationVersionCheck UpdateCheck( nullptr, &Store, &LumekVideoViewer::ApplicationVersion(),
                                           Server.Url().toStdString(), "" );
     EXPECT_EQ( UpdateCheck.GetVersionText(), "1.10.0.137509h" );
@@ -442,18 +373,42 @@ namespace
     Store.sync();
     EXPECT_EQ( Store.allKeys(), ( QStringList{ "LumekVideoViewer.MessageId", "LumekVideoViewer.ShowOnStartup" } ) );
 
-    Serve( Optional );
+    Server.Serve( Optional );
     VApplicationVersionCheck Spoofed( nullptr, &Store, &LumekVideoViewer::ApplicationVersion(),
                                       Server.Url().toStdString(), "0.3.0.55914h" );
-    std::vector< bool > Boxes;
     Spoofed.GetVersionCheck().SetDialogRunner( [&]( VVersionCheckMessageBox& io_rBox )
-                                               { Boxes.push_back( io_rBox.GetCheckBox() != nullptr ); } );
+                                               { Shown.push_back( Describe( io_rBox ) ); } );
     ASSERT_TRUE( Spoofed.CheckOnRequest() );
     RunUntil( [&] { return Idle( Spoofed.GetVersionCheck() ); } );
     ASSERT_EQ( Server.Requests().size(), 2 );
     EXPECT_NE( Server.Requests()[1].indexOf( "&version=0.3.0.55914h&" ), -1 ) << Server.Requests()[1].toStdString();
-    EXPECT_EQ( Boxes, std::vector< bool >{ false } ) << "a user's check offers no box to tick";
+    EXPECT_EQ( Shown, std::vector< std::string >{ "information: Message A" } ) << "a user's check offers no box";
   }
 } // namespace
 
 #include "VersionCheckTest.moc"
+
+// The widget tests run inside a QApplication, with settings, cache and runtime folders of their own
+// so that a run by hand never touches the user's.
+int main( int i_ArgumentCount, char** i_pArguments )
+{
+  testing::InitGoogleTest( &i_ArgumentCount, i_pArguments );
+  // Listing the tests happens at build time, where there may be no display.
+  if( testing::GTEST_FLAG( list_tests ) )
+    return RUN_ALL_TESTS();
+
+  // A temporary folder is its owner's alone, as a runtime folder must be; settings and cache go
+  // inside it.
+  QTemporaryDir Scratch;
+  if( !Scratch.isValid() )
+    return 1;
+  qputenv( "XDG_CONFIG_HOME", Scratch.filePath( "config" ).toLocal8Bit() );
+  qputenv( "XDG_CACHE_HOME", Scratch.filePath( "cache" ).toLocal8Bit() );
+  if( qEnvironmentVariableIsEmpty( "XDG_RUNTIME_DIR" ) )
+    qputenv( "XDG_RUNTIME_DIR", Scratch.path().toLocal8Bit() );
+
+  QApplication Application( i_ArgumentCount, i_pArguments );
+  // The tests' server is on this machine; a proxy from the environment must not stand between.
+  QNetworkProxy::setApplicationProxy( QNetworkProxy::NoProxy );
+  return RUN_ALL_TESTS();
+}

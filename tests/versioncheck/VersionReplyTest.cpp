@@ -10,6 +10,7 @@
 
 #include <gtest/gtest.h>
 
+#include <regex>
 #include <string>
 #include <vector>
 
@@ -91,12 +92,9 @@ namespace
         { Page, "REQUIRED", { "2 New release", "2 Please update & restart" } },
         { Page, "NONE", { "5 New release", "5 Please update & restart" } },
         { Page, "OPTIONAL", { "3 New release", "3 Please update & restart" } },
-        { Page, "", { "3 New release", "3 Please update & restart" } },
         { "<PAGE><BODY>x</BODY></PAGE>", "NONE", Failed },
         { "<HTML><HEAD>x</HEAD></HTML>", "NONE", Failed },
-        { "<html><body>x</body></html>", "NONE", Failed }, // names are case sensitive
         { "<HTML><BODY><p>unclosed</BODY>", "NONE", Failed },
-        { "", "NONE", Failed },
         { Deep, "NONE", Failed },
     };
     for( const auto& rCase : Cases )
@@ -134,14 +132,9 @@ namespace
   // by itself lies under the domain reserved for examples, and the default is reached over https.
   TEST( BuiltInAddress, StaysUnderTheExampleDomain )
   {
-    for( const std::string Address :
+    for( const char* pAddress :
          { VersionCheck::DefaultVersionServer, VersionCheck::BuiltInVersionServer, VersionCheck::SupportPage } )
-    {
-      const auto HostStart = Address.find( "://" ) + 3;
-      const std::string Host = Address.substr( HostStart, Address.find( '/', HostStart ) - HostStart );
-      EXPECT_TRUE( Host.size() > 8 && Host.substr( Host.size() - 8 ) == ".example" ) << Address;
-      EXPECT_EQ( Address.back(), '/' ) << Address;
-    }
-    EXPECT_EQ( std::string( VersionCheck::DefaultVersionServer ).rfind( "https://", 0 ), 0u );
+      EXPECT_TRUE( std::regex_match( pAddress, std::regex( "https?://[-a-z.]+\\.example/([^/]+/)*" ) ) ) << pAddress;
+    EXPECT_TRUE( std::regex_match( VersionCheck::DefaultVersionServer, std::regex( "https:.*" ) ) );
   }
 } // namespace
