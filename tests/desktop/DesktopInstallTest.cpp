@@ -22,12 +22,16 @@ namespace
 {
   const std::string s_AppId = "com.lumek.LumekVideoViewer";
 
-  bool Have( const std::string& i_rProgram )
+  // The programs of the list that this machine lacks, each after a space.
+  std::string Missing( std::initializer_list< std::string > i_Programs )
   {
-    int ExitCode = -1;
-    RunCommand( "command -v " + ShellQuote( i_rProgram ) + " >/dev/null 2>&1", &ExitCode );
-    return ExitCode == 0;
+    std::string Absent;
+    for( const std::string& rProgram : i_Programs )
+      if( RunCommand( "command -v " + ShellQuote( rProgram ) ).empty() )
+        Absent += " " + rProgram;
+    return Absent;
   }
+  const char* const s_Install = "not installed (scripts/install-deps.sh installs them):";
 
   // Runs a shell command; its output, with the exit code checked to be 0.
   std::string MustRun( const std::string& i_rCommand )
@@ -39,7 +43,8 @@ namespace
   }
 
   // One `cmake --install` of the build into a folder of its own, shared by the tests of a
-  // program run; the tests only read it and write beside it.
+  // program run, with a small recording written by the installed tool beside it; the tests only
+  // read the tree and write beside it.
   class InstalledTree : public ::testing::Test
   {
   protected:
@@ -51,6 +56,8 @@ namespace
       for( fs::recursive_directory_iterator It( Prefix() ), End; It != End; ++It )
         if( !fs::is_directory( It->path() ) )
           s_Installed.insert( fs::relative( It->path(), Prefix() ).string() );
+      MustRun( ShellQuote( ( Prefix() / "bin/lumekvideotool" ).string() ) + " make-sample " +
+               ShellQuote( Recording() ) + " --width 64 --height 48 --frames 2 --no-audio" );
     }
     static void TearDownTestSuite()
     {
@@ -60,22 +67,12 @@ namespace
     static fs::path Prefix() { return s_Root / "prefix"; }
     static fs::path Share() { return Prefix() / "share"; }
     static fs::path Scratch( const std::string& i_rName ) { return s_Root / i_rName; }
+    static std::string Recording() { return Scratch( "a take with spaces.lvid" ).string(); }
 
-    // A small .lvid recording written by the installed tool.
-    static std::string WriteRecording( const std::string& i_rName )
-    {
-      const std::string Path = Scratch( i_rName ).string();
-      MustRun( ShellQuote( ( Prefix() / "bin/lumekvideotool" ).string() ) + " make-sample " + ShellQuote( Path ) +
-               " --width 64 --height 48 --frames 2 --no-audio" );
-      return Path;
-    }
-
-    static fs::path s_Root;
+    inline static fs::path s_Root;
     // What the install wrote, before the file type database is built inside it.
-    static std::set< std::string > s_Installed;
+    inline static std::set< std::string > s_Installed;
   };
-  fs::path InstalledTree::s_Root;
-  std::set< std::string > InstalledTree::s_Installed;
 } // namespace
 
 TEST_F( InstalledTree, HoldsExactlyTheProgramsAndTheDesktopFiles )
@@ -108,8 +105,8 @@ TEST_F( InstalledTree, HoldsExactlyTheProgramsAndTheDesktopFiles )
 
 TEST_F( InstalledTree, ManPagesRenderAndCarryTheUsage )
 {
-  if( !Have( "man" ) )
-    GTEST_SKIP() << "man is not installed";
+  if( const std::string Absent = Missing( { "man" } ); !Absent.empty() )
+    GTEST_SKIP() << s_Install << Absent;
   const auto Render = []( const char* i_pPage )
   { return MustRun( "MANWIDTH=100 man --warnings -l " + ShellQuote( ( Share() / "man/man1" / i_pPage ).string() ) ); };
   const std::string Tool = Render( "lumekvideotool.1.gz" );
@@ -123,52 +120,36 @@ TEST_F( InstalledTree, ManPagesRenderAndCarryTheUsage )
     EXPECT_EQ( pPage->find( "warning" ), std::string::npos ) << *pPage;
 }
 
-TEST_F( InstalledTree, DebianValidatorsAcceptTheDesktopFiles )
-{
-  const struct
-  {
-    const char* Program;
-    std::string Command; // run with the installed tree's share folder as $SHARE
-  } Validators[] = {
-      { "desktop-file-validate", "desktop-file-validate \"$SHARE/applications/" + s_AppId + ".desktop\"" },
-      { "appstreamcli", "appstreamcli validate --no-net --pedantic \"$SHARE/metainfo/" + s_AppId + ".metainfo.xml\"" },
-      { "xmllint", "xmllint --noout --relaxng " + ShellQuote( LUMEK_MIME_SCHEMA ) + " \"$SHARE/mime/packages/" +
-                       s_AppId + ".xml\"" },
-      { "update-mime-database", "XDG_DATA_DIRS=\"$SHARE\" update-mime-database \"$SHARE/mime\"" },
-  };
-  std::string Missing;
-  for( const auto& rValidator : Validators )
-  {
-    SCOPED_TRACE( rValidator.Program );
-    if( !Have( rValidator.Program ) )
-    {
-      Missing += std::string( " " ) + rValidator.Program;
-      continue;
-    }
-    const std::string Out = MustRun( "SHARE=" + ShellQuote( Share().string() ) + "; " + rValidator.Command );
-    // Some validators answer warnings and hints with exit code 0; they are faults here too.
-    const std::string Lower = boost::to_lower_copy( Out );
-    for( const char* pWord : { "error", "warning", "unknown", "invalid" } )
-      EXPECT_EQ( Lower.find( pWord ), std::string::npos ) << Out;
-  }
-  if( !Missing.empty() )
-    GTEST_SKIP() << "not installed (scripts/install-deps.sh installs them):" << Missing;
-}
-
-TEST_F( InstalledTree, FileTypesAreNamedByTheDatabase )
+// The validators Debian ships accept the desktop files, and the file type database built from them
+// names each type.
+TEST_F( InstalledTree, DesktopFilesAreValidAndNameTheTypes )
 {
   // xdg-mime asks GLib under GNOME; its generic path falls back to file(1), which knows no new types.
-  if( !Have( "update-mime-database" ) || !Have( "xdg-mime" ) || !Have( "gio" ) )
-    GTEST_SKIP() << "update-mime-database, xdg-mime and gio are needed (scripts/install-deps.sh installs them)";
-  MustRun( "update-mime-database " + ShellQuote( ( Share() / "mime" ).string() ) );
+  if( const std::string Absent =
+          Missing( { "desktop-file-validate", "appstreamcli", "xmllint", "update-mime-database", "xdg-mime", "gio" } );
+      !Absent.empty() )
+    GTEST_SKIP() << s_Install << Absent;
+  const std::string At = ShellQuote( Share().string() );
+  for( const std::string& rCommand :
+       { "desktop-file-validate " + At + "/applications/" + s_AppId + ".desktop",
+         "appstreamcli validate --no-net --pedantic " + At + "/metainfo/" + s_AppId + ".metainfo.xml",
+         "xmllint --noout --relaxng " + ShellQuote( LUMEK_MIME_SCHEMA ) + " " + At + "/mime/packages/" + s_AppId +
+             ".xml",
+         "XDG_DATA_DIRS=" + At + " update-mime-database " + At + "/mime" } )
+  {
+    // Some validators answer warnings and hints with exit code 0; they are faults here too.
+    const std::string Out = boost::to_lower_copy( MustRun( rCommand ) );
+    for( const char* pWord : { "error", "warning", "unknown", "invalid" } )
+      EXPECT_EQ( Out.find( pWord ), std::string::npos ) << rCommand << "\n" << Out;
+  }
+
   fs::create_directories( Scratch( "home" ) );
-  const std::string Recording = WriteRecording( "take.lvid" ), Renamed = Scratch( "take.bin" ).string(),
-                    Sequence = Scratch( "take.lumekimagesequence" ).string();
-  fs::copy_file( Recording, Renamed );
+  const std::string Renamed = Scratch( "take.bin" ).string(), Sequence = Scratch( "take.lumekimagesequence" ).string();
+  fs::copy_file( Recording(), Renamed );
   std::ofstream( Sequence ) << "frames/take_%06d.png\n";
   // The contents name a recording whatever it is called.
   for( const auto& [Path, Expected] :
-       { std::pair( Recording, "video/x-lumek-lvid" ), std::pair( Renamed, "video/x-lumek-lvid" ),
+       { std::pair( Recording(), "video/x-lumek-lvid" ), std::pair( Renamed, "video/x-lumek-lvid" ),
          std::pair( Sequence, "application/x-lumek-imagesequence" ) } )
   {
     const std::string Type = MustRun(
@@ -190,7 +171,7 @@ TEST_F( InstalledTree, ThumbnailerCommandRunsAsWritten )
 
   // As a thumbnail manager runs it: the program from PATH, the fields replaced by quoted words.
   const std::string Output = Scratch( "thumb nail.png" ).string();
-  boost::replace_all( Command, "%i", ShellQuote( WriteRecording( "a take with spaces.lvid" ) ) );
+  boost::replace_all( Command, "%i", ShellQuote( Recording() ) );
   boost::replace_all( Command, "%o", ShellQuote( Output ) );
   boost::replace_all( Command, "%s", "32" );
   MustRun( "PATH=" + ShellQuote( ( Prefix() / "bin" ).string() ) + ":/usr/bin:/bin " + Command );
@@ -200,8 +181,8 @@ TEST_F( InstalledTree, ThumbnailerCommandRunsAsWritten )
 // The package holds what the install tree holds, under /usr, and nothing to build against.
 TEST_F( InstalledTree, DebianPackageControlAndContents )
 {
-  if( !Have( "dpkg-deb" ) || !Have( "cpack" ) )
-    GTEST_SKIP() << "dpkg-deb and cpack are needed";
+  if( const std::string Absent = Missing( { "dpkg-deb", "cpack" } ); !Absent.empty() )
+    GTEST_SKIP() << s_Install << Absent;
   const std::string Folder = ShellQuote( Scratch( "deb" ).string() );
   MustRun( "mkdir " + Folder + " && cd " + Folder + " && cpack -G DEB --config " +
            ShellQuote( std::string( LUMEK_BUILD_DIR ) + "/CPackConfig.cmake" ) );
