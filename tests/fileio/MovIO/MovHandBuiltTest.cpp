@@ -121,8 +121,8 @@ TEST( MovAtomTree, DumpShowsTheTreeAndTheSizeOneOfA64BitMdat )
   ASSERT_TRUE( OpenBytes( Reader, Bytes ) );
   std::ostringstream Dump;
   ASSERT_TRUE( Reader.DumpFileStructure( Dump ) );
-  std::ifstream Golden( MOV_GOLDEN_FOLDER "/dump-timecode-track.txt" );
-  EXPECT_EQ( Dump.str(), std::string( std::istreambuf_iterator< char >( Golden ), {} ) );
+  const VBytes Golden = ContainerTest::ReadFile( MOV_GOLDEN_FOLDER "/dump-timecode-track.txt" );
+  EXPECT_EQ( Dump.str(), std::string( Golden.begin(), Golden.end() ) );
 
   // A size past the file's end ends its container where the file ends, inside or outside.
   VAtomWriter w;

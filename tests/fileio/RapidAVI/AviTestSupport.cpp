@@ -1,52 +1,41 @@
 #include "AviTestSupport.h"
 
-#include "tests/support/FfmpegFixtures.h"
-#include "utils/MemoryStream.h"
-
 #include <algorithm>
-#include <fstream>
-#include <iterator>
 
 namespace AviTest
 {
   namespace
   {
+    // Absolute payload positions and sizes of chunks, in order.
     using VEntries = std::vector< std::pair< std::uint64_t, std::uint64_t > >;
 
-    struct VMoviContents
+    // The chunks of one movi list whose list header starts at i_ListPosition, frames and audio
+    // in turn; the positions of each kind go to o_rVideo and o_rAudio.
+    VBytes MoviChunks( std::uint64_t i_ListPosition, const VBytes& i_rLeading, const std::vector< VBytes >& i_rFrames,
+                       const std::vector< VBytes >& i_rAudio, VEntries& o_rVideo, VEntries& o_rAudio )
     {
       VLE Chunks;
-      // Absolute payload positions and sizes of the chunks, in order.
-      VEntries Video;
-      VEntries Audio;
-    };
-
-    // The chunks of one movi list whose list header starts at i_ListPosition.
-    VMoviContents MoviChunks( std::uint64_t i_ListPosition, const VBytes& i_rLeading,
-                              const std::vector< VBytes >& i_rFrames, const std::vector< VBytes >& i_rAudio )
-    {
-      VMoviContents Contents;
-      Contents.Chunks.Append( i_rLeading );
+      Chunks.Append( i_rLeading );
       const auto Add = [&]( const char* pId, const VBytes& rPayload, VEntries& rEntries )
       {
-        rEntries.emplace_back( i_ListPosition + 12 + Contents.Chunks.Bytes.size() + 8, rPayload.size() );
-        Contents.Chunks.Append( Chunk( pId, rPayload ) );
+        rEntries.emplace_back( i_ListPosition + 12 + Chunks.Bytes.size() + 8, rPayload.size() );
+        Chunks.Append( Chunk( pId, rPayload ) );
       };
       for( std::size_t i = 0; i < std::max( i_rFrames.size(), i_rAudio.size() ); ++i )
       {
         if( i < i_rFrames.size() )
-          Add( "00dc", i_rFrames[i], Contents.Video );
+          Add( "00dc", i_rFrames[i], o_rVideo );
         if( i < i_rAudio.size() )
-          Add( "01wb", i_rAudio[i], Contents.Audio );
+          Add( "01wb", i_rAudio[i], o_rAudio );
       }
-      return Contents;
+      return Chunks.Bytes;
     }
 
-    // An ix00 of four-byte entries, of chunks.
+    // An ix00 of four-byte entries, of the first i_Count chunks.
     VBytes StandardIndex( const VEntries& i_rEntries, std::size_t i_Count, std::uint64_t i_Base )
     {
       VLE Payload;
-      Payload.U32( 0x01000002 ).U32( i_Count ).Text( "00dc" ).U64( i_Base ).U32( 0 );
+      Payload.U32( 0x01000002 ).U32( i_Count ).Text( "00dc" ).U( i_Base, 8 ).U32( 0 );
       for( std::size_t i = 0; i < i_Count; ++i )
         Payload.U32( i_rEntries[i].first - i_Base ).U32( i_rEntries[i].second );
       return Chunk( "ix00", Payload.Bytes );
@@ -68,9 +57,7 @@ namespace AviTest
 
   VBytes Chunk( const std::string& i_rId, const VBytes& i_rPayload )
   {
-    VLE Bytes;
-    Bytes.Text( i_rId ).U32( i_rPayload.size() ).Append( i_rPayload ).Zeros( i_rPayload.size() % 2 );
-    return Bytes.Bytes;
+    return VLE().Text( i_rId ).U32( i_rPayload.size() ).Append( i_rPayload ).Zeros( i_rPayload.size() % 2 ).Bytes;
   }
 
   VBytes List( const std::string& i_rType, const std::vector< VBytes >& i_rChildren, const std::string& i_rId )
@@ -82,28 +69,12 @@ namespace AviTest
     return Chunk( i_rId, Payload.Bytes );
   }
 
-  VBytes StreamHeader( const std::string& i_rType, std::uint32_t i_Scale, std::uint32_t i_Rate )
-  {
-    return Chunk( "strh", VLE().Text( i_rType ).Zeros( 16 ).U32( i_Scale ).U32( i_Rate ).Zeros( 28 ).Bytes );
-  }
-
   VBytes WaveFormat( std::uint16_t i_Tag, std::uint16_t i_Channels, std::uint32_t i_Rate, std::uint16_t i_Bits )
   {
-    // 16 bytes, as ffmpeg writes plain PCM.
     const int Group = i_Channels * i_Bits / 8;
     return Chunk(
         "strf",
         VLE().U16( i_Tag ).U16( i_Channels ).U32( i_Rate ).U32( i_Rate * Group ).U16( Group ).U16( i_Bits ).Bytes );
-  }
-
-  VBytes ExtensibleWaveFormat( bool i_bFloat, std::uint16_t i_Channels, std::uint32_t i_Rate, std::uint16_t i_Bits )
-  {
-    const VBytes Plain = WaveFormat( 0xFFFE, i_Channels, i_Rate, i_Bits );
-    VLE Payload;
-    Payload.Append( VBytes( Plain.begin() + 8, Plain.end() ) ).U16( 22 ).U16( i_Bits ).U32( i_Channels == 2 ? 3 : 4 );
-    // KSDATAFORMAT_SUBTYPE_PCM, or _IEEE_FLOAT by its first field.
-    Payload.U32( i_bFloat ? 3 : 1 ).U16( 0 ).U16( 0x10 ).U32( 0xAA000080 ).U32( 0x719B3800 );
-    return Chunk( "strf", Payload.Bytes );
   }
 
   VAviSpec GreySpec( int i_Frames )
@@ -115,49 +86,51 @@ namespace AviTest
     return Spec;
   }
 
-  VBytes BuildAvi( const VAviSpec& i_rSpec )
+  VBytes BuildAvi( const VAviSpec& s )
   {
+    const auto StreamHeader = []( const char* pType, std::uint32_t i_Scale, std::uint32_t i_Rate )
+    { return Chunk( "strh", VLE().Text( pType ).Zeros( 16 ).U32( i_Scale ).U32( i_Rate ).Zeros( 28 ).Bytes ); };
     VLE Bitmap;
-    Bitmap.U32( 40 ).U32( i_rSpec.Width ).U32( static_cast< std::uint32_t >( i_rSpec.StrfHeight ) ).U16( 1 );
-    Bitmap.U16( i_rSpec.Bits ).U32( i_rSpec.Compression ).Zeros( 20 ).Append( i_rSpec.Palette );
-    VLE MainHeader;
-    MainHeader.U32( i_rSpec.MicrosecondsPerFrame ).Zeros( 28 ).U32( i_rSpec.Width ).U32( i_rSpec.Height ).Zeros( 16 );
+    Bitmap.U32( 40 ).U32( s.Width ).U32( static_cast< std::uint32_t >( s.StrfHeight ) ).U16( 1 ).U16( s.Bits );
+    Bitmap.U32( s.Compression ).Zeros( 20 );
+    const VBytes MainHeader =
+        VLE().U32( s.MicrosecondsPerFrame ).Zeros( 28 ).U32( s.Width ).U32( s.Height ).Zeros( 16 ).Bytes;
     std::vector< VBytes > HeaderChildren = {
-        Chunk( "avih", MainHeader.Bytes ),
-        List( "strl", { StreamHeader( "vids", i_rSpec.Scale, i_rSpec.Rate ), Chunk( "strf", Bitmap.Bytes ) } ) };
-    if( !i_rSpec.AudioFormat.empty() )
-      HeaderChildren.push_back( List( "strl", { StreamHeader( "auds", 1, 48000 ), i_rSpec.AudioFormat } ) );
-    HeaderChildren.push_back( i_rSpec.ExtraHeaderChunks );
+        Chunk( "avih", MainHeader ),
+        List( "strl", { StreamHeader( "vids", s.Scale, s.Rate ), Chunk( "strf", Bitmap.Bytes ) } ) };
+    if( !s.AudioFormat.empty() )
+      HeaderChildren.push_back( List( "strl", { StreamHeader( "auds", 1, 48000 ), s.AudioFormat } ) );
+    HeaderChildren.push_back( s.ExtraHeaderChunks );
     const VBytes Header = List( "hdrl", HeaderChildren );
 
     const std::uint64_t MoviPosition = 12 + Header.size();
-    VMoviContents Movi = MoviChunks( MoviPosition, i_rSpec.ExtraMoviChunks, i_rSpec.Frames, i_rSpec.AudioChunks );
-    if( i_rSpec.StandardIndexFrames >= 0 )
-      Movi.Chunks.Append( StandardIndex( Movi.Video, std::size_t( i_rSpec.StandardIndexFrames ), MoviPosition + 8 ) );
-    std::vector< VBytes > Parts = { Header, List( "movi", { Movi.Chunks.Bytes } ) };
-    if( i_rSpec.OldIndexFrames >= 0 )
+    VEntries Video, Audio;
+    VLE Movi{ MoviChunks( MoviPosition, s.ExtraMoviChunks, s.Frames, s.AudioChunks, Video, Audio ) };
+    if( s.StandardIndexFrames >= 0 )
+      Movi.Append( StandardIndex( Video, std::size_t( s.StandardIndexFrames ), MoviPosition + 8 ) );
+    std::vector< VBytes > Parts = { Header, List( "movi", { Movi.Bytes } ) };
+    if( s.OldIndexFrames >= 0 )
     {
       // Offsets count from the movi FourCC to each chunk's header.
       VLE Entries;
       const auto Add = [&]( const char* pId, const std::pair< std::uint64_t, std::uint64_t >& rEntry )
       { Entries.Text( pId ).U32( 0x10 ).U32( rEntry.first - 8 - ( MoviPosition + 8 ) ).U32( rEntry.second ); };
-      for( std::size_t i = 0; i < std::min( std::size_t( i_rSpec.OldIndexFrames ), Movi.Video.size() ); ++i )
-        Add( "00dc", Movi.Video[i] );
-      for( const auto& rAudio : Movi.Audio )
+      for( std::size_t i = 0; i < std::min( std::size_t( s.OldIndexFrames ), Video.size() ); ++i )
+        Add( "00dc", Video[i] );
+      for( const auto& rAudio : Audio )
         Add( "01wb", rAudio );
       Parts.push_back( Chunk( "idx1", Entries.Bytes ) );
     }
-    VBytes File = Riff( "AVI ", Parts );
-    if( !i_rSpec.ExtendedFrames.empty() )
+    VLE File{ Riff( "AVI ", Parts ) };
+    if( !s.ExtendedFrames.empty() )
     {
-      const std::uint64_t ListPosition = File.size() + 12;
-      VMoviContents Extended = MoviChunks( ListPosition, {}, i_rSpec.ExtendedFrames, {} );
-      Extended.Chunks.Append( StandardIndex( Extended.Video, Extended.Video.size(), ListPosition ) );
-      const VBytes Part = Riff( "AVIX", { List( "movi", { Extended.Chunks.Bytes } ) } );
-      File.insert( File.end(), Part.begin(), Part.end() );
+      const std::uint64_t ListPosition = File.Bytes.size() + 12;
+      VEntries Extended, None;
+      VLE Chunks{ MoviChunks( ListPosition, {}, s.ExtendedFrames, {}, Extended, None ) };
+      Chunks.Append( StandardIndex( Extended, Extended.size(), ListPosition ) );
+      File.Append( Riff( "AVIX", { List( "movi", { Chunks.Bytes } ) } ) );
     }
-    File.insert( File.end(), i_rSpec.Trailer.begin(), i_rSpec.Trailer.end() );
-    return File;
+    return File.Append( s.Trailer ).Bytes;
   }
 
   void Patch( VBytes& io_rFile, const std::string& i_rId, std::size_t i_Offset, std::uint64_t i_Value, int i_Width )
@@ -170,9 +143,7 @@ namespace AviTest
 
   VOpenedAvi OpenAvi( const VBytes& i_rBytes )
   {
-    VOpenedAvi Opened;
-    Opened.pBytes = std::make_shared< VBytes >( i_rBytes );
-    Opened.pReader = std::make_shared< RapidAVI::VRapidAVIReader >();
+    VOpenedAvi Opened{ std::make_shared< VBytes >( i_rBytes ), std::make_shared< RapidAVI::VRapidAVIReader >() };
     Opened.bOpened = Opened.pReader->Open(
         std::make_shared< UtilsIO::VMemoryInputStream >( Opened.pBytes->data(), Opened.pBytes->size() ) );
     return Opened;
@@ -189,18 +160,11 @@ namespace AviTest
     return VBytes( Frame.Video->GetData(), Frame.Video->GetData() + Frame.Video->GetSize() );
   }
 
-  std::string FfmpegAvi( const std::string& i_rName, const std::vector< std::string >& i_rArguments )
+  std::string FfmpegAvi( const std::string& i_rName, const std::string& i_rArguments )
   {
     if( !LumekTest::HaveFfmpeg() )
       return {};
-    std::vector< std::string > Arguments = { "-f", "lavfi", "-i", "testsrc2=size=64x48:rate=25" };
-    Arguments.insert( Arguments.end(), i_rArguments.begin(), i_rArguments.end() );
-    return LumekTest::FfmpegFixture( i_rName, Arguments );
-  }
-
-  VBytes ReadFile( const std::string& i_rPath )
-  {
-    std::ifstream Stream( i_rPath, std::ios::binary );
-    return VBytes( std::istreambuf_iterator< char >( Stream ), {} );
+    return LumekTest::FfmpegFixture(
+        i_rName, ContainerTest::Words( "-f lavfi -i testsrc2=size=64x48:rate=25 " + i_rArguments ) );
   }
 } // namespace AviTest

@@ -4,16 +4,12 @@
 // rules can be made exactly; and the readers of the files ffmpeg makes.
 
 #include "fileio/RapidAVI/VRapidAVIReader.h"
+#include "tests/fileio/MovIO/ContainerTestSupport.h"
 #include "tests/support/LogCapture.h"
-
-#include <cstdint>
-#include <memory>
-#include <string>
-#include <vector>
 
 namespace AviTest
 {
-  using VBytes = std::vector< std::uint8_t >;
+  using ContainerTest::VBytes;
 
   // Little-endian fields, one after another.
   struct VLE
@@ -21,7 +17,6 @@ namespace AviTest
     VLE& U( std::uint64_t i_Value, int i_Width );
     VLE& U16( std::uint64_t i_Value ) { return U( i_Value, 2 ); }
     VLE& U32( std::uint64_t i_Value ) { return U( i_Value, 4 ); }
-    VLE& U64( std::uint64_t i_Value ) { return U( i_Value, 8 ); }
     VLE& Text( const std::string& i_rText ) { return Append( VBytes( i_rText.begin(), i_rText.end() ) ); }
     VLE& Zeros( std::size_t i_Count ) { return Append( VBytes( i_Count, 0 ) ); }
     VLE& Append( const VBytes& i_rBytes );
@@ -36,9 +31,8 @@ namespace AviTest
   {
     return List( i_rForm, i_rChildren, "RIFF" );
   }
-  VBytes StreamHeader( const std::string& i_rType, std::uint32_t i_Scale, std::uint32_t i_Rate );
+  // Plain PCM's 16 bytes, as ffmpeg writes them.
   VBytes WaveFormat( std::uint16_t i_Tag, std::uint16_t i_Channels, std::uint32_t i_Rate, std::uint16_t i_Bits );
-  VBytes ExtensibleWaveFormat( bool i_bFloat, std::uint16_t i_Channels, std::uint32_t i_Rate, std::uint16_t i_Bits );
 
   struct VAviSpec
   {
@@ -51,7 +45,6 @@ namespace AviTest
     std::uint32_t Compression = RapidAVI::MakeFourCC( "Y800" );
     std::uint16_t Bits = 8;
     std::int32_t StrfHeight = -4;
-    VBytes Palette; // behind the bitmap header in strf
     std::vector< VBytes > Frames;
     std::vector< VBytes > AudioChunks;
     // A whole "strf" chunk for the audio stream; empty for no audio stream.
@@ -91,7 +84,5 @@ namespace AviTest
 
   // An AVI of ffmpeg's from testsrc2 at 64 x 48, 25 Hz, with these arguments behind the input;
   // empty when there is no ffmpeg.
-  std::string FfmpegAvi( const std::string& i_rName, const std::vector< std::string >& i_rArguments );
-  // The whole file's bytes.
-  VBytes ReadFile( const std::string& i_rPath );
+  std::string FfmpegAvi( const std::string& i_rName, const std::string& i_rArguments );
 } // namespace AviTest
