@@ -36,14 +36,12 @@ namespace
     }
   };
 
-  TEST_F( H264Decoder, EveryFrameEqualsFfmpegs )
+  TEST_F( H264Decoder, EveryFrameEqualsFfmpegsInTheWishedPacking )
   {
     // 98 x 62 is not a whole number of macroblocks: the stream crops.
-    const std::tuple< std::int32_t, std::int32_t, const char* > Cases[] = {
-        { 64, 48, "baseline" }, { 176, 144, "baseline" }, { 98, 62, "baseline" }, { 80, 48, "main" } };
-    for( const auto& [Width, Height, pProfile] : Cases )
+    for( const auto& [Width, Height, pProfile] : { std::tuple( 98, 62, "baseline" ), std::tuple( 80, 48, "main" ) } )
     {
-      SCOPED_TRACE( std::string( pProfile ) + " " + std::to_string( Width ) + "x" + std::to_string( Height ) );
+      SCOPED_TRACE( pProfile );
       const VH264Stream Stream = MakeH264Stream( Width, Height, 12, 5, std::string( "-profile:v " ) + pProfile );
       const std::vector< VBytes > Expected = ExpectedUYVYFrames( Stream );
       ASSERT_EQ( Stream.AccessUnits.size(), 12u );
@@ -53,30 +51,23 @@ namespace
       {
         const VDecode Frame( Stream.AccessUnits[i], ZOL::PixelFormat_U8Y8V8Y8, pDecoder.get() );
         ASSERT_TRUE( Frame.bDecoded ) << i;
-        EXPECT_EQ( Frame.Info.ImageWidth, Width );
-        EXPECT_EQ( Frame.Info.ImageHeight, Height );
-        EXPECT_EQ( Frame.Info.PixelFormat, ZOL::PixelFormat_U8Y8V8Y8 );
+        EXPECT_EQ( std::tie( Frame.Info.ImageWidth, Frame.Info.ImageHeight, Frame.Info.PixelFormat ),
+                   std::tuple( Width, Height, ZOL::PixelFormat_U8Y8V8Y8 ) );
         EXPECT_EQ( Bytes( *Frame.pOutput ), Expected[i] ) << "frame " << i;
       }
+      // The other packing when asked for, U8Y8V8Y8 for any other wish.
+      VBytes Swapped = Expected[0];
+      for( std::size_t i = 0; i + 1 < Swapped.size(); i += 2 )
+        std::swap( Swapped[i], Swapped[i + 1] );
+      const VDecode Other( Stream.AccessUnits[0], ZOL::PixelFormat_Y8U8Y8V8 );
+      ASSERT_TRUE( Other.bDecoded );
+      EXPECT_EQ( Other.Info.PixelFormat, ZOL::PixelFormat_Y8U8Y8V8 );
+      EXPECT_EQ( Bytes( *Other.pOutput ), Swapped );
+      const VDecode Any( Stream.AccessUnits[0], ZOL::PixelFormat_R8G8B8 );
+      ASSERT_TRUE( Any.bDecoded );
+      EXPECT_EQ( Any.Info.PixelFormat, ZOL::PixelFormat_U8Y8V8Y8 );
+      EXPECT_EQ( Bytes( *Any.pOutput ), Expected[0] );
     }
-  }
-
-  TEST_F( H264Decoder, GivesTheOtherPackingWhenAskedAndU8Y8V8Y8Otherwise )
-  {
-    const VH264Stream Stream = MakeH264Stream( 64, 48, 12, 5 );
-    const std::vector< VBytes > Expected = ExpectedUYVYFrames( Stream );
-    ASSERT_FALSE( Expected.empty() );
-    VBytes Swapped = Expected[0];
-    for( std::size_t i = 0; i + 1 < Swapped.size(); i += 2 )
-      std::swap( Swapped[i], Swapped[i + 1] );
-    const VDecode Other( Stream.AccessUnits[0], ZOL::PixelFormat_Y8U8Y8V8 );
-    ASSERT_TRUE( Other.bDecoded );
-    EXPECT_EQ( Other.Info.PixelFormat, ZOL::PixelFormat_Y8U8Y8V8 );
-    EXPECT_EQ( Bytes( *Other.pOutput ), Swapped );
-    const VDecode Any( Stream.AccessUnits[0], ZOL::PixelFormat_R8G8B8 );
-    ASSERT_TRUE( Any.bDecoded );
-    EXPECT_EQ( Any.Info.PixelFormat, ZOL::PixelFormat_U8Y8V8Y8 );
-    EXPECT_EQ( Bytes( *Any.pOutput ), Expected[0] );
   }
 
   TEST_F( H264Decoder, UnitsWithoutAPictureGiveNoFrameAndSaySo )
@@ -93,28 +84,6 @@ namespace
                            ZOL::PixelFormat_U8Y8V8Y8 );
     EXPECT_FALSE( Garbage.bDecoded || Garbage.pOutput );
     EXPECT_GT( Log.Messages.size(), LinesBefore );
-  }
-
-  TEST_F( H264Decoder, OddSizedStreamNeverGivesAnOddFrame )
-  {
-    // Only monochrome pictures crop to an odd size. OpenH264 2.3 crops them in 4:2:0 units and
-    // gives 32 x 16; a library that reported 33 x 17 would see each frame refused with the
-    // even-size line instead. Either way no frame of odd size comes out.
-    const VH264Stream Stream = MakeH264Stream( 33, 17, 4, 2, "-profile:v high", "gray" );
-    ASSERT_EQ( Stream.AccessUnits.size(), 4u );
-    const auto pDecoder = H264IO::VH264Decoder::Create( std::make_shared< ZOL::VFrameBufferAllocator >() );
-    VLogCapture Log( "H264IO" );
-    for( const VBytes& rUnit : Stream.AccessUnits )
-    {
-      const VDecode Frame( rUnit, ZOL::PixelFormat_U8Y8V8Y8, pDecoder.get() );
-      if( !Frame.bDecoded )
-        EXPECT_TRUE( Log.Has( "Decoder produced a frame of dimensions 33 x 17. Only frames with even width and "
-                              "height are supported." ) );
-      else
-        EXPECT_TRUE( Frame.Info.ImageWidth % 2 == 0 && Frame.Info.ImageHeight % 2 == 0 && Frame.pOutput &&
-                     Frame.pOutput->GetSize() == std::uint64_t( Frame.Info.ImageWidth ) * Frame.Info.ImageHeight * 2 )
-            << Frame.Info.ImageWidth << " x " << Frame.Info.ImageHeight;
-    }
   }
 
   // 80 frames, a key frame every 30: key frames at 0, 30 and 60.
@@ -160,19 +129,13 @@ namespace
   {
     // Alone mid-group, around a key frame and at the end; backwards; forward within a group;
     // across groups.
-    const std::vector< std::vector< std::uint64_t > > Jumps = { { 45 },
-                                                                { 29 },
-                                                                { 30 },
-                                                                { 31 },
-                                                                { 79 },
-                                                                { 62, 61, 60, 59, 31, 30, 29, 1, 0 },
-                                                                { 3, 17, 18, 28 },
-                                                                { 5, 70, 33, 34, 35, 2 } };
-    for( const std::vector< std::uint64_t >& rJump : Jumps )
+    for( const char* pJump :
+         { "45", "29", "30", "31", "79", "62 61 60 59 31 30 29 1 0", "3 17 18 28", "5 70 33 34 35 2" } )
     {
       Open( Stream );
-      for( std::uint64_t Index : rJump )
-        EXPECT_TRUE( FrameIs( Index, Index ) ) << "jumping " << ::testing::PrintToString( rJump );
+      std::istringstream Jump( pJump );
+      for( std::uint64_t Index = 0; Jump >> Index; )
+        EXPECT_TRUE( FrameIs( Index, Index ) ) << "jumping " << pJump;
     }
   }
 
@@ -196,31 +159,26 @@ namespace
     EXPECT_TRUE( FrameIs( Holes[55], 55 ) );
   }
 
-  TEST_F( H264RandomAccess, AStreamCutInsideAGroupPlaysFromItsNextKeyFrame )
+  TEST_F( H264RandomAccess, FramesWithoutTheirKeyFrameAreFalseAnswers )
   {
     // The first ten frames are gone: 0 to 19 of the rest lack their references, 20 (the
     // original 30) is a key frame and everything from there matches.
-    VH264Stream Tail = Stream;
-    Tail.AccessUnits.erase( Tail.AccessUnits.begin(), Tail.AccessUnits.begin() + 10 );
-    Open( Tail );
+    VH264Stream Cut = Stream;
+    Cut.AccessUnits.erase( Cut.AccessUnits.begin(), Cut.AccessUnits.begin() + 10 );
+    Open( Cut );
     ZOL::IVideoFrame Frame;
     EXPECT_FALSE( Source->GetFrame( 5, Frame ) );
     EXPECT_TRUE( FrameIs( 21, 31 ) );
     EXPECT_TRUE( FrameIs( 20, 30 ) );
     for( std::uint64_t i = 21; i < 70; ++i )
       ASSERT_TRUE( FrameIs( i, i + 10 ) );
-  }
 
-  TEST_F( H264RandomAccess, NoKeyFrameWithinReachIsAFalseAnswer )
-  {
-    // A key frame, then far more frames without one than a scrub will walk back over. The
-    // copies are never decoded: the walk back finds nothing and stops.
-    VH264Stream Long = Stream;
-    Long.AccessUnits.resize( 1 );
-    Long.AccessUnits.insert( Long.AccessUnits.end(), 1500, Stream.AccessUnits[1] );
-    const auto pReader = Open( Long );
+    // A key frame, then far more frames without one than a scrub walks back over: the walk
+    // stops without decoding the copies.
+    Cut.AccessUnits.assign( 1, Stream.AccessUnits[0] );
+    Cut.AccessUnits.insert( Cut.AccessUnits.end(), 1500, Stream.AccessUnits[1] );
+    const auto pReader = Open( Cut );
     VLogCapture Log( "H264IO" );
-    ZOL::IVideoFrame Frame;
     EXPECT_FALSE( Source->GetFrame( 1400, Frame ) );
     EXPECT_TRUE( Log.Has( "No key frame within 1200 frames before frame 1400." ) );
     EXPECT_EQ( pReader->Reads, 1200u );

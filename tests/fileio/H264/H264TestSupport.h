@@ -3,21 +3,16 @@
 // H.264 streams made by ffmpeg in the run, cut into access units, and a reader that serves them
 // from memory so that the video source can be driven without a container that stores H.264.
 
+#include "tests/fileio/ImageDecoders/ImageTestSupport.h"
 #include "tests/support/FfmpegFixtures.h"
-#include "tests/support/LogCapture.h"
-#include "videointerface/BufferAllocators.h"
 #include "videointerface/IVideoReader.h"
 #include "videointerface/ReaderCapabilities.h"
 
-#include <fstream>
-#include <iterator>
 #include <map>
 #include <sstream>
 
 namespace LumekTest
 {
-  using VBytes = std::vector< std::uint8_t >;
-
   struct VH264Stream
   {
     std::string Path;
@@ -78,10 +73,8 @@ namespace LumekTest
                         i_Width,
                         i_Height,
                         {} };
-    std::ifstream File( Stream.Path, std::ios::binary );
-    const VBytes Whole( ( std::istreambuf_iterator< char >( File ) ), std::istreambuf_iterator< char >() );
     // Each access unit starts at its delimiter (type 9), which stays in the unit.
-    for( const VBytes& rUnit : SplitNALUnits( Whole ) )
+    for( const VBytes& rUnit : SplitNALUnits( ReadWholeFile( Stream.Path ) ) )
     {
       if( rUnit.empty() )
         continue;
@@ -120,11 +113,6 @@ namespace LumekTest
       Frames.push_back( std::move( Frame ) );
     }
     return Frames;
-  }
-
-  inline VBytes Bytes( const ZOL::IBufferConst& i_rBuffer )
-  {
-    return VBytes( i_rBuffer.GetData(), i_rBuffer.GetData() + i_rBuffer.GetSize() );
   }
 
   // A buffer over bytes the test holds.

@@ -1,15 +1,18 @@
 #pragma once
 
-// What the still-image decoder tests share: frame allocators, files read whole, the committed
-// seeds, the frame a container would declare, and the log's lines.
+// What the image, sequence, Matroska and H.264 reader tests share: files read and written whole,
+// a temporary folder, the bytes of a buffer, the distance between two pictures, the committed
+// seeds and the frame a container would declare.
 
 #include "tests/support/LogCapture.h"
 #include "videointerface/BufferAllocators.h"
 #include "videointerface/IVideoFrameInfo.h"
 
 #include <algorithm>
+#include <filesystem>
 #include <fstream>
 #include <iterator>
+#include <random>
 
 namespace LumekTest
 {
@@ -26,11 +29,79 @@ namespace LumekTest
     return VBytes( std::istreambuf_iterator< char >( File ), std::istreambuf_iterator< char >() );
   }
 
+  inline bool WriteWholeFile( const std::string& i_rPath, const VBytes& i_rBytes )
+  {
+    std::ofstream File( i_rPath, std::ios::binary | std::ios::trunc );
+    File.write( reinterpret_cast< const char* >( i_rBytes.data() ), static_cast< std::streamsize >( i_rBytes.size() ) );
+    return File.good();
+  }
+
+  inline bool WriteWholeFile( const std::string& i_rPath, const std::string& i_rText )
+  {
+    return WriteWholeFile( i_rPath, VBytes( i_rText.begin(), i_rText.end() ) );
+  }
+
+  // A fresh temporary folder that goes with everything in it.
+  class VTempFolder
+  {
+  public:
+    VTempFolder() { std::filesystem::create_directories( m_Path ); }
+    ~VTempFolder()
+    {
+      std::error_code Error;
+      std::filesystem::remove_all( m_Path, Error );
+    }
+    VTempFolder( const VTempFolder& ) = delete;
+    VTempFolder& operator=( const VTempFolder& ) = delete;
+
+    const std::string& Path() const { return m_Path; }
+    std::string operator/( const std::string& i_rName ) const { return m_Path + "/" + i_rName; }
+
+  private:
+    std::string m_Path =
+        ( std::filesystem::temp_directory_path() / ( "lumek-test-" + std::to_string( std::random_device()() ) ) )
+            .string();
+  };
+
+  inline VBytes Bytes( const ZOL::IBufferConst& i_rBuffer )
+  {
+    return VBytes( i_rBuffer.GetData(), i_rBuffer.GetData() + i_rBuffer.GetSize() );
+  }
+
+  inline VBytes Bytes( const std::shared_ptr< ZOL::IBuffer >& i_pBuffer )
+  {
+    return i_pBuffer ? Bytes( *i_pBuffer ) : VBytes();
+  }
+
+  // The largest and the mean difference of the bytes of i_rExpected and those at the start of
+  // i_rGot, for decoders that may round their own way.
+  struct VDifference
+  {
+    int Largest = 0;
+    double Mean = 0.0;
+  };
+
+  inline VDifference Difference( const VBytes& i_rExpected, const ZOL::IBufferConst& i_rGot )
+  {
+    VDifference Result;
+    double Sum = 0.0;
+    for( std::size_t i = 0; i < i_rExpected.size() && i < i_rGot.GetSize(); ++i )
+    {
+      const int Difference = std::abs( int( i_rExpected[i] ) - int( i_rGot.GetData()[i] ) );
+      Result.Largest = std::max( Result.Largest, Difference );
+      Sum += Difference;
+    }
+    Result.Mean = i_rExpected.empty() ? 0.0 : Sum / static_cast< double >( i_rExpected.size() );
+    return Result;
+  }
+
+#ifdef LUMEK_SEED_DIR
   // A file of the committed fuzz seeds, by its path below fuzz/seeds.
   inline VBytes Seed( const std::string& i_rName )
   {
     return ReadWholeFile( std::string( LUMEK_SEED_DIR ) + "/" + i_rName );
   }
+#endif
 
   inline ZOL::IVideoFrameInfo FrameInfo( std::int32_t i_Width, std::int32_t i_Height, ZOL::EPixelFormat i_Format )
   {
@@ -39,13 +110,5 @@ namespace LumekTest
     Info.ImageHeight = i_Height;
     Info.PixelFormat = i_Format;
     return Info;
-  }
-
-  // True when a line of the capture, as "LEVEL MESSAGE", holds i_rText.
-  inline bool Logged( const VLogCapture& i_rLog, const std::string& i_rText )
-  {
-    const std::vector< std::string > Lines = i_rLog.Lines();
-    return std::any_of( Lines.begin(), Lines.end(),
-                        [&]( const std::string& i_rLine ) { return i_rLine.find( i_rText ) != std::string::npos; } );
   }
 } // namespace LumekTest

@@ -97,26 +97,16 @@ namespace
     }
   }
 
-  TEST( JPEGParser, DumpsTheHandMadeAndAnFfmpegImage )
+  // The hand-made image, and ffmpeg's 4:2:2 encoding of a 16 x 16 test picture.
+  TEST( JPEGParser, DumpsAsTheGoldenText )
   {
-    EXPECT_EQ( Dump( s_HandMade ), "Type\tStart\tEnd\tLength\tDescription\n"
-                                   "SOI\t0\t2\t2\tStart of image\n"
-                                   "APP0\t2\t20\t18\tApplication specific\n  FourCC: 'JFIF'\n"
-                                   "COM\t20\t29\t9\tComment\n  Text: \"Hi !!\"\n"
-                                   "APP14\t29\t35\t6\tAPP14\n"
-                                   "SOS\t35\t45\t10\tStart of scan\n"
-                                   "RST0\t50\t52\t2\tResync marker\n"
-                                   "EOI\t53\t55\t2\tEnd of image\n" );
-    // ffmpeg's 4:2:2 encoding of a 16 x 16 test picture.
-    EXPECT_EQ( Dump( Seed( "jpeg/yuv422_16x16.jpg" ) ),
-               "Type\tStart\tEnd\tLength\tDescription\n"
-               "SOI\t0\t2\t2\tStart of image\n"
-               "APP0\t2\t20\t18\tApplication specific\n  FourCC: 'JFIF'\n"
-               "DQT\t20\t89\t69\tDefine quantization table\n"
-               "DHT\t89\t202\t113\tDefine Huffman table\n"
-               "SOF0\t202\t221\t19\tStart of frame\n  Type: Nondifferential/Huffman/Baseline DCT\n"
-               "SOS\t221\t235\t14\tStart of scan\n"
-               "EOI\t435\t437\t2\tEnd of image\n" );
+    for( const auto& [Bytes, pGolden] : { std::pair( s_HandMade, "hand_made.txt" ),
+                                          std::pair( Seed( "jpeg/yuv422_16x16.jpg" ), "yuv422_16x16.txt" ) } )
+    {
+      const std::string Golden = std::string( JPEG_GOLDEN_FOLDER ) + "/" + pGolden;
+      const VBytes Expected = ReadWholeFile( Golden );
+      EXPECT_EQ( Dump( Bytes ), std::string( Expected.begin(), Expected.end() ) ) << Golden;
+    }
   }
 
   TEST( JPEGParser, MalformedStreamsAreRefusedWithTheirLine )
@@ -174,11 +164,10 @@ namespace
     tjhandle Handle = tjInitCompress();
     unsigned char* pJPEG = nullptr;
     unsigned long Size = 0;
-    const int Result =
-        tjCompress2( Handle, Pixels.data(), i_Width, 0, i_Height, TJPF_GRAY, &pJPEG, &Size, TJSAMP_GRAY, 90, 0 );
-    const std::string Path = ::testing::TempDir() + "grey_" + std::to_string( i_Width ) + "x" +
-                             std::to_string( i_Height ) + "_" + std::to_string( getpid() ) + ".jpg";
-    std::ofstream( Path, std::ios::binary ).write( reinterpret_cast< const char* >( pJPEG ), Result == 0 ? Size : 0 );
+    if( tjCompress2( Handle, Pixels.data(), i_Width, 0, i_Height, TJPF_GRAY, &pJPEG, &Size, TJSAMP_GRAY, 90, 0 ) != 0 )
+      Size = 0;
+    const std::string Path = ::testing::TempDir() + "grey_" + std::to_string( getpid() ) + ".jpg";
+    EXPECT_TRUE( WriteWholeFile( Path, VBytes( pJPEG, pJPEG + Size ) ) );
     tjFree( pJPEG );
     tjDestroy( Handle );
     return Path;
@@ -254,12 +243,13 @@ namespace
   {
     if( !HaveFfmpeg() )
       GTEST_SKIP() << "no ffmpeg";
-    const VSource Sources[] = {
-        { "YUV420_64x48", "yuvj420p", 64, 48, 1, 1 }, { "YUV420_37x29", "yuvj420p", 37, 29, 1, 1 },
-        { "YUV422_64x48", "yuvj422p", 64, 48, 1, 0 }, { "YUV422_38x30", "yuvj422p", 38, 30, 1, 0 },
-        { "YUV422_35x17", "yuvj422p", 35, 17, 1, 0 }, { "YUV444_40x24", "yuvj444p", 40, 24, 0, 0 },
-        { "Grey_48x32", "gray", 48, 32, 0, 0 },
-    };
+    // Odd sizes, where the last chroma sample serves one pixel, and an even-width 4:2:2 image,
+    // which the packed formats take without a colour conversion.
+    const VSource Sources[] = { { "YUV420_37x29", "yuvj420p", 37, 29, 1, 1 },
+                                { "YUV422_38x30", "yuvj422p", 38, 30, 1, 0 },
+                                { "YUV422_35x17", "yuvj422p", 35, 17, 1, 0 },
+                                { "YUV444_40x24", "yuvj444p", 40, 24, 0, 0 },
+                                { "Grey_48x32", "gray", 48, 32, 0, 0 } };
     // The wish, what any image delivers for it, and what a 4:2:2 image of even width delivers.
     const EPixelFormat Wishes[][3] = {
         { PixelFormat_U8Y8V8Y8, PixelFormat_R8G8B8, PixelFormat_U8Y8V8Y8 },
@@ -286,23 +276,15 @@ namespace
         IVideoFrameInfo Info;
         std::shared_ptr< IBuffer > pOutput;
         ASSERT_TRUE( Read( JPEG, rWish[0], pOutput, &Info ) );
-        EXPECT_EQ( Info.PixelFormat, rWish[bPacked422 ? 2 : 1] );
-        EXPECT_EQ( Info.ImageWidth, rSource.Width );
-        EXPECT_EQ( Info.ImageHeight, rSource.Height );
+        EXPECT_EQ( std::tie( Info.PixelFormat, Info.ImageWidth, Info.ImageHeight ),
+                   std::tie( rWish[bPacked422 ? 2 : 1], rSource.Width, rSource.Height ) );
         ASSERT_TRUE( pOutput );
         const VBytes Want = Expected( rSource, Planes, Info.PixelFormat );
         ASSERT_EQ( Want.size(), pOutput->GetSize() );
         ASSERT_EQ( pOutput->GetSize(), GetVideoFrameSizeInBytes64( Info ) );
-        int Largest = 0;
-        std::uint64_t Sum = 0;
-        for( std::size_t i = 0; i < Want.size(); ++i )
-        {
-          const int Difference = std::abs( int( Want[i] ) - int( pOutput->GetData()[i] ) );
-          Largest = std::max( Largest, Difference );
-          Sum += Difference;
-        }
-        EXPECT_LE( Largest, 10 );
-        EXPECT_LE( double( Sum ) / Want.size(), 1.5 );
+        const VDifference Distance = Difference( Want, *pOutput );
+        EXPECT_LE( Distance.Largest, 10 );
+        EXPECT_LE( Distance.Mean, 1.5 );
       }
     }
   }
@@ -361,8 +343,25 @@ namespace
       const VAllocationWatch Watch;
       EXPECT_FALSE( Read( Bytes, Wish, pOutput ) );
       EXPECT_LT( Watch.Largest(), 1u << 20 );
-      EXPECT_TRUE( Logged( Log, "2 JPEG image of " + std::to_string( Width ) + " x " + std::to_string( Height ) +
-                                    " is too large to decode." ) );
+      EXPECT_EQ( Log.Lines(), std::vector< std::string >{ "2 JPEG image of " + std::to_string( Width ) + " x " +
+                                                          std::to_string( Height ) + " is too large to decode." } );
+    }
+  }
+
+  // A caller whose allocator gives nothing, for the frame or for the planes of the packed path.
+  TEST( JPEGMalformed, AllocatorsThatGiveNothingAreRefusedWithTheirLine )
+  {
+    const VBytes JPEG = Seed( "jpeg/yuv422_16x16.jpg" );
+    for( const bool bFrame : { true, false } )
+    {
+      VLogCapture Log( "JPEGIO" );
+      IVideoFrameInfo Info = FrameInfo( 0, 0, PixelFormat_U8Y8V8Y8 );
+      std::shared_ptr< IBuffer > pOutput;
+      EXPECT_FALSE( JPEGIO::ReadJPEG( JPEG.data(), JPEG.size(), bFrame ? nullptr : MakeFrameAllocator(), nullptr, Info,
+                                      pOutput ) );
+      EXPECT_FALSE( pOutput );
+      EXPECT_EQ( Log.Messages, std::vector< std::string >{ bFrame ? "Output buffer allocation failed."
+                                                                  : "Temporary buffer allocation failed." } );
     }
   }
 } // namespace

@@ -57,7 +57,15 @@ namespace
     EXPECT_EQ( Reader.FindStoredFrameAtOrAfter( i_rCase.Frames ), std::nullopt );
   }
 
-  TEST( MkvFamily, WriterToReaderAndToFfmpeg )
+  // Each test writes its files as one path in a folder of its own.
+  class MkvReader : public ::testing::Test
+  {
+  protected:
+    const VTempFolder Folder;
+    const std::string Path = Folder / "test.mkv";
+  };
+
+  TEST_F( MkvReader, WriterToReaderAndToFfmpeg )
   {
     if( !LumekTest::HaveFfmpeg() )
       GTEST_SKIP() << "ffmpeg is not installed";
@@ -65,7 +73,7 @@ namespace
     const std::string JPEGPath =
         LumekTest::FfmpegFixture( "mkv_frame.jpg", { "-f", "lavfi", "-i", "testsrc=size=16x8:rate=1", "-frames:v", "1",
                                                      "-pix_fmt", "yuvj420p" } );
-    const VBytes JPEG = ReadWholeFile( JPEGPath );
+    const VBytes JPEG = LumekTest::ReadWholeFile( JPEGPath );
     ASSERT_FALSE( JPEG.empty() );
     // The case, and ffmpeg's names of its pixel format and audio codec.
     const std::tuple< VFamilyCase, const char*, const char* > Rows[] = {
@@ -79,7 +87,6 @@ namespace
     for( const auto& [Case, pFfmpegFormat, pAudioCodec] : Rows )
     {
       SCOPED_TRACE( std::string( pFfmpegFormat ) + ( Case.bJPEG ? " JPEG " : " " ) + pAudioCodec );
-      const std::string Path = TempPath( "family.mkv" );
       ASSERT_TRUE( WriteFamilyFile( Path, Case, JPEG ) );
       ExpectReadsBack( Path, Case, JPEG );
 
@@ -105,34 +112,14 @@ namespace
         Expected.insert( Expected.end(), Stored.begin(), Stored.end() );
       }
       EXPECT_EQ( LumekTest::FfmpegDecode( Path, pFfmpegFormat ), Expected );
-      std::remove( Path.c_str() );
     }
-  }
-
-  // The FourCC in a BITMAPINFOHEADER reads as the colour space one does.
-  TEST( MkvReader, VfwFourCCReadsAsUncompressed )
-  {
-    const VFamilyCase Case{ ZOL::PixelFormat_U8Y8V8Y8 };
-    const std::string Path = TempPath( "vfw.mkv" );
-    ASSERT_TRUE(
-        WriteFamilyFile( Path, Case, {}, []( VDescription& io_rD ) { io_rD.Video.CodecID = "V_MS/VFW/FOURCC"; } ) );
-    MkvIO::VMkvReader Reader;
-    ASSERT_TRUE( Reader.Open( Path ) );
-    EXPECT_EQ( Reader.GetVideoPayload(), ZOL::VideoPayload_Uncompressed );
-    EXPECT_EQ( Reader.GetVideoFrameInfo().PixelFormat, ZOL::PixelFormat_U8Y8V8Y8 );
-    std::shared_ptr< ZOL::IBuffer > pVideo;
-    ZOL::IAudioBuffers Audio;
-    ASSERT_TRUE( Reader.ReadFrameData( 2, pVideo, Audio, true, true ) );
-    EXPECT_EQ( Bytes( pVideo ), RawFrame( Case, 2 ) );
-    std::remove( Path.c_str() );
   }
 
   // Reading frames must not leave their blocks behind: the heap after thousands of frames is
   // what it was after the first hundred.
-  TEST( MkvReader, MemoryDoesNotGrowWithFramesRead )
+  TEST_F( MkvReader, MemoryDoesNotGrowWithFramesRead )
   {
     const VFamilyCase Case{ ZOL::PixelFormat_Luminance8, ZOL::AudioSampleFormat_Int16, false, 8, 4, 3000 };
-    const std::string Path = TempPath( "long.mkv" );
     ASSERT_TRUE( WriteFamilyFile( Path, Case ) );
     MkvIO::VMkvReader Reader;
     ASSERT_TRUE( Reader.Open( Path ) );
@@ -151,10 +138,9 @@ namespace
     // The first read of a frame drops what opening kept of its blocks, so the heap may shrink.
     EXPECT_LT( static_cast< double >( HeapAtEnd ), static_cast< double >( HeapAfterWarmUp ) + 16 * 1024 )
         << "after warm-up " << HeapAfterWarmUp << ", at end " << HeapAtEnd;
-    std::remove( Path.c_str() );
   }
 
-  TEST( MkvReader, BrokenFilesAreRefusedWithTheirLine )
+  TEST_F( MkvReader, BrokenFilesAreRefusedWithTheirLine )
   {
     const std::pair< std::function< void( VDescription& ) >, const char* > Cases[] = {
         { []( VDescription& io_rD ) { io_rD.bUnknownSegmentSize = true; }, "KaxSegment missing or not a finite size." },
@@ -168,7 +154,6 @@ namespace
     };
     for( const auto& [Edit, pMessage] : Cases )
     {
-      const std::string Path = TempPath( "refused.mkv" );
       ASSERT_TRUE( WriteFamilyFile( Path, SmallCase(), {}, Edit ) );
       VLogCapture Log( "MkvReader" );
       MkvIO::VMkvReader Reader;
@@ -177,21 +162,18 @@ namespace
       // Refused means closed and empty.
       EXPECT_EQ( Reader.GetFrameCount(), 0u );
       EXPECT_EQ( Reader.GetVideoPayload(), ZOL::VideoPayload_None );
-      std::remove( Path.c_str() );
     }
 
     VLogCapture Log( "MkvReader" );
     MkvIO::VMkvReader Reader;
-    EXPECT_FALSE( Reader.Open( TempPath( "absent.mkv" ) ) );
+    EXPECT_FALSE( Reader.Open( Folder / "absent.mkv" ) );
     EXPECT_TRUE( Log.Has( "File could not be opened." ) );
-    const std::string Text = TempPath( "text.mkv" );
-    std::ofstream( Text ) << std::string( 300, 'x' );
-    EXPECT_FALSE( Reader.Open( Text ) );
+    ASSERT_TRUE( WriteWholeFile( Path, std::string( 300, 'x' ) ) );
+    EXPECT_FALSE( Reader.Open( Path ) );
     EXPECT_TRUE( Log.Has( "EbmlHead missing." ) );
-    std::remove( Text.c_str() );
   }
 
-  TEST( MkvReader, OddClustersReadWhatIsThere )
+  TEST_F( MkvReader, OddClustersReadWhatIsThere )
   {
     const VFamilyCase Case = SmallCase();
     const VBytes Video = RawFrame( Case, 1 ), AudioA( 8, 0x11 ), AudioB( 12, 0x22 );
@@ -212,7 +194,6 @@ namespace
     for( const VCase& rCase : Cases )
     {
       SCOPED_TRACE( rCase.Name );
-      const std::string Path = TempPath( "odd.mkv" );
       ASSERT_TRUE( WriteFamilyFile( Path, Case, {}, {},
                                     [&]( int i_Frame )
                                     {
@@ -238,14 +219,13 @@ namespace
       // The frames around it are untouched.
       ASSERT_TRUE( Reader.ReadFrameData( 2, pVideo, Audio, true, false ) );
       EXPECT_EQ( Bytes( pVideo ), RawFrame( Case, 2 ) );
-      std::remove( Path.c_str() );
     }
   }
 
   // Tags change the records through SetValueFromString; the period comes from Duration only
   // when nothing set the timing. An audio depth the family has no format for leaves the audio
   // out.
-  TEST( MkvReader, TagsAndTrackFieldsDecideTheRecords )
+  TEST_F( MkvReader, TagsAndTrackFieldsDecideTheRecords )
   {
     const std::string Aspect = "Lumek.Internal.VideoFrameInfo.PixelAspectRatio";
     // The tags, and the frame rate and pixel aspect ratio they give.
@@ -262,7 +242,6 @@ namespace
     for( const auto& [Tags, FrameRate, PixelAspectRatio] : Cases )
     {
       SCOPED_TRACE( ::testing::PrintToString( Tags ) );
-      const std::string Path = TempPath( "tags.mkv" );
       ASSERT_TRUE( WriteFamilyFile( Path, Case, {}, [&]( VDescription& io_rD ) { io_rD.Tags = Tags; } ) );
       MkvIO::VMkvReader Reader;
       ASSERT_TRUE( Reader.Open( Path ) );
@@ -271,10 +250,8 @@ namespace
       EXPECT_EQ( Reader.GetVideoFrameInfo().PixelFormat, ZOL::PixelFormat_R8G8B8u8 );
       std::string Unknown;
       EXPECT_FALSE( Reader.GetInternalAttributes().GetValueAsString( "Unknown", Unknown ) );
-      std::remove( Path.c_str() );
     }
 
-    const std::string Path = TempPath( "depth8.mkv" );
     ASSERT_TRUE( WriteFamilyFile( Path, SmallCase(), {},
                                   []( VDescription& io_rD ) { io_rD.Audio.BitDepth = 8, io_rD.Tags = {}; } ) );
     VLogCapture Log( "MkvReader" );
@@ -282,16 +259,13 @@ namespace
     ASSERT_TRUE( Reader.Open( Path ) );
     EXPECT_EQ( Reader.GetAudioPayload(), ZOL::AudioPayload_None );
     EXPECT_TRUE( Log.Contains( "Unsupported sample format 8" ) );
-    std::remove( Path.c_str() );
   }
 
   // Cuts at every point and flips at every byte: no crash, no hang, and whatever opens reads.
-  TEST( MkvReader, SurvivesEveryCutAndFlip )
+  TEST_F( MkvReader, SurvivesEveryCutAndFlip )
   {
-    const std::string Source = TempPath( "source.mkv" );
-    ASSERT_TRUE( WriteFamilyFile( Source, SmallCase() ) );
-    const VBytes Original = ReadWholeFile( Source );
-    std::remove( Source.c_str() );
+    ASSERT_TRUE( WriteFamilyFile( Path, SmallCase() ) );
+    const VBytes Original = ReadWholeFile( Path );
     ASSERT_GT( Original.size(), 100u );
     const VLogCapture Quiet;
     for( std::size_t Position = 0; Position < Original.size(); ++Position )

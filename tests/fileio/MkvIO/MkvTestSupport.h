@@ -4,18 +4,13 @@
 // writer from frames whose every byte is known.
 
 #include "fileio/MkvIO/VMkvWriter.h"
-#include "videointerface/IBuffer.h"
-#include "videointerface/IVideoFrameInfo.h"
+#include "tests/fileio/ImageDecoders/ImageTestSupport.h"
 
-#include <boost/filesystem.hpp>
-
-#include <fstream>
 #include <functional>
-#include <iterator>
 
 namespace MkvTest
 {
-  using VBytes = std::vector< std::uint8_t >;
+  using namespace LumekTest;
 
   struct VFamilyCase
   {
@@ -53,11 +48,7 @@ namespace MkvTest
   // Frame i of a raw case: bytes that differ at every position and in every frame.
   inline VBytes RawFrame( const VFamilyCase& i_rCase, int i_Frame )
   {
-    ZOL::IVideoFrameInfo Info;
-    Info.ImageWidth = i_rCase.Width;
-    Info.ImageHeight = i_rCase.Height;
-    Info.PixelFormat = i_rCase.Format;
-    VBytes Bytes( ZOL::GetVideoFrameSizeInBytes64( Info ) );
+    VBytes Bytes( ZOL::GetVideoFrameSizeInBytes64( FrameInfo( i_rCase.Width, i_rCase.Height, i_rCase.Format ) ) );
     for( std::size_t i = 0; i < Bytes.size(); ++i )
       Bytes[i] = static_cast< std::uint8_t >( i * 7 + i / 5 + i_Frame * 29 );
     return Bytes;
@@ -81,10 +72,7 @@ namespace MkvTest
                                const std::function< void( MkvIO::VMkvDescription& ) >& i_rEdit = {},
                                const std::function< std::vector< MkvIO::VMkvBlock >( int ) >& i_rClusters = {} )
   {
-    ZOL::IVideoFrameInfo Video;
-    Video.ImageWidth = i_rCase.Width;
-    Video.ImageHeight = i_rCase.Height;
-    Video.PixelFormat = i_rCase.Format;
+    ZOL::IVideoFrameInfo Video = FrameInfo( i_rCase.Width, i_rCase.Height, i_rCase.Format );
     Video.PixelAspectRatio = 1.0;
     ZOL::IVideoSettings Settings;
     Settings.Saturation = 0.75f;
@@ -104,24 +92,5 @@ namespace MkvTest
                                               AudioBlock( i_rCase, Frame ) ) ) )
         return false;
     return Writer.Close();
-  }
-
-  inline VBytes Bytes( const std::shared_ptr< ZOL::IBuffer >& i_pBuffer )
-  {
-    return i_pBuffer ? VBytes( i_pBuffer->GetData(), i_pBuffer->GetData() + i_pBuffer->GetSize() ) : VBytes();
-  }
-
-  inline VBytes ReadWholeFile( const std::string& i_rPath )
-  {
-    std::ifstream File( i_rPath, std::ios::binary );
-    return VBytes( std::istreambuf_iterator< char >( File ), std::istreambuf_iterator< char >() );
-  }
-
-  // A fresh path in the tests' temporary folder.
-  inline std::string TempPath( const std::string& i_rName )
-  {
-    const boost::filesystem::path Folder = boost::filesystem::temp_directory_path() / "lumek-mkv-tests";
-    boost::filesystem::create_directories( Folder );
-    return ( Folder / boost::filesystem::unique_path( "%%%%%%%%-" + i_rName ) ).string();
   }
 } // namespace MkvTest

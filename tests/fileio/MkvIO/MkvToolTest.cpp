@@ -25,7 +25,8 @@ namespace
   TEST( MkvTool, ConvertToLvidKeepsPixelsAudioAndTimecode )
   {
     const VFamilyCase Case{ ZOL::PixelFormat_U8Y8V8Y8, ZOL::AudioSampleFormat_Int16 };
-    const std::string Input = TempPath( "convert.mkv" ), Output = TempPath( "converted.lvid" );
+    const VTempFolder Folder;
+    const std::string Input = Folder / "convert.mkv", Output = Folder / "converted.lvid";
     ASSERT_TRUE( WriteFamilyFile( Input, Case ) );
     ASSERT_EQ( RunTool( "convert", Input, Output ), 0 );
     LumekVideo::VReader Reader;
@@ -34,9 +35,8 @@ namespace
     EXPECT_EQ( Reader.GetVideoFrameInfo().PixelFormat, Case.Format );
     EXPECT_EQ( Reader.GetVideoTiming().FramePeriodInTicks, Timing().FramePeriodInTicks );
     const ZOL::ITimecode Expected = StartTimecode(), Got = Reader.GetTimecode();
-    EXPECT_EQ(
-        std::make_tuple( Got.Standards, Got.Hours, Got.Minutes, Got.Seconds, Got.Frames ),
-        std::make_tuple( Expected.Standards, Expected.Hours, Expected.Minutes, Expected.Seconds, Expected.Frames ) );
+    EXPECT_EQ( std::tie( Got.Standards, Got.Hours, Got.Minutes, Got.Seconds, Got.Frames ),
+               std::tie( Expected.Standards, Expected.Hours, Expected.Minutes, Expected.Seconds, Expected.Frames ) );
     for( int Frame = 0; Frame < Case.Frames; ++Frame )
     {
       std::shared_ptr< ZOL::IBuffer > pVideo;
@@ -46,23 +46,21 @@ namespace
       ASSERT_EQ( Audio.size(), 1u ) << Frame;
       EXPECT_EQ( Bytes( Audio[0] ), AudioBlock( Case, Frame ) ) << Frame;
     }
-    std::remove( Input.c_str() );
-    std::remove( Output.c_str() );
   }
 
   TEST( MkvTool, MakeSampleWritesMatroska )
   {
-    const std::string Output = TempPath( "sample.mkv" );
+    const VTempFolder Folder;
+    const std::string Output = Folder / "sample.mkv";
     ASSERT_EQ( RunTool( "make-sample --width 32 --height 16 --frames 4 --fps 25", Output ), 0 );
     MkvIO::VMkvReader Reader;
     ASSERT_TRUE( Reader.Open( Output ) );
     EXPECT_EQ( Reader.GetFrameCount(), 4u );
-    EXPECT_EQ( Reader.GetVideoFrameInfo().PixelFormat, ZOL::PixelFormat_U8Y8V8Y8 );
-    EXPECT_EQ( Reader.GetVideoFrameInfo().ImageWidth, 32 );
+    EXPECT_EQ( std::tie( Reader.GetVideoFrameInfo().PixelFormat, Reader.GetVideoFrameInfo().ImageWidth ),
+               std::tuple( ZOL::PixelFormat_U8Y8V8Y8, 32 ) );
     EXPECT_DOUBLE_EQ( Reader.GetVideoTiming().GetFrameRate(), 25.0 );
     EXPECT_EQ( Reader.GetAudioFrameInfo().SampleFormat, ZOL::AudioSampleFormat_Int16 );
     // A Bayer sample has no Matroska form: refused, not silently changed.
     EXPECT_NE( RunTool( "make-sample --format BayerGB8 --frames 2", Output ), 0 );
-    std::remove( Output.c_str() );
   }
 } // namespace
