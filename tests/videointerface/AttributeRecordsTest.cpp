@@ -14,59 +14,51 @@ using LumekTest::Lens;
 
 namespace
 {
-  // Half-pixel offsets, an inverted interlaced frame of the largest width.
-  IVideoFrameInfo OddFrame()
-  {
-    return { 3,
-             65535,
-             2,
-             255,
-             0x7FFFFFFF,
-             1,
-             PixelFormat_BayerGB8,
-             IVideoFrameInfo::Flag_Inverted,
-             0.9,
-             InterlacedFormat_InterlacedFrameOddOlder };
-  }
-
-  // A recording's header: one of every record, with the oddest fields, written by the writers.
-  struct VHeader
-  {
-    const IVideoFrameInfo Frame = OddFrame();
-    const IAudioFrameInfo Audio{ AudioSampleFormat_Int24, 192000, 64 };
-    const IVideoTiming Timing{ 1080000000u, 9000000u, -123456789012345 };
-    const IVideoSettings Settings{ 0.25f, 2.2f };
-    const ITimecode Timecode{ TimecodeStandard_29_97_DF, 23, 59, 58, 29, 0xDEADBEEF, -3, 4504499, 1126125 };
-    const VLensDistortionCalibration Lens = LumekTest::Lens( RadialModel_Lumek2Parameter, { -0.2, 0.05 }, 960.5, 7 );
-    const VCameraHardware Camera{ "urn:lumek:camera:0042", "SN-12", "Vantage", "Vantage V16", 4096, 3072, 1.25 };
-    IVideoAttributes Store;
-
-    VHeader()
-    {
-      EXPECT_TRUE( WriteVideoFrameInfo( Store, Frame ) && WriteAudioFrameInfo( Store, "A.", Audio ) &&
-                   WriteVideoTiming( Store, Timing ) && WriteVideoSettings( Store, "P.", Settings ) &&
-                   WriteTimecode( Store, Timecode ) && WriteLensDistortionCalibration( Store, "Q.", Lens ) &&
-                   WriteCameraHardware( Store, Camera ) );
-    }
-  };
-
-  // Which of the header's records read from a store, in the order of VHeader's fields.
-  std::vector< bool > RecordsRead( const IVideoAttributes& i_rStore )
+  // One of every record a recording's header holds, the audio, settings and lens under prefixes.
+  struct VRecords
   {
     IVideoFrameInfo Frame;
     IAudioFrameInfo Audio;
     IVideoTiming Timing;
     IVideoSettings Settings;
     ITimecode Timecode;
-    VLensDistortionCalibration Calibration;
+    VLensDistortionCalibration Lens;
     VCameraHardware Camera;
-    return { ReadVideoFrameInfo( i_rStore, i_rStore, Frame ),
-             ReadAudioFrameInfo( i_rStore, "A.", Audio ),
-             ReadVideoTiming( i_rStore, Timing ),
-             ReadVideoSettings( i_rStore, "P.", Settings ),
-             ReadTimecode( i_rStore, Timecode ),
-             ReadLensDistortionCalibration( i_rStore, "Q.", Calibration ),
-             ReadCameraHardware( i_rStore, Camera ) };
+
+    bool WriteTo( IVideoAttributes& o_rStore ) const
+    {
+      return WriteVideoFrameInfo( o_rStore, Frame ) && WriteAudioFrameInfo( o_rStore, "A.", Audio ) &&
+             WriteVideoTiming( o_rStore, Timing ) && WriteVideoSettings( o_rStore, "P.", Settings ) &&
+             WriteTimecode( o_rStore, Timecode ) && WriteLensDistortionCalibration( o_rStore, "Q.", Lens ) &&
+             WriteCameraHardware( o_rStore, Camera );
+    }
+    // Which records read, in the order of the fields.
+    std::vector< bool > ReadFrom( const IVideoAttributes& i_rStore )
+    {
+      return { ReadVideoFrameInfo( i_rStore, i_rStore, Frame ),
+               ReadAudioFrameInfo( i_rStore, "A.", Audio ),
+               ReadVideoTiming( i_rStore, Timing ),
+               ReadVideoSettings( i_rStore, "P.", Settings ),
+               ReadTimecode( i_rStore, Timecode ),
+               ReadLensDistortionCalibration( i_rStore, "Q.", Lens ),
+               ReadCameraHardware( i_rStore, Camera ) };
+    }
+  };
+
+  // The oddest fields: half-pixel offsets, an inverted interlaced frame of the largest width.
+  IVideoAttributes OddHeader( VRecords& o_rWritten )
+  {
+    o_rWritten = { { 3, 65535, 2, 255, 0x7FFFFFFF, 1, PixelFormat_BayerGB8, IVideoFrameInfo::Flag_Inverted, 0.9,
+                     InterlacedFormat_InterlacedFrameOddOlder },
+                   { AudioSampleFormat_Int24, 192000, 64 },
+                   { 1080000000u, 9000000u, -123456789012345 },
+                   { 0.25f, 2.2f },
+                   { TimecodeStandard_29_97_DF, 23, 59, 58, 29, 0xDEADBEEF, -3, 4504499, 1126125 },
+                   Lens( RadialModel_Lumek2Parameter, { -0.2, 0.05 }, 960.5, 7 ),
+                   { "urn:lumek:camera:0042", "SN-12", "Vantage", "Vantage V16", 4096, 3072, 1.25 } };
+    IVideoAttributes Store;
+    EXPECT_TRUE( o_rWritten.WriteTo( Store ) );
+    return Store;
   }
 
   // The keys of a written 8x8 BayerRG8 frame.
@@ -88,45 +80,39 @@ namespace
 
 TEST( AttributeRecords, EveryRecordReadsBackAsWritten )
 {
-  const VHeader Header;
-  IVideoFrameInfo Frame = LumekTest::Frame( 9, 9, PixelFormat_R5G6B5 );
-  Frame.Flags = ~0u; // both flags are decided by the read
-  IAudioFrameInfo Audio;
-  IVideoTiming Timing;
-  IVideoSettings Settings;
-  ITimecode Timecode;
-  VLensDistortionCalibration Calibration;
-  Calibration.RadialDistortionParameters = { 7, 7, 7, 7 };
-  VCameraHardware Camera;
-  const IVideoAttributes& rStore = Header.Store;
-  ASSERT_TRUE( ReadVideoFrameInfo( rStore, rStore, Frame ) && ReadAudioFrameInfo( rStore, "A.", Audio ) &&
-               ReadVideoTiming( rStore, Timing ) && ReadVideoSettings( rStore, "P.", Settings ) &&
-               ReadTimecode( rStore, Timecode ) && ReadLensDistortionCalibration( rStore, "Q.", Calibration ) &&
-               ReadCameraHardware( rStore, Camera ) );
-  EXPECT_EQ( Header.Frame, Frame );
-  EXPECT_EQ( Header.Audio, Audio );
-  EXPECT_TRUE( Header.Timing == Timing );
-  EXPECT_EQ( Header.Settings, Settings );
-  EXPECT_EQ( Header.Timecode, Timecode );
-  EXPECT_EQ( Header.Lens, Calibration );
-  EXPECT_EQ( Header.Camera, Camera );
+  VRecords Written, Read;
+  const IVideoAttributes Store = OddHeader( Written );
+  Read.Frame.Flags = ~0u; // both flags are decided by the read
+  Read.Lens.RadialDistortionParameters = { 7, 7, 7, 7 };
+  ASSERT_EQ( std::vector< bool >( 7, true ), Read.ReadFrom( Store ) );
+  EXPECT_EQ( Written.Frame, Read.Frame );
+  EXPECT_EQ( Written.Audio, Read.Audio );
+  EXPECT_TRUE( Written.Timing == Read.Timing );
+  EXPECT_EQ( Written.Settings, Read.Settings );
+  EXPECT_EQ( Written.Timecode, Read.Timecode );
+  EXPECT_EQ( Written.Lens, Read.Lens );
+  EXPECT_EQ( Written.Camera, Read.Camera );
 
-  // A missing start offset reads as zero, not as it was; a missing setting leaves the other read.
-  IVideoAttributes Partial = Header.Store;
-  Partial.Remove( "StartOffsetInTicks" );
-  Partial.Remove( "P.Saturation" );
-  Settings = IVideoSettings();
-  EXPECT_TRUE( ReadVideoTiming( Partial, Timing ) && !ReadVideoSettings( Partial, "P.", Settings ) );
-  EXPECT_EQ( 0, Timing.StartOffsetInTicks );
-  EXPECT_EQ( ( IVideoSettings{ 1.0f, 2.2f } ), Settings );
+  // Missing optional keys read as their defaults, not as they were; a missing setting leaves the
+  // other read.
+  IVideoAttributes Partial = Store;
+  for( const char* pKey : { "StartOffsetInTicks", "P.Saturation", "VideoFrameInfo.SensorPixelsPerImagePixelX",
+                            "VideoFrameInfo.InterlacedFormat" } )
+    Partial.Remove( pKey );
+  Read.Settings = IVideoSettings();
+  EXPECT_EQ( ( std::vector< bool >{ true, true, true, false, true, true, true } ), Read.ReadFrom( Partial ) );
+  EXPECT_EQ( 0, Read.Timing.StartOffsetInTicks );
+  EXPECT_EQ( ( IVideoSettings{ 1.0f, 2.2f } ), Read.Settings );
+  EXPECT_EQ( 1, Read.Frame.SensorPixelsPerImagePixelX );
+  EXPECT_EQ( InterlacedFormat_Unspecified, Read.Frame.InterlacedFormat );
 }
 
 // Every key of the header removed in turn: a required one fails its own record's read and no
 // other; an optional one fails nothing.
 TEST( AttributeRecords, EachRequiredKeyFailsItsOwnRecordAlone )
 {
-  const VHeader Header;
-  ASSERT_EQ( std::vector< bool >( 7, true ), RecordsRead( Header.Store ) );
+  VRecords Written;
+  const IVideoAttributes Store = OddHeader( Written );
   const std::set< std::string > Optional = { "VideoFrameInfo.ImageX",
                                              "VideoFrameInfo.ImageY",
                                              "VideoFrameInfo.TwiceOffsetX",
@@ -139,22 +125,17 @@ TEST( AttributeRecords, EachRequiredKeyFailsItsOwnRecordAlone )
   // The record a key belongs to, by its prefix; the timing's keys have none.
   const char* const Prefixes[] = { "VideoFrameInfo.", "A.", "", "P.", "Timecode.", "Q.", "CameraHardware." };
   std::vector< std::string > Keys;
-  Header.Store.GetKeys( Keys );
+  Store.GetKeys( Keys );
   for( const std::string& rKey : Keys )
   {
     SCOPED_TRACE( rKey );
     std::vector< bool > Expected( 7, true );
-    if( Optional.count( rKey ) == 0 )
-    {
-      std::size_t Owner = 2;
-      for( std::size_t i = 0; i < 7; ++i )
-        if( i != 2 && rKey.rfind( Prefixes[i], 0 ) == 0 )
-          Owner = i;
-      Expected[Owner] = false;
-    }
-    IVideoAttributes Partial = Header.Store;
+    for( std::size_t i = 0; i < 7 && Optional.count( rKey ) == 0; ++i )
+      if( rKey.rfind( Prefixes[i], 0 ) == 0 && ( i != 2 || rKey.find( '.' ) == std::string::npos ) )
+        Expected[i] = false;
+    IVideoAttributes Partial = Store;
     ASSERT_TRUE( Partial.Remove( rKey ) );
-    EXPECT_EQ( Expected, RecordsRead( Partial ) );
+    EXPECT_EQ( Expected, VRecords().ReadFrom( Partial ) );
   }
 }
 
@@ -214,20 +195,10 @@ TEST( FrameInfo, TwiceOffsetWinsOverTheWholeOffset )
   }
 }
 
-TEST( FrameInfo, OptionalKeysTakeTheirDefaultsAndUnknownTextsKeepTheFormat )
+// An unknown name keeps the format the caller had, and unknown interlacing reads as unspecified.
+TEST( FrameInfo, UnknownTextsKeepTheFormatAndASizeBeyondSignedFails )
 {
-  IVideoAttributes Store;
-  ASSERT_TRUE( WriteVideoFrameInfo(
-      Store, { 0, 0, 4, 1, 8, 8, PixelFormat_BayerRG8, 0, 1.0, InterlacedFormat_NotInterlaced } ) );
-  Store.Remove( "VideoFrameInfo.SensorPixelsPerImagePixelX" );
-  Store.Remove( "VideoFrameInfo.InterlacedFormat" );
-  IVideoFrameInfo Info;
-  Info.SensorPixelsPerImagePixelX = 9;
-  Info.InterlacedFormat = InterlacedFormat_InterlacedFrameEvenOlder;
-  ASSERT_TRUE( ReadVideoFrameInfo( Store, Store, Info ) );
-  EXPECT_EQ( 1, Info.SensorPixelsPerImagePixelX );
-  EXPECT_EQ( InterlacedFormat_Unspecified, Info.InterlacedFormat );
-
+  IVideoAttributes Store = FrameKeys();
   Store.Set( "VideoFrameInfo.PixelFormat", "bayerGB8" );
   Store.Set( "VideoFrameInfo.InterlacedFormat", "Interlaced" );
   IVideoFrameInfo Fresh;
@@ -255,11 +226,7 @@ TEST( FrameInfo, ConversionDistortionFlagFollowsTheHistory )
   } Cases[] = {
       { "history with a lens", { RecordWithLens( { 0.0, -0.2 } ) }, false, false, true },
       { "history with a zero lens", { RecordWithLens( { 0.0, 0.0 } ) }, false, false, false },
-      { "lens in the later record",
-        { RecordWithLens( { 0, 0 } ), RecordWithLens( { 0, 0, 1e-9 } ) },
-        false,
-        false,
-        true },
+      { "later lens", { RecordWithLens( { 0, 0 } ), RecordWithLens( { 0, 0, 1e-9 } ) }, false, false, true },
       { "recording has its own lens", { RecordWithLens( { 0.1, 0.2 } ) }, true, false, false },
       { "lens only behind a gap", { RecordWithLens( { 0, 0 } ), RecordWithLens( { 0.5, 0 } ) }, false, true, false } };
   const IVideoAttributes Keys = FrameKeys();
