@@ -10,13 +10,11 @@
 #include "app/Style/AppStyle.h"
 
 #include <QApplication>
-#include <QImage>
 #include <QLineEdit>
 #include <QSignalSpy>
 #include <QStyleOptionSpinBox>
 #include <QTest>
 #include <QWheelEvent>
-#include <QtTest/qtestspontaneevent.h>
 
 #include <gtest/gtest.h>
 
@@ -29,24 +27,6 @@ using namespace LumekVideoViewer;
 
 namespace
 {
-  // Whether anything was painted in column x (or its right neighbour, for a mark at a fractional
-  // position) at row y.
-  bool InkAt( const QImage& i_rImage, float i_X, int i_Y, QRgb i_Background )
-  {
-    const int x = static_cast< int >( std::floor( i_X ) );
-    for( int Column : { x, x + 1 } )
-      if( Column >= 0 && Column < i_rImage.width() && i_rImage.pixel( Column, i_Y ) != i_Background )
-        return true;
-    return false;
-  }
-
-  // The application's sheet for a row that asks for it, and none after it.
-  struct VStyleSheetFor
-  {
-    explicit VStyleSheetFor( bool i_bApply ) { EXPECT_TRUE( !i_bApply || ApplyStyleSheet() ); }
-    ~VStyleSheetFor() { qApp->setStyleSheet( QString() ); }
-  };
-
   // A gamma-like editor: 0 to 4 in hundredths.
   std::unique_ptr< VEditSlider > MakeEditor( unsigned i_Precision = 2 )
   {
@@ -54,6 +34,17 @@ namespace
         0.0f, 4.0f, i_Precision, []( float i_Value ) { return static_cast< int >( std::lround( i_Value * 100.0f ) ); },
         []( int i_Position ) { return static_cast< float >( i_Position ) / 100.0f; } );
   }
+
+  // The frame box, with where the style puts its arrows under whatever sheet is in force.
+  struct VProbeBox : VClickSpinBox
+  {
+    QPoint ArrowCentre( QStyle::SubControl i_Arrow ) const
+    {
+      QStyleOptionSpinBox Option;
+      initStyleOption( &Option );
+      return style()->subControlRect( QStyle::CC_SpinBox, &Option, i_Arrow, this ).center();
+    }
+  };
 } // namespace
 
 // Worked by hand from the 1-2-5 ladder: the step is the round number of frames that spans 50 to
@@ -77,14 +68,12 @@ TEST( TickSteps, RoundStepForTheDensity )
   {
     const double FramesPerPixel = std::pow( 10.0, k / 100.0 );
     const VTickSteps Steps = ComputeTickSteps( FramesPerPixel );
-    if( Steps.Major == 1 )
-      continue;
     const double Pixels = Steps.Major / FramesPerPixel;
-    EXPECT_TRUE( Pixels >= 50.0 && Pixels <= 125.0 ) << FramesPerPixel;
-    // A round number: 1, 2 or 5 times a power of ten.
     int Mantissa = Steps.Major;
     while( Mantissa % 10 == 0 )
       Mantissa /= 10;
+    // A round number (1, 2 or 5 times a power of ten) spanning 50 to 125 pixels.
+    EXPECT_TRUE( Steps.Major == 1 || ( Pixels >= 50.0 && Pixels <= 125.0 ) ) << FramesPerPixel;
     EXPECT_TRUE( Mantissa == 1 || Mantissa == 2 || Mantissa == 5 ) << Steps.Major;
     EXPECT_EQ( Steps.Minor, Steps.Major > 10 ? Steps.Major / 10 : 1 );
   }
@@ -92,44 +81,52 @@ TEST( TickSteps, RoundStepForTheDensity )
 
 // The marks in the picture sit where frames fall along the handle's travel, computed here from
 // the groove and handle the style reports: long marks at numbered frames, short ones between.
+// A single frame once made the paint divide by a zero range, and Qt complained.
 TEST( LabelSlider, PaintsMarksWhereTheFramesAre )
 {
-  // The no-file state, a long file, few frames, two frames, an odd width.
-  const std::pair< int, int > Rows[] = { { 100, 520 }, { 20000, 800 }, { 7, 300 }, { 1, 200 }, { 1234, 613 } };
+  // The no-file state, a long file, few frames, two frames, an odd width, a single frame.
+  const std::pair< int, int > Rows[] = { { 100, 520 }, { 20000, 800 }, { 7, 300 },
+                                         { 1, 200 },   { 1234, 613 },  { 0, 300 } };
   for( const auto& [Maximum, Width] : Rows )
   {
     SCOPED_TRACE( Maximum );
+    const AppTest::VQtMessages Messages;
     VLabelSlider Slider( Qt::Horizontal );
     Slider.setRange( 0, Maximum );
     Slider.resize( Width, 40 );
     const QImage Image = Slider.grab().toImage();
-    const QRect Groove = Slider.GrooveRect();
-    const QRect Handle = Slider.HandleRect();
-    const QRgb Background = Image.pixel( 0, 0 );
-
-    const int Top = Slider.contentsRect().top();
-    const int MinorTop = Groove.y() - 2;
-    const int MiddleRow = ( MinorTop + MinorTop + Groove.height() ) / 2;
-    ASSERT_LT( Top + 6, MinorTop );
-
-    const auto Steps = ComputeTickSteps( double( Maximum ) / Groove.width() );
+    EXPECT_EQ( Messages.Text(), "" );
+    const QRect Groove = Slider.GrooveRect(), Handle = Slider.HandleRect();
     EXPECT_DOUBLE_EQ( Slider.GetFramesPerPixel(), double( float( Maximum ) / float( Groove.width() ) ) );
+    if( Maximum == 0 )
+      continue;
+
+    // Whether anything was painted at row y in column x or its right neighbour, for a mark at a
+    // fractional position.
+    auto InkAt = [&]( float i_X, int i_Y )
+    {
+      const int x = static_cast< int >( std::floor( i_X ) );
+      return Image.pixel( x, i_Y ) != Image.pixel( 0, 0 ) ||
+             ( x + 1 < Image.width() && Image.pixel( x + 1, i_Y ) != Image.pixel( 0, 0 ) );
+    };
+    const int Top = Slider.contentsRect().top() + 6;
+    const int MiddleRow = Groove.y() - 2 + Groove.height() / 2;
+    ASSERT_LT( Top, Groove.y() - 2 );
+    const auto Steps = ComputeTickSteps( double( Maximum ) / Groove.width() );
     const float Travel = float( Groove.width() - Handle.width() );
     auto PositionOf = [&]( int i_Frame ) { return i_Frame * Travel / Maximum + float( Handle.width() / 2 ); };
-
     int Checked = 0;
     for( int Frame = 0; Frame <= Maximum; Frame += Steps.Minor )
     {
-      const float X = PositionOf( Frame );
+      const float X = PositionOf( Frame ), Next = PositionOf( Frame + Steps.Minor );
       if( X >= Handle.left() - 1 && X <= Handle.right() + 1 )
         continue;
-      EXPECT_TRUE( InkAt( Image, X, MiddleRow, Background ) ) << "frame " << Frame;
-      EXPECT_EQ( InkAt( Image, X, Top + 6, Background ), Frame % Steps.Major == 0 ) << "frame " << Frame;
+      EXPECT_TRUE( InkAt( X, MiddleRow ) ) << "frame " << Frame;
+      EXPECT_EQ( InkAt( X, Top ), Frame % Steps.Major == 0 ) << "frame " << Frame;
       // Nothing between two marks that are far enough apart to have a gap.
-      const float Next = PositionOf( Frame + Steps.Minor );
       if( Frame + Steps.Minor <= Maximum && Next - X >= 5.0f )
       {
-        EXPECT_FALSE( InkAt( Image, ( X + Next ) / 2.0f, MiddleRow, Background ) ) << "after frame " << Frame;
+        EXPECT_FALSE( InkAt( ( X + Next ) / 2.0f, MiddleRow ) ) << "after frame " << Frame;
       }
       ++Checked;
     }
@@ -137,60 +134,33 @@ TEST( LabelSlider, PaintsMarksWhereTheFramesAre )
   }
 }
 
-// A file of one frame once made the paint divide by a zero range, and Qt complained.
-TEST( LabelSlider, SingleFrameFilePaintsWithoutComplaint )
+// The slider declines the wheel, so that Qt hands a turn over the bar on to the window, which
+// steps the frames.
+TEST( LabelSlider, DeclinesTheWheel )
 {
-  const AppTest::VQtMessages Messages;
   VLabelSlider Slider( Qt::Horizontal );
-  Slider.setRange( 0, 0 );
-  Slider.resize( 300, 40 );
-  (void)Slider.grab();
-  EXPECT_EQ( Messages.Text(), "" );
-  EXPECT_EQ( Slider.GetFramesPerPixel(), 0.0 );
+  Slider.setRange( 0, 100 );
+  Slider.setValue( 50 );
+  QWheelEvent Wheel( QPointF( 5, 5 ), QPointF( 5, 5 ), QPoint(), QPoint( 0, 120 ), Qt::NoButton, Qt::NoModifier,
+                     Qt::NoScrollPhase, false );
+  QApplication::sendEvent( &Slider, &Wheel );
+  EXPECT_FALSE( Wheel.isAccepted() );
+  EXPECT_EQ( Slider.value(), 50 );
 }
 
-TEST( LabelSlider, WheelGoesToTheWindow )
+// The time bar and the frame box as the window builds them, with and without the sheet. The
+// window moves both while playing: only the user's clicks may reach the seek. With the proxy, a
+// click on the groove jumps there; the plain style pages.
+TEST( Controls, WindowMovesAreSilentAndClicksAreHeard )
 {
-  struct VWindow : QWidget
+  const std::tuple< bool, bool, int, QStyle::SubControl, int > Rows[] = {
+      { false, true, 75, QStyle::SC_SpinBoxUp, 51 },
+      { true, true, 75, QStyle::SC_SpinBoxDown, 49 },
+      { false, false, 40, QStyle::SC_SpinBoxUp, 51 } };
+  for( const auto& [bStyleSheet, bProxy, Jumped, Arrow, Stepped] : Rows )
   {
-    int Wheels = 0;
-    void wheelEvent( QWheelEvent* i_pEvent ) override
-    {
-      ++Wheels;
-      i_pEvent->accept();
-    }
-  } Window;
-  auto* pSlider = new VLabelSlider( Qt::Horizontal, &Window );
-  pSlider->setRange( 0, 100 );
-  pSlider->setValue( 50 );
-  pSlider->setGeometry( 10, 10, 200, 30 );
-  Window.resize( 220, 50 );
-  Window.show();
-  ASSERT_TRUE( QTest::qWaitForWindowExposed( &Window ) );
-
-  // The slider declines the wheel, so a turn from the mouse over it reaches the window, which
-  // steps the frames. As the window system delivers it: spontaneous, and through notify, which is
-  // where Qt hands an ignored wheel on to the parent (sendEvent would clear the flag).
-  const QPoint Centre = pSlider->rect().center();
-  QWheelEvent FromMouse( Centre, pSlider->mapToGlobal( Centre ), QPoint(), QPoint( 0, 120 ), Qt::NoButton,
-                         Qt::NoModifier, Qt::NoScrollPhase, false );
-  QSpontaneKeyEvent::setSpontaneous( &FromMouse );
-  qApp->notify( pSlider, &FromMouse );
-  EXPECT_EQ( pSlider->value(), 50 );
-  EXPECT_EQ( Window.Wheels, 1 );
-}
-
-// The time bar as the window builds it: tracking off, the proxy over its own style. The window
-// moves the bar while playing: only the user's click may reach the seek.
-TEST( LabelSlider, AClickOnTheGrooveJumpsThereWithTheProxyStyle )
-{
-  const std::tuple< const char*, bool, bool, int > Rows[] = { { "ProxyJumps", true, false, 75 },
-                                                              { "ProxyJumpsUnderTheStyleSheet", true, true, 75 },
-                                                              { "PlainStylePages", false, false, 40 } };
-  for( const auto& [Name, bProxy, bStyleSheet, Expected] : Rows )
-  {
-    SCOPED_TRACE( Name );
-    const VStyleSheetFor Sheet( bStyleSheet );
+    SCOPED_TRACE( testing::Message() << "sheet " << bStyleSheet << ", proxy " << bProxy );
+    ASSERT_TRUE( !bStyleSheet || ApplyStyleSheet() );
     VLabelSlider Slider( Qt::Horizontal );
     if( bProxy )
     {
@@ -202,18 +172,29 @@ TEST( LabelSlider, AClickOnTheGrooveJumpsThereWithTheProxyStyle )
     Slider.setPageStep( 10 );
     Slider.setRange( 0, 100 );
     Slider.resize( 420, 40 );
+    VProbeBox Box;
+    Box.setRange( 0, 100 );
+    Box.setMinimumWidth( 70 );
     Slider.show();
+    Box.show();
     QApplication::processEvents();
-    QSignalSpy Changed( &Slider, &QSlider::valueChanged );
+    QSignalSpy SliderChanged( &Slider, &QSlider::valueChanged );
+    QSignalSpy BoxChanged( &Box, qOverload< int >( &QSpinBox::valueChanged ) );
     Slider.setValue( 30 );
-    EXPECT_EQ( Changed.count(), 0 ) << "the window's move";
+    Box.setValue( 50 );
+    EXPECT_EQ( Box.text(), "50" );
+    EXPECT_EQ( SliderChanged.count() + BoxChanged.count(), 0 ) << "the window's moves";
 
     const QRect Groove = Slider.GrooveRect();
     const int Handle = Slider.HandleRect().width();
     const int X = Groove.x() + Handle / 2 + ( Groove.width() - Handle ) * 3 / 4;
     QTest::mouseClick( &Slider, Qt::LeftButton, Qt::NoModifier, QPoint( X, Groove.center().y() ) );
-    EXPECT_NEAR( Slider.value(), Expected, 1 );
-    EXPECT_EQ( Changed.count(), 1 );
+    EXPECT_NEAR( Slider.value(), Jumped, 1 );
+    EXPECT_EQ( SliderChanged.count(), 1 );
+    QTest::mouseClick( &Box, Qt::LeftButton, Qt::NoModifier, Box.ArrowCentre( Arrow ) );
+    ASSERT_EQ( BoxChanged.count(), 1 );
+    EXPECT_EQ( BoxChanged.front().front().toInt(), Stepped );
+    qApp->setStyleSheet( QString() );
   }
 }
 
@@ -231,41 +212,6 @@ TEST( ProxyStyle, LeavesTheApplicationStyleAlone )
   // Still alive and still answering for everyone else.
   EXPECT_EQ( QApplication::style(), pApplicationStyle );
   EXPECT_NE( pApplicationStyle->styleHint( QStyle::SH_Slider_AbsoluteSetButtons ), int( Qt::LeftButton ) );
-}
-
-// The frame box as the window builds it: its own moves are silent, a click on an arrow is the
-// user's request and is heard.
-TEST( SpinBox, AClickOnAnArrowStepsOneFrame )
-{
-  // Where the style puts the arrows of this box, under whatever sheet is in force.
-  struct VProbe : VClickSpinBox
-  {
-    QPoint ArrowCentre( QStyle::SubControl i_Arrow ) const
-    {
-      QStyleOptionSpinBox Option;
-      initStyleOption( &Option );
-      return style()->subControlRect( QStyle::CC_SpinBox, &Option, i_Arrow, this ).center();
-    }
-  };
-  const std::tuple< bool, QStyle::SubControl, int > Rows[] = { { false, QStyle::SC_SpinBoxUp, 51 },
-                                                               { true, QStyle::SC_SpinBoxDown, 49 } };
-  for( const auto& [bStyleSheet, Arrow, Expected] : Rows )
-  {
-    SCOPED_TRACE( bStyleSheet ? "under the sheet" : "plain style" );
-    const VStyleSheetFor Sheet( bStyleSheet );
-    VProbe Box;
-    Box.setRange( 0, 100 );
-    Box.setMinimumWidth( 70 );
-    QSignalSpy Changed( &Box, qOverload< int >( &QSpinBox::valueChanged ) );
-    Box.setValue( 50 );
-    EXPECT_EQ( Box.text(), "50" );
-    EXPECT_EQ( Changed.count(), 0 ) << "the window's move";
-    Box.show();
-    QApplication::processEvents();
-    QTest::mouseClick( &Box, Qt::LeftButton, Qt::NoModifier, Box.ArrowCentre( Arrow ) );
-    ASSERT_EQ( Changed.count(), 1 );
-    EXPECT_EQ( Changed.front().front().toInt(), Expected );
-  }
 }
 
 // Starting from 1.23: what the slider and the text show after typing, and what finishing the
@@ -293,7 +239,9 @@ TEST( EditSlider, TypingClampsFollowsAndCommitsOnTheGrid )
   }
 }
 
-TEST( EditSlider, DragShowsTheNumberAndCommitsOnRelease )
+// The file's values are shown without being committed, and wait while the user holds the slider;
+// the drag commits on release.
+TEST( EditSlider, ShownValuesWaitForTheHandAndTheDragCommitsOnRelease )
 {
   auto pEditor = MakeEditor();
   pEditor->SetText( "1.00" );
@@ -303,29 +251,22 @@ TEST( EditSlider, DragShowsTheNumberAndCommitsOnRelease )
   pSlider->setSliderPosition( 250 );
   pSlider->setSliderPosition( 275 );
   EXPECT_EQ( pEditor->GetText(), "2.75" );
-  // The file's value arriving meanwhile waits for the user's hand.
   pEditor->SetText( "3.00" );
   EXPECT_EQ( pSlider->value(), 275 );
   EXPECT_EQ( pEditor->GetText(), "2.75" );
   EXPECT_EQ( Changed.count(), 0 );
-
   pSlider->setSliderDown( false );
   ASSERT_EQ( Changed.count(), 1 );
   EXPECT_FLOAT_EQ( Changed.front().front().toFloat(), 2.75f );
-}
 
-TEST( EditSlider, SetTextAndSetMaximumShowWithoutCommitting )
-{
-  auto pEditor = MakeEditor();
-  QSignalSpy Changed( pEditor.get(), &VEditSlider::Changed );
   pEditor->SetText( "3.5" );
   pEditor->SetText( "xyz" );
-  EXPECT_EQ( pEditor->GetSlider()->value(), 350 );
+  EXPECT_EQ( pSlider->value(), 350 );
   EXPECT_EQ( pEditor->GetText(), "3.50" );
-  EXPECT_EQ( Changed.count(), 0 );
+  EXPECT_EQ( Changed.count(), 1 );
   pEditor->SetMaximum( "2" );
   pEditor->SetMaximum( "two" );
-  EXPECT_EQ( pEditor->GetSlider()->maximum(), 200 );
+  EXPECT_EQ( pSlider->maximum(), 200 );
 
   // Fixed notation at every precision, never an exponent.
   EXPECT_EQ( MakeEditor( 0 )->NumberText( 1.7f ), "2" );
