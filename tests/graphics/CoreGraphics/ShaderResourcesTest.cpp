@@ -96,13 +96,8 @@ namespace
     VResources Resources( false, QDir::currentPath() );
     Resources.Load();
     EXPECT_FALSE( Log.Contains( "Failed" ) );
-    // Vertex and fragment stage of each pair.
-    const char* const Programs[] = { "Video VideoRaw",
-                                     "Video VideoBayer",
-                                     "Video VideoLuminance",
-                                     "Video VideoYUV",
-                                     "Video UniformColour",
-                                     "Video ImageSet",
+    // Each vertex stage, then the fragment stages it is linked with.
+    const char* const Programs[] = { "Video VideoRaw VideoBayer VideoLuminance VideoYUV UniformColour ImageSet",
                                      "Simple UniformColour",
                                      "SimpleColour Colour",
                                      "Simple3D UniformColour",
@@ -118,10 +113,13 @@ namespace
     {
       const QStringList Stages = QString( pProgram ).split( ' ' );
       Vertex.insert( Stages[0] );
-      Fragment.insert( Stages[1] );
-      std::shared_ptr< VShaderProgram > pLinked = Resources.GetProgram( Stages[0], Stages[1] );
-      EXPECT_TRUE( pLinked && pLinked->IsLinked() ) << pProgram;
-      EXPECT_EQ( Resources.GetProgram( Stages[0], Stages[1] ), pLinked ) << "a pair is linked once";
+      for( const QString& rFragment : Stages.mid( 1 ) )
+      {
+        Fragment.insert( rFragment );
+        std::shared_ptr< VShaderProgram > pLinked = Resources.GetProgram( Stages[0], rFragment );
+        EXPECT_TRUE( pLinked && pLinked->IsLinked() ) << pProgram << " " << rFragment.toStdString();
+        EXPECT_EQ( Resources.GetProgram( Stages[0], rFragment ), pLinked ) << "a pair is linked once";
+      }
     }
     EXPECT_EQ( Resources.GetShaderNames( VShader::Kind_Vertex ), QStringList( Vertex.begin(), Vertex.end() ) );
     EXPECT_EQ( Resources.GetShaderNames( VShader::Kind_Fragment ), QStringList( Fragment.begin(), Fragment.end() ) );
@@ -205,7 +203,9 @@ namespace
     ASSERT_TRUE( m_Context.makeCurrent( &m_Surface ) );
   }
 
-  TEST_F( ShaderResourcesTest, BuffersCountWhatTheyHoldAndRefuseWritesPastTheEnd )
+  // Buffers count what they hold and refuse writes past their end. Texture rows of any length
+  // arrive tightly packed, and whatever alignment was set before stays set.
+  TEST_F( ShaderResourcesTest, BuffersAndTexturesTakeWhatFits )
   {
     CoreGraphics::VIndexBuffer Empty, Wide;
     ASSERT_TRUE( Empty.Create( std::vector< std::uint16_t >() ) );
@@ -224,11 +224,7 @@ namespace
     EXPECT_TRUE( Vertices.Write( 48, Bytes, 16 ) );
     EXPECT_FALSE( Vertices.Write( 49, Bytes, 16 ) );
     EXPECT_FALSE( Vertices.Write( 80, Bytes, 1 ) );
-  }
 
-  // Rows of any length arrive tightly packed, and whatever alignment was set before stays set.
-  TEST_F( ShaderResourcesTest, UploadReadsTightRowsAndRestoresTheUnpackAlignment )
-  {
     CoreGraphics::VRenderContext& Context = *m_pRender;
     QOpenGLExtraFunctions& rGL = *Context.Functions();
     QOpenGLTexture Texture( QOpenGLTexture::Target2D );

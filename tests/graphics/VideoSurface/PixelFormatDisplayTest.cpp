@@ -133,18 +133,14 @@ namespace
     // Other formats are left as they are, by the shaders and by the software path.
     for( ZOL::EPixelFormat Format :
          { ZOL::PixelFormat_Luminance8, ZOL::PixelFormat_R8G8B8, ZOL::PixelFormat_Y8U8Y8V8 } )
-    {
-      SCOPED_TRACE( ZOL::ToString( Format ) );
-      const ZOL::IVideoFrame Frame = RandomFrame( Format, 40, 24 );
-      Show( Frame );
-      m_pWidget->SetVideoSettings( Settings );
-      EXPECT_TRUE( Shows( ProcessorPicture( Frame ), 3 ) );
-    }
-    const ZOL::IVideoFrame Frame = RandomFrame( ZOL::PixelFormat_R8G8B8, 37, 21 );
-    Show( Frame, Software );
-    m_pWidget->SetVideoSettings( Settings );
-    m_pWidget->PrepareFrame( 1, Frame.VideoFrameInfo, Frame, false );
-    EXPECT_EQ( m_pWidget->GetDecoderName().toStdString(), "Software Decoder" );
-    EXPECT_TRUE( Shows( ProcessorPicture( Frame ), 0 ) );
+      for( LumekVideoViewer::EDecoder Decoder : { Hardware, Software } )
+      {
+        SCOPED_TRACE( std::string( ZOL::ToString( Format ) ) + ( Decoder == Software ? " in software" : "" ) );
+        const ZOL::IVideoFrame Frame = RandomFrame( Format, 40, 24 );
+        Show( Frame, Decoder );
+        m_pWidget->SetVideoSettings( Settings );
+        m_pWidget->PrepareFrame( 1, Frame.VideoFrameInfo, Frame, false );
+        EXPECT_TRUE( Shows( ProcessorPicture( Frame ), Decoder == Software ? 0 : 3 ) );
+      }
   }
 } // namespace
