@@ -51,9 +51,13 @@ namespace LumekVideoTest
       rFile.resize( rFile.size() + i_Bytes );
       Patch( rFile, rFile.size() - i_Bytes, i_Value, i_Bytes );
     };
-    const auto Raw = [&]( const VBytes& i_rBytes ) { rFile.insert( rFile.end(), i_rBytes.begin(), i_rBytes.end() ); };
-    const auto Pad = [&]
-    { rFile.resize( ( rFile.size() + i_rPlan.Alignment - 1 ) / i_rPlan.Alignment * i_rPlan.Alignment ); };
+    // Bytes, then zeros up to the next boundary unless told otherwise.
+    const auto Raw = [&]( const VBytes& i_rBytes, bool i_bPad = true )
+    {
+      rFile.insert( rFile.end(), i_rBytes.begin(), i_rBytes.end() );
+      if( i_bPad )
+        rFile.resize( ( rFile.size() + i_rPlan.Alignment - 1 ) / i_rPlan.Alignment * i_rPlan.Alignment );
+    };
     const std::string Magic = "###LumekVideoFile###";
     rFile.assign( Magic.begin(), Magic.end() );
     Put( 0xF355BDACu, 4 );
@@ -61,19 +65,16 @@ namespace LumekVideoTest
     Put( 3, 4 );
     Put( i_rPlan.Alignment, 8 );
     Put( 0, 8 ); // the index offset, known at the end
-    Raw( i_rPlan.DescriptionBlock );
+    Raw( i_rPlan.DescriptionBlock, false );
     Raw( i_rPlan.AttributeBlock );
-    Pad();
     for( const VRecord& rRecord : i_rPlan.Records )
     {
       Result.RecordOffsets.push_back( rFile.size() );
       Raw( rRecord.Video );
-      Pad();
       if( rRecord.Audio )
       {
         Put( rRecord.Audio->size(), 4 );
         Raw( *rRecord.Audio );
-        Pad();
       }
     }
     Result.IndexOffset = rFile.size();
