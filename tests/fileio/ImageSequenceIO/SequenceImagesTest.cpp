@@ -72,7 +72,7 @@ namespace
         const std::string Suffix = std::to_string( Frame ) + rCase.Extension;
         const std::string Fixture = MakeImage( std::string( "sequence-" ) + rCase.Name + "-" + Suffix,
                                                rCase.FfmpegPixelFormat, "48x32", Frame );
-        WriteFile( Folder / ( "take_000" + Suffix ), ReadFile( Fixture ) );
+        WriteWholeFile( Folder / ( "take_000" + Suffix ), ReadWholeFile( Fixture ) );
         Expected[Frame] = LumekTest::FfmpegDecode( Fixture, rCase.FfmpegDecodeFormat );
         ASSERT_FALSE( Expected[Frame].empty() );
       }
@@ -85,22 +85,15 @@ namespace
       {
         ZOL::IVideoFrame Decoded;
         ASSERT_TRUE( pReader->ReadFrame( Frame, Decoded, true, true ) ) << Frame;
-        ASSERT_EQ( rCase.Decoded, Decoded.VideoFrameInfo.PixelFormat );
-        ASSERT_EQ( 48, Decoded.VideoFrameInfo.ImageWidth );
-        ASSERT_EQ( 32, Decoded.VideoFrameInfo.ImageHeight );
+        const ZOL::IVideoFrameInfo& rInfo = Decoded.VideoFrameInfo;
+        ASSERT_EQ( std::tie( rInfo.PixelFormat, rInfo.ImageWidth, rInfo.ImageHeight ),
+                   std::tuple( rCase.Decoded, 48, 32 ) );
         // The frame's buffer is sized for colour before the image says it is grey: the pixels
         // are at its start.
         ASSERT_LE( rExpected.size(), Decoded.Video->GetSize() );
-        int MaxDifference = 0;
-        double Sum = 0.0;
-        for( std::size_t i = 0; i < rExpected.size(); ++i )
-        {
-          const int Difference = std::abs( int( rExpected[i] ) - int( Decoded.Video->GetData()[i] ) );
-          MaxDifference = std::max( MaxDifference, Difference );
-          Sum += Difference;
-        }
-        EXPECT_LE( MaxDifference, rCase.MaxDifference ) << "frame " << Frame;
-        EXPECT_LE( Sum / static_cast< double >( rExpected.size() ), rCase.MaxMeanDifference ) << "frame " << Frame;
+        const VDifference Distance = Difference( rExpected, *Decoded.Video );
+        EXPECT_LE( Distance.Largest, rCase.MaxDifference ) << "frame " << Frame;
+        EXPECT_LE( Distance.Mean, rCase.MaxMeanDifference ) << "frame " << Frame;
       }
       ZOL::IVideoFrame Missing;
       EXPECT_FALSE( pReader->ReadFrame( 1, Missing, true, false ) );
@@ -124,7 +117,7 @@ namespace
   {
     VTempFolder Folder;
     for( const char* pName : { "t_00.png", "t_01.png", "t_0102030400.png" } )
-      WriteFile( Folder / pName, std::string( "\x89PNG\r\n\x1a\n not really" ) );
+      WriteWholeFile( Folder / pName, std::string( "\x89PNG\r\n\x1a\n not really" ) );
     const LumekTest::VLogCapture Quiet;
     for( const char* pPattern : { "t_%FRAME%.png", "t_%TIMECODE%.png" } )
     {
@@ -156,7 +149,7 @@ namespace
             ReadAll( Reader );
         }
       // The same through a file: a cut descriptor on disk.
-      WriteFile( Folder / "t.lumekimagesequence", VBytes( Bytes.begin(), Bytes.begin() + Bytes.size() / 2 ) );
+      WriteWholeFile( Folder / "t.lumekimagesequence", VBytes( Bytes.begin(), Bytes.begin() + Bytes.size() / 2 ) );
       EXPECT_FALSE( Reader.Open( Folder / "t.lumekimagesequence" ) );
     }
   }
@@ -171,7 +164,7 @@ namespace
          { std::pair( ".jpg", "yuvj420p" ), std::pair( ".png", "rgb24" ), std::pair( ".tiff", "rgb24" ) } )
     {
       SCOPED_TRACE( pExtension );
-      const VBytes Image = ReadFile( MakeImage( std::string( "damaged" ) + pExtension, pPixelFormat, "24x16" ) );
+      const VBytes Image = ReadWholeFile( MakeImage( std::string( "damaged" ) + pExtension, pPixelFormat, "24x16" ) );
       ASSERT_FALSE( Image.empty() );
       const std::string Name = Folder / ( std::string( "d_0" ) + pExtension );
       // Steps that reach every part of a small file without a run per byte.
@@ -186,7 +179,7 @@ namespace
             continue;
           if( bFlip )
             Damaged[Position] ^= 0xA5;
-          WriteFile( Name, Damaged );
+          WriteWholeFile( Name, Damaged );
           if( Reader.Open( Name ) )
             ReadAll( Reader );
         }

@@ -5,58 +5,16 @@
 
 #include "fileio/ImageSequenceIO/SequenceDescriptor.h"
 #include "fileio/ImageSequenceIO/VImageSequenceReader.h"
+#include "tests/fileio/ImageDecoders/ImageTestSupport.h"
 
-#include <boost/filesystem.hpp>
 #include <gtest/gtest.h>
 
-#include <fstream>
-#include <iterator>
 #include <set>
 #include <sstream>
 
 namespace ImageSequenceTest
 {
-  using VBytes = std::vector< std::uint8_t >;
-
-  // A temporary folder that goes with everything in it.
-  class VTempFolder
-  {
-  public:
-    VTempFolder() { boost::filesystem::create_directories( m_Path ); }
-    ~VTempFolder()
-    {
-      boost::system::error_code Error;
-      boost::filesystem::remove_all( m_Path, Error );
-    }
-    VTempFolder( const VTempFolder& ) = delete;
-    VTempFolder& operator=( const VTempFolder& ) = delete;
-
-    const std::string& Path() const { return m_Path; }
-    std::string operator/( const std::string& i_rName ) const { return m_Path + "/" + i_rName; }
-
-  private:
-    std::string m_Path =
-        ( boost::filesystem::temp_directory_path() / boost::filesystem::unique_path( "lumek-sequence-%%%%-%%%%-%%%%" ) )
-            .string();
-  };
-
-  inline void WriteFile( const std::string& i_rPath, const VBytes& i_rBytes )
-  {
-    std::ofstream File( i_rPath, std::ios::binary | std::ios::trunc );
-    File.write( reinterpret_cast< const char* >( i_rBytes.data() ), static_cast< std::streamsize >( i_rBytes.size() ) );
-    ASSERT_TRUE( File.good() ) << i_rPath;
-  }
-
-  inline void WriteFile( const std::string& i_rPath, const std::string& i_rText )
-  {
-    WriteFile( i_rPath, VBytes( i_rText.begin(), i_rText.end() ) );
-  }
-
-  inline VBytes ReadFile( const std::string& i_rPath )
-  {
-    std::ifstream File( i_rPath, std::ios::binary );
-    return VBytes( std::istreambuf_iterator< char >( File ), std::istreambuf_iterator< char >() );
-  }
+  using namespace LumekTest;
 
   // The words of a text: file names, frame numbers.
   inline std::vector< std::string > Words( const std::string& i_rText )
