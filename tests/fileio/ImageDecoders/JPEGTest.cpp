@@ -32,13 +32,12 @@ namespace
     std::vector< std::string > Log;
   };
 
-  VParse Parse( const VBytes& i_rBytes, std::uint64_t i_Skip = 0 )
+  VParse Parse( const VBytes& i_rBytes )
   {
     VParse Result;
     VLogCapture Log( "JPEGIO" );
     UtilsIO::VMemoryInputStream Stream( i_rBytes.data(), i_rBytes.size() );
-    EXPECT_TRUE( Stream.Seek( static_cast< std::int64_t >( i_Skip ) ) );
-    Result.bResult = JPEGUtils::ParseJPEG( Stream, i_rBytes.size() - i_Skip, Result.Segments );
+    Result.bResult = JPEGUtils::ParseJPEG( Stream, i_rBytes.size(), Result.Segments );
     Result.Log = Log.Lines();
     return Result;
   }
@@ -71,31 +70,6 @@ namespace
   const VBytes s_Scan = { 0x12, 0x34, 0xFF, 0x00, 0x56, 0xFF, 0xD0, 0x78 };
   const VBytes s_EOI = { 0xFF, 0xD9 };
   const VBytes s_HandMade = Join( { s_SOI, s_APP0, s_COM, s_APP14, s_SOS, s_Scan, s_EOI } );
-  const std::vector< VJPEGSegment > s_HandMadeSegments = {
-      { 0xD8, 0, 2 },   { 0xE0, 2, 18 }, { 0xFE, 20, 9 }, { 0xEE, 29, 6 },
-      { 0xDA, 35, 10 }, { 0xD0, 50, 2 }, { 0xD9, 53, 2 },
-  };
-
-  TEST( JPEGParser, FindsEverySegmentWhereverTheImageStartsAndWhateverFollows )
-  {
-    const VParse Result = Parse( s_HandMade );
-    EXPECT_TRUE( Result.bResult );
-    EXPECT_EQ( Result.Segments, s_HandMadeSegments );
-    EXPECT_TRUE( Result.Log.empty() );
-    // Offsets count in the stream, not from the image's start.
-    const VParse Later = Parse( Join( { { 1, 2, 3, 4, 5 }, s_HandMade } ), 5 );
-    EXPECT_TRUE( Later.bResult );
-    ASSERT_EQ( Later.Segments.size(), s_HandMadeSegments.size() );
-    for( std::size_t i = 0; i < s_HandMadeSegments.size(); ++i )
-      EXPECT_EQ( Later.Segments[i].Start, s_HandMadeSegments[i].Start + 5 );
-    // Bytes after the image are skipped.
-    for( const VBytes& rTail : { VBytes{ 0xAB }, VBytes{ 0xAB, 0xCD, 0 } } )
-    {
-      const VParse Tailed = Parse( Join( { s_HandMade, rTail } ) );
-      EXPECT_TRUE( Tailed.bResult );
-      EXPECT_EQ( Tailed.Segments, s_HandMadeSegments );
-    }
-  }
 
   // The hand-made image, and ffmpeg's 4:2:2 encoding of a 16 x 16 test picture.
   TEST( JPEGParser, DumpsAsTheGoldenText )

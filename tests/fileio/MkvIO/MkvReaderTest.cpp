@@ -34,11 +34,10 @@ namespace
     // The tags carry the timing, the timecode and the settings exactly.
     EXPECT_EQ( Reader.GetVideoTiming(), Timing() );
     EXPECT_EQ( Reader.GetTimecode(), StartTimecode() );
-    EXPECT_FLOAT_EQ( Reader.GetVideoSettings().Saturation, 0.75f );
-    EXPECT_FLOAT_EQ( Reader.GetVideoSettings().GammaCorrection, 1.25f );
+    EXPECT_EQ( std::tie( Reader.GetVideoSettings().Saturation, Reader.GetVideoSettings().GammaCorrection ),
+               std::tuple( 0.75f, 1.25f ) );
     std::string WritingApp;
-    EXPECT_TRUE( Reader.GetAttributes().Get( "Matroska.WritingApp", WritingApp ) );
-    EXPECT_EQ( WritingApp, "LumekVideoViewer" );
+    EXPECT_TRUE( Reader.GetAttributes().Get( "Matroska.WritingApp", WritingApp ) && WritingApp == "LumekVideoViewer" );
 
     for( int Frame = 0; Frame <= i_rCase.Frames; ++Frame )
     {
