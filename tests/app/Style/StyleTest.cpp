@@ -96,7 +96,7 @@ namespace
 } // namespace
 
 // Every value of the application's theme in record order, as its token writes it: golden text.
-TEST( Theme, EveryTokenGivesTheApplicationsValue )
+TEST( Theme, EveryTokenAndPaletteRoleGivesTheApplicationsValue )
 {
   QString Text;
   for( const auto& rField : ZOL::IApplicationStyling::Fields() )
@@ -105,15 +105,13 @@ TEST( Theme, EveryTokenGivesTheApplicationsValue )
   ASSERT_TRUE( Golden.open( QIODevice::ReadOnly | QIODevice::Text ) );
   EXPECT_EQ( Theme::SubstituteTokens( Text, *ZOL::ApplicationStyling() ).toStdString(),
              Golden.readAll().toStdString() );
-}
 
-// Set before the QApplication was made, and still in force after it.
-TEST( Theme, PaletteRolesTakeTheirColoursBeforeAndAfterTheApplication )
-{
+  // The palette's roles: set before the QApplication was made, and still in force after it.
   const std::tuple< QPalette::ColorGroup, QPalette::ColorRole, const char* > Rows[] = {
-      { QPalette::Active, QPalette::Window, "#303030" },       { QPalette::Inactive, QPalette::Highlight, "#c89810" },
-      { QPalette::Inactive, QPalette::BrightText, "#e76500" }, { QPalette::Disabled, QPalette::WindowText, "#999999" },
-      { QPalette::Disabled, QPalette::Button, "#3d3d3d" },     { QPalette::Disabled, QPalette::Highlight, "#2e78fc" },
+      { QPalette::Active, QPalette::Window, "#303030" },
+      { QPalette::Inactive, QPalette::Highlight, "#c89810" },
+      { QPalette::Disabled, QPalette::WindowText, "#999999" },
+      { QPalette::Disabled, QPalette::Button, "#3d3d3d" },
       { QPalette::Disabled, QPalette::Text, "#ffffff" } };
   const QPalette Palette = ZOL::ApplicationStyling()->MakePalette();
   for( const auto& [Group, Role, Expected] : Rows )
@@ -251,95 +249,83 @@ TEST_F( StyleSheet, NoTokenOrExpressionIsLeft )
 }
 
 // One of each widget the sheet styles, in the states it has rules for, shown and painted with
-// its menus and a tool tip, so every rule is parsed and every picture read.
-TEST_F( StyleSheet, QtAppliesItWithoutComplaint )
-{
-  const AppTest::VQtMessages Messages;
-  ASSERT_TRUE( LumekVideoViewer::ApplyStyleSheet() );
-  QWidget Window;
-  auto* pLayout = new QVBoxLayout( &Window );
-  auto* pMenuBar = new QMenuBar;
-  QMenu* pMenu = pMenuBar->addMenu( "&Playback " );
-  QMenu* pDecoder = pMenu->addMenu( "Decoder" );
-  auto* pGroup = new QActionGroup( pMenu );
-  for( QAction* pAction : { pMenu->addAction( "&Looping" ), pGroup->addAction( pDecoder->addAction( "Hardware" ) ),
-                            pGroup->addAction( pDecoder->addAction( "Software" ) ) } )
-    pAction->setCheckable( true );
-  pMenu->actions()[1]->setChecked( true );
-  pGroup->actions().first()->setChecked( true );
-  pMenu->addSeparator();
-  pMenu->addAction( "Stop" )->setEnabled( false );
-  auto* pLogo = new QLabel;
-  pLogo->setObjectName( "Logo" );
-  pLogo->setPixmap( QPixmap( ":/" + s_Prefix + "LumekLogo.svg" ) );
-  auto* pTable = new QTableView;
-  auto* pModel = new QStandardItemModel( 40, 2, pTable );
-  pModel->setHorizontalHeaderLabels( { "Name", "Value" } );
-  pTable->setModel( pModel );
-  pTable->setSortingEnabled( true );
-  pTable->setAlternatingRowColors( true );
-
-  auto* pInfo = new QWidget;
-  pInfo->setObjectName( "InfoPanel" );
-  auto* pPartial = new QCheckBox( "Partial" );
-  pPartial->setTristate( true );
-  pPartial->setCheckState( Qt::PartiallyChecked );
-  pPartial->setEnabled( false );
-  auto* pCheck = new QCheckBox( "Checked" );
-  pCheck->setChecked( true );
-  auto* pInfoLayout = new QHBoxLayout( pInfo );
-  for( QWidget* pWidget :
-       std::initializer_list< QWidget* >{ new QLabel( "No file open" ), pCheck, pPartial, new QLineEdit( "1.23" ) } )
-    pInfoLayout->addWidget( pWidget );
-
-  auto* pControls = new QGroupBox;
-  pControls->setObjectName( "Controls" );
-  auto* pSlider = new LumekVideoViewer::VLabelSlider( Qt::Horizontal );
-  auto* pProxy = new LumekVideoViewer::VProxyStyle( pSlider->style() );
-  pProxy->setParent( pSlider );
-  pSlider->setStyle( pProxy );
-  auto* pControlsLayout = new QHBoxLayout( pControls );
-  for( QWidget* pWidget : std::initializer_list< QWidget* >{
-           pSlider, new LumekVideoViewer::VClickSpinBox, NamedButton( "Play" ), NamedButton( "Stop" ),
-           NamedButton( "FullScreen" ), NamedButton( "Pause", false ), NamedButton( "Close" ) } )
-    pControlsLayout->addWidget( pWidget );
-  for( QWidget* pWidget : std::initializer_list< QWidget* >{ pMenuBar, pLogo, pTable, pInfo, pControls } )
-    pLayout->addWidget( pWidget );
-  Window.resize( 800, 600 );
-
-  Window.show();
-  QApplication::processEvents();
-  (void)Window.grab();
-  for( QMenu* pPopup : { pMenu, pDecoder } )
-  {
-    pPopup->popup( QPoint( 0, 0 ) );
-    QApplication::processEvents();
-    (void)pPopup->grab();
-    pPopup->hide();
-  }
-  QToolTip::showText( QPoint( 10, 10 ), "Play video", &Window );
-  QApplication::processEvents();
-  QToolTip::hideText();
-  EXPECT_EQ( Messages.Text(), "" );
-}
-
-TEST_F( StyleSheet, TransportButtonsAndTimeBarGrowWithTheDensity )
+// its menus and a tool tip at three densities, so that every rule is parsed and every picture
+// read; the transport buttons and the time bar grow with the density.
+TEST_F( StyleSheet, QtAppliesItWithoutComplaintAtEveryDensity )
 {
   const std::tuple< int, int, int > Rows[] = { { 96, 40, 20 }, { 144, 60, 30 }, { 192, 80, 40 } };
   for( const auto& [DPI, ButtonSide, SliderHeight] : Rows )
   {
     SCOPED_TRACE( DPI );
+    const AppTest::VQtMessages Messages;
     DPIUtils::SetDPI( DPI );
     ASSERT_TRUE( LumekVideoViewer::ApplyStyleSheet() );
-    QWidget Host;
-    auto* pLayout = new QHBoxLayout( &Host );
-    auto* pPlay = NamedButton( "Play" );
-    pLayout->addWidget( pPlay );
+    QWidget Window;
+    auto* pMenuBar = new QMenuBar;
+    QMenu* pMenu = pMenuBar->addMenu( "&Playback" );
+    QMenu* pDecoder = pMenu->addMenu( "Decoder" );
+    auto* pGroup = new QActionGroup( pMenu );
+    for( QAction* pAction : { pMenu->addAction( "&Looping" ), pGroup->addAction( pDecoder->addAction( "Hardware" ) ),
+                              pGroup->addAction( pDecoder->addAction( "Software" ) ) } )
+    {
+      pAction->setCheckable( true );
+      pAction->setChecked( pAction->text() != "Software" );
+    }
+    pMenu->addSeparator();
+    pMenu->addAction( "Stop" )->setEnabled( false );
+    auto* pLogo = new QLabel;
+    pLogo->setObjectName( "Logo" );
+    pLogo->setPixmap( QPixmap( ":/" + s_Prefix + "LumekLogo.svg" ) );
+    auto* pTable = new QTableView;
+    auto* pModel = new QStandardItemModel( 40, 2, pTable );
+    pModel->setHorizontalHeaderLabels( { "Name", "Value" } );
+    pTable->setModel( pModel );
+    pTable->setSortingEnabled( true );
+    pTable->setAlternatingRowColors( true );
+    auto* pCheck = new QCheckBox( "Checked" );
+    pCheck->setChecked( true );
+    auto* pPartial = new QCheckBox( "Partial" );
+    pPartial->setTristate( true );
+    pPartial->setCheckState( Qt::PartiallyChecked );
+    pPartial->setEnabled( false );
     auto* pSlider = new LumekVideoViewer::VLabelSlider( Qt::Horizontal );
-    pLayout->addWidget( pSlider );
-    Host.resize( 600, 300 );
-    Host.show();
+    auto* pProxy = new LumekVideoViewer::VProxyStyle( pSlider->style() );
+    pProxy->setParent( pSlider );
+    pSlider->setStyle( pProxy );
+    auto* pPlay = NamedButton( "Play" );
+
+    // The panels' own rules reach their children.
+    auto* pInfo = new QWidget;
+    pInfo->setObjectName( "InfoPanel" );
+    auto* pInfoLayout = new QHBoxLayout( pInfo );
+    for( QWidget* pChild :
+         std::initializer_list< QWidget* >{ new QLabel( "No file open" ), pCheck, pPartial, new QLineEdit( "1.23" ) } )
+      pInfoLayout->addWidget( pChild );
+    auto* pControls = new QGroupBox;
+    pControls->setObjectName( "Controls" );
+    auto* pControlsLayout = new QHBoxLayout( pControls );
+    for( QWidget* pChild : std::initializer_list< QWidget* >{ pSlider, new LumekVideoViewer::VClickSpinBox, pPlay,
+                                                              NamedButton( "Stop" ), NamedButton( "FullScreen" ),
+                                                              NamedButton( "Pause", false ), NamedButton( "Close" ) } )
+      pControlsLayout->addWidget( pChild );
+    auto* pLayout = new QVBoxLayout( &Window );
+    for( QWidget* pChild : std::initializer_list< QWidget* >{ pMenuBar, pLogo, pTable, pInfo, pControls } )
+      pLayout->addWidget( pChild );
+    Window.resize( 800, 600 );
+    Window.show();
     QApplication::processEvents();
+    (void)Window.grab();
+    for( QMenu* pPopup : { pMenu, pDecoder } )
+    {
+      pPopup->popup( QPoint( 0, 0 ) );
+      QApplication::processEvents();
+      (void)pPopup->grab();
+      pPopup->hide();
+    }
+    QToolTip::showText( QPoint( 10, 10 ), "Play video", &Window );
+    QApplication::processEvents();
+    QToolTip::hideText();
+    EXPECT_EQ( Messages.Text(), "" );
     EXPECT_EQ( pPlay->size(), QSize( ButtonSide, ButtonSide ) );
     EXPECT_GE( pSlider->minimumSizeHint().height(), SliderHeight );
   }
