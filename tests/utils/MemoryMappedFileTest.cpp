@@ -64,6 +64,9 @@ namespace
     EXPECT_FALSE( Stream.Read( Byte.data(), 1 ) );
     EXPECT_TRUE( Stream.IsAtEnd() );
     EXPECT_FALSE( ReadAt( Stream, 3 * s_Page + 5, Byte ) );
+    std::uint64_t Position = 0, Size = 0;
+    EXPECT_TRUE( Stream.GetPosition( Position ) && Stream.GetSize( Size ) );
+    EXPECT_EQ( std::make_pair( 3 * s_Page + 5, 3 * s_Page ), std::make_pair( Position, Size ) );
 
     const std::uint64_t Pages[] = { 0, 2, 1, 2, 0 }, Swaps[] = { 2, 2, 3, 3, 4 };
     for( std::size_t i = 0; i < 5; ++i )
