@@ -5,7 +5,6 @@
 
 #include <fstream>
 #include <iostream>
-#include <string>
 
 int main( int i_Count, char** i_ppArguments )
 {
@@ -18,19 +17,18 @@ int main( int i_Count, char** i_ppArguments )
   Plain.Width = 8;
   Plain.Height = 4;
   Plain.Frames = 3;
-  MovTest::VMovSpec AudioTimecode = Plain;
+  MovTest::VMovSpec AudioTimecode = Plain, LargeMdat = Plain;
   AudioTimecode.AudioRate = 8000;
   AudioTimecode.TimecodeFrame = 1234;
   AudioTimecode.SamplesPerChunk = 2;
-  MovTest::VMovSpec LargeMdat = Plain;
   LargeMdat.bLargeMdatFirst = LargeMdat.bCo64Only = LargeMdat.bTwoMdiaFirstEmpty = true;
   for( const auto& rSeed :
        { std::make_pair( "plain.mov", Plain ), std::make_pair( "audio-timecode.mov", AudioTimecode ),
          std::make_pair( "large-mdat-co64.mov", LargeMdat ) } )
   {
-    const std::vector< std::uint8_t > Bytes = MovTest::WriteMov( rSeed.second );
-    std::ofstream Out( std::string( i_ppArguments[1] ) + "/" + rSeed.first, std::ios::binary );
-    Out.write( reinterpret_cast< const char* >( Bytes.data() ), static_cast< std::streamsize >( Bytes.size() ) );
+    const MovTest::VBytes Bytes = MovTest::WriteMov( rSeed.second );
+    std::ofstream( std::string( i_ppArguments[1] ) + "/" + rSeed.first, std::ios::binary )
+        .write( reinterpret_cast< const char* >( Bytes.data() ), static_cast< std::streamsize >( Bytes.size() ) );
   }
   return 0;
 }

@@ -5,49 +5,6 @@
 
 namespace MovTest
 {
-  VAtomWriter& VAtomWriter::U8( std::uint32_t i_Value )
-  {
-    m_Data.push_back( static_cast< std::uint8_t >( i_Value ) );
-    return *this;
-  }
-
-  VAtomWriter& VAtomWriter::Text( const std::string& i_rFourCC )
-  {
-    for( std::size_t i = 0; i < 4; ++i )
-      U8( i < i_rFourCC.size() ? static_cast< std::uint8_t >( i_rFourCC[i] ) : 0 );
-    return *this;
-  }
-
-  VAtomWriter& VAtomWriter::Zeros( std::size_t i_Count )
-  {
-    m_Data.insert( m_Data.end(), i_Count, 0 );
-    return *this;
-  }
-
-  VAtomWriter& VAtomWriter::Begin( const std::string& i_rType )
-  {
-    m_Open.push_back( m_Data.size() );
-    return U32( 0 ).Text( i_rType );
-  }
-
-  VAtomWriter& VAtomWriter::BeginFull( const std::string& i_rType, std::uint32_t i_Flags )
-  {
-    return Begin( i_rType ).U32( i_Flags );
-  }
-
-  VAtomWriter& VAtomWriter::End()
-  {
-    PatchU32( m_Open.back(), static_cast< std::uint32_t >( m_Data.size() - m_Open.back() ) );
-    m_Open.pop_back();
-    return *this;
-  }
-
-  void VAtomWriter::PatchU32( std::size_t i_Offset, std::uint32_t i_Value )
-  {
-    for( std::size_t i = 0; i < 4; ++i )
-      m_Data.at( i_Offset + i ) = static_cast< std::uint8_t >( i_Value >> ( 24 - 8 * i ) );
-  }
-
   std::uint8_t PixelByte( std::uint32_t i_Frame, std::uint64_t i_Byte )
   {
     return static_cast< std::uint8_t >( i_Frame * 37 + i_Byte * 11 + ( i_Byte >> 7 ) );
@@ -158,10 +115,7 @@ namespace MovTest
     }
     w.End();
     if( !s.Qmdt.empty() )
-    {
-      w.Begin( "QMDT" ).Data().insert( w.Data().end(), s.Qmdt.begin(), s.Qmdt.end() );
-      w.End();
-    }
+      w.Begin( "QMDT" ).Append( s.Qmdt.data(), s.Qmdt.size() ).End();
     return w.Zeros( s.StrayBytes ).Data();
   }
 

@@ -15,18 +15,44 @@ namespace MovTest
   class VAtomWriter
   {
   public:
-    VAtomWriter& U8( std::uint32_t i_Value );
+    VAtomWriter& U8( std::uint32_t i_Value )
+    {
+      m_Data.push_back( static_cast< std::uint8_t >( i_Value ) );
+      return *this;
+    }
     VAtomWriter& U16( std::uint32_t i_Value ) { return U8( i_Value >> 8 ).U8( i_Value ); }
     VAtomWriter& U32( std::uint32_t i_Value ) { return U16( i_Value >> 16 ).U16( i_Value ); }
     VAtomWriter& U64( std::uint64_t i_Value ) { return U32( std::uint32_t( i_Value >> 32 ) ).U32( i_Value ); }
-    VAtomWriter& Text( const std::string& i_rFourCC );
-    VAtomWriter& Zeros( std::size_t i_Count );
+    VAtomWriter& Text( const std::string& i_rFourCC ) { return Append( i_rFourCC.data(), 4 ); }
+    VAtomWriter& Zeros( std::size_t i_Count ) { return Append( VBytes( i_Count ).data(), i_Count ); }
+    VAtomWriter& Append( const void* i_pData, std::size_t i_Size )
+    {
+      m_Data.insert( m_Data.end(), static_cast< const char* >( i_pData ),
+                     static_cast< const char* >( i_pData ) + i_Size );
+      return *this;
+    }
     // An atom's header; a full atom's also has its version and flags.
-    VAtomWriter& Begin( const std::string& i_rType );
-    VAtomWriter& BeginFull( const std::string& i_rType, std::uint32_t i_Flags = 0 );
-    VAtomWriter& End();
+    VAtomWriter& Begin( const std::string& i_rType )
+    {
+      m_Open.push_back( m_Data.size() );
+      return U32( 0 ).Text( i_rType );
+    }
+    VAtomWriter& BeginFull( const std::string& i_rType, std::uint32_t i_Flags = 0 )
+    {
+      return Begin( i_rType ).U32( i_Flags );
+    }
+    VAtomWriter& End()
+    {
+      PatchU32( m_Open.back(), static_cast< std::uint32_t >( m_Data.size() - m_Open.back() ) );
+      m_Open.pop_back();
+      return *this;
+    }
     // Overwrites a 32-bit value already written.
-    void PatchU32( std::size_t i_Offset, std::uint32_t i_Value );
+    void PatchU32( std::size_t i_Offset, std::uint32_t i_Value )
+    {
+      for( std::size_t i = 0; i < 4; ++i )
+        m_Data.at( i_Offset + i ) = static_cast< std::uint8_t >( i_Value >> ( 24 - 8 * i ) );
+    }
     std::size_t Size() const { return m_Data.size(); }
     VBytes& Data() { return m_Data; }
 
