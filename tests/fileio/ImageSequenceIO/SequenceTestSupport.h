@@ -36,9 +36,7 @@ namespace ImageSequenceTest
                                                       std::uint32_t i_IndexPad = 8, std::uint32_t i_NumberPad = 8 )
   {
     ImageSequenceIO::VDescriptor Descriptor;
-    Descriptor.FrameInfo.ImageWidth = 48;
-    Descriptor.FrameInfo.ImageHeight = 32;
-    Descriptor.FrameInfo.PixelFormat = ZOL::PixelFormat_R8G8B8;
+    Descriptor.FrameInfo = FrameInfo( 48, 32, ZOL::PixelFormat_R8G8B8 );
     Descriptor.FrameInfo.PixelAspectRatio = 1.0;
     Descriptor.Timing.FramePeriodInTicks = Descriptor.Timing.TicksPerSecond / 25;
     Descriptor.Sequence.FileNamePattern = i_rPattern;
