@@ -2,7 +2,8 @@
 
 // Small recordings for the viewer's tests, written by the test itself. Frame n is one flat grey
 // level, so that the frame on screen or in a buffer tells which one was read; with sound, each
-// frame carries a block of a length of its own, so that a block read for the wrong frame shows.
+// frame carries a block of a length of its own (a frame's worth at 48 kHz plus n % 8 stereo
+// 16-bit samples), so that a block read for the wrong frame shows.
 
 #include "fileio/LumekVideo/VWriter.h"
 #include "videointerface/AttributeRecords.h"
@@ -34,13 +35,7 @@ namespace AppTest
     return i_Level < 30 ? -1 : static_cast< int >( std::lround( ( i_Level - 40 ) / 20.0 ) );
   }
 
-  // The stereo 16-bit samples of frame n's block: a frame's worth at 48 kHz, plus n.
-  inline std::size_t AudioSamples( std::uint64_t i_Frame, std::uint32_t i_FramePeriodInTicks )
-  {
-    return static_cast< std::size_t >( 48000.0 * i_FramePeriodInTicks / ZOL::IVideoTiming().TicksPerSecond ) +
-           i_Frame % 8;
-  }
-
+  // Frames 0 to i_Count - 1 but the missing ones.
   inline std::vector< std::uint64_t > FramesWithout( std::uint64_t i_Count, std::vector< std::uint64_t > i_Missing )
   {
     std::vector< std::uint64_t > Frames;
@@ -71,10 +66,8 @@ namespace AppTest
     Video.ImageHeight = i_Spec.Height;
     Video.PixelFormat = i_Spec.Format;
     Video.PixelAspectRatio = 1.0;
-    ZOL::IAudioFrameInfo Audio;
-    if( i_Spec.bAudio )
-      Audio = { ZOL::AudioSampleFormat_Int16, 48000, 2 };
-
+    const ZOL::IAudioFrameInfo Audio =
+        i_Spec.bAudio ? ZOL::IAudioFrameInfo{ ZOL::AudioSampleFormat_Int16, 48000, 2 } : ZOL::IAudioFrameInfo();
     ZOL::IVideoTiming Timing;
     Timing.FramePeriodInTicks = i_Spec.FramePeriodInTicks;
     ZOL::WriteVideoTiming( i_Spec.Attributes, Timing );
@@ -101,12 +94,13 @@ namespace AppTest
     LumekVideo::VWriter Writer;
     if( !Writer.Create( i_rPath, Video, Audio, i_Spec.Attributes ) )
       return std::string();
+    const std::size_t SamplesPerFrame = 48000ull * i_Spec.FramePeriodInTicks / Timing.TicksPerSecond;
     for( std::uint64_t Frame : i_Spec.Frames )
     {
       const std::vector< std::uint8_t > Pixels( Writer.GetVideoFrameSize(),
                                                 static_cast< std::uint8_t >( FrameLevel( Frame ) ) );
       // A ramp, so that a block is never all zeros.
-      std::vector< std::uint8_t > Sound( i_Spec.bAudio ? AudioSamples( Frame, i_Spec.FramePeriodInTicks ) * 4 : 0 );
+      std::vector< std::uint8_t > Sound( i_Spec.bAudio ? ( SamplesPerFrame + Frame % 8 ) * 4 : 0 );
       for( std::size_t i = 0; i < Sound.size(); ++i )
         Sound[i] = static_cast< std::uint8_t >( i );
       if( !Writer.AppendFrame( Frame, Pixels.data(), Pixels.size(), Sound.empty() ? nullptr : Sound.data(),
@@ -125,13 +119,12 @@ namespace AppTest
       Path = ( std::filesystem::temp_directory_path() /
                ( "apptest-" + std::to_string( getpid() ) + "-" + std::to_string( ++s_Count ) + ".lvid" ) )
                  .string();
-      bWritten = !WriteRecording( Path, i_rSpec ).empty();
+      (void)WriteRecording( Path, i_rSpec ); // a recording not written fails to open
     }
     ~VTempRecording() { std::filesystem::remove( Path ); }
     VTempRecording( const VTempRecording& ) = delete;
     VTempRecording& operator=( const VTempRecording& ) = delete;
 
     std::string Path;
-    bool bWritten = false;
   };
 } // namespace AppTest
