@@ -303,29 +303,25 @@ TEST( LensDistortion, ModelsWithoutParametersReadWithoutThemAndAnUnknownModelFai
   EXPECT_EQ( VLensDistortionCalibration(), Read );
 }
 
+// Written again, what was read gives the same keys: no field of any record lost, moved or changed.
+// A record without its pixel format ends the list; an unknown container text keeps the default.
 TEST( ConversionRecords, RoundTripInOrderAndAGapEndsTheList )
 {
-  std::vector< VConversionRecord > Records(
-      11, { VideoContainer_IMAGES, {}, {}, AudioPayload_None, VideoPayload_ImageTIFF, PixelFormat_Unspecified, {} } );
-  Records[0] = { VideoContainer_AVI,
-                 { 0.5f, 1.8f },
-                 { AudioSampleFormat_UInt8, 22050, 1 },
-                 AudioPayload_Uncompressed,
-                 VideoPayload_VideoH264,
-                 PixelFormat_PlanarY8U8V8,
-                 Lens( RadialModel_Lumek3Parameter, { 0.1, 0.2, 0.3 }, 5, 6 ) };
-  IVideoAttributes Store;
-  ASSERT_TRUE( WriteConversionRecords( Store, Records ) );
-
+  const VConversionRecord Full{ VideoContainer_AVI,
+                                { 0.5f, 1.8f },
+                                { AudioSampleFormat_UInt8, 22050, 1 },
+                                AudioPayload_Uncompressed,
+                                VideoPayload_VideoH264,
+                                PixelFormat_PlanarY8U8V8,
+                                Lens( RadialModel_Lumek3Parameter, { 0.1, 0.2, 0.3 }, 5, 6 ) };
+  IVideoAttributes Store, Again;
+  ASSERT_TRUE( WriteConversionRecords( Store, std::vector< VConversionRecord >( 11, Full ) ) );
   std::vector< VConversionRecord > Read( 1 );
   ReadConversionRecords( Store, Read );
-  ASSERT_EQ( Records.size(), Read.size() );
-  // Written again, what was read gives the same keys: no field lost, moved or changed.
-  IVideoAttributes Again;
+  ASSERT_EQ( 11u, Read.size() );
   ASSERT_TRUE( WriteConversionRecords( Again, Read ) );
   EXPECT_TRUE( Again == Store );
 
-  // A record without its pixel format ends the list; an unknown container text keeps the default.
   Store.Remove( "ConversionRecord.1.VideoFrameInfo.PixelFormat" );
   Store.Set( "ConversionRecord.0.Container", "avi" );
   ReadConversionRecords( Store, Read );
