@@ -75,7 +75,7 @@ namespace
   };
 } // namespace
 
-TEST_F( InstalledTree, HoldsExactlyTheProgramsAndTheDesktopFiles )
+TEST_F( InstalledTree, HoldsExactlyTheProgramsTheirPagesAndTheDesktopFiles )
 {
   std::set< std::string > Expected = {
       "bin/lumekvideoviewer",
@@ -101,10 +101,8 @@ TEST_F( InstalledTree, HoldsExactlyTheProgramsAndTheDesktopFiles )
   EXPECT_EQ( s_Installed, Expected );
   for( const char* pProgram : { "lumekvideoviewer", "lumekvideotool" } )
     EXPECT_TRUE( fs::status( Prefix() / "bin" / pProgram ).permissions() & fs::owner_exe ) << pProgram;
-}
 
-TEST_F( InstalledTree, ManPagesRenderAndCarryTheUsage )
-{
+  // The manual pages render without warnings.
   if( const std::string Absent = Missing( { "man" } ); !Absent.empty() )
     GTEST_SKIP() << s_Install << Absent;
   const auto Render = []( const char* i_pPage )
@@ -120,10 +118,25 @@ TEST_F( InstalledTree, ManPagesRenderAndCarryTheUsage )
     EXPECT_EQ( pPage->find( "warning" ), std::string::npos ) << *pPage;
 }
 
-// The validators Debian ships accept the desktop files, and the file type database built from them
-// names each type.
-TEST_F( InstalledTree, DesktopFilesAreValidAndNameTheTypes )
+// The thumbnailer's command runs as written, the validators Debian ships accept the desktop files,
+// and the file type database built from them names each type.
+TEST_F( InstalledTree, DesktopFilesAreValidAndWorkAsWritten )
 {
+  std::stringstream File;
+  File << std::ifstream( ( Share() / "thumbnailers/lumekvideotool.thumbnailer" ).string() ).rdbuf();
+  const std::string Text = File.str();
+  const auto Exec = Text.find( "\nExec=" ) + 6;
+  std::string Command = Text.substr( Exec, Text.find( '\n', Exec ) - Exec );
+  EXPECT_EQ( Command, "lumekvideotool thumbnail %i %o --size %s" );
+  EXPECT_NE( Text.find( "\nMimeType=video/x-lumek-lvid;" ), std::string::npos ) << Text;
+  // As a thumbnail manager runs it: the program from PATH, the fields replaced by quoted words.
+  const std::string Output = Scratch( "thumb nail.png" ).string();
+  boost::replace_all( Command, "%i", ShellQuote( Recording() ) );
+  boost::replace_all( Command, "%o", ShellQuote( Output ) );
+  boost::replace_all( Command, "%s", "32" );
+  MustRun( "PATH=" + ShellQuote( ( Prefix() / "bin" ).string() ) + ":/usr/bin:/bin " + Command );
+  EXPECT_EQ( QImage( QString::fromStdString( Output ) ).size(), QSize( 32, 24 ) );
+
   // xdg-mime asks GLib under GNOME; its generic path falls back to file(1), which knows no new types.
   if( const std::string Absent =
           Missing( { "desktop-file-validate", "appstreamcli", "xmllint", "update-mime-database", "xdg-mime", "gio" } );
@@ -157,25 +170,6 @@ TEST_F( InstalledTree, DesktopFilesAreValidAndNameTheTypes )
         " XDG_DATA_DIRS=" + ShellQuote( Share().string() ) + " xdg-mime query filetype " + ShellQuote( Path ) );
     EXPECT_EQ( boost::trim_copy( Type ), Expected ) << Path;
   }
-}
-
-TEST_F( InstalledTree, ThumbnailerCommandRunsAsWritten )
-{
-  std::stringstream File;
-  File << std::ifstream( ( Share() / "thumbnailers/lumekvideotool.thumbnailer" ).string() ).rdbuf();
-  const std::string Text = File.str();
-  const auto Exec = Text.find( "\nExec=" ) + 6;
-  std::string Command = Text.substr( Exec, Text.find( '\n', Exec ) - Exec );
-  EXPECT_EQ( Command, "lumekvideotool thumbnail %i %o --size %s" );
-  EXPECT_NE( Text.find( "\nMimeType=video/x-lumek-lvid;" ), std::string::npos ) << Text;
-
-  // As a thumbnail manager runs it: the program from PATH, the fields replaced by quoted words.
-  const std::string Output = Scratch( "thumb nail.png" ).string();
-  boost::replace_all( Command, "%i", ShellQuote( Recording() ) );
-  boost::replace_all( Command, "%o", ShellQuote( Output ) );
-  boost::replace_all( Command, "%s", "32" );
-  MustRun( "PATH=" + ShellQuote( ( Prefix() / "bin" ).string() ) + ":/usr/bin:/bin " + Command );
-  EXPECT_EQ( QImage( QString::fromStdString( Output ) ).size(), QSize( 32, 24 ) );
 }
 
 // The package holds what the install tree holds, under /usr, and nothing to build against.
