@@ -14,6 +14,8 @@ namespace
 
   using PixelFormatDisplayTest = SurfaceDisplayTest;
 
+  // The frames go to one widget in turn, so that its texture meets every change of width, height
+  // and format.
   TEST_F( PixelFormatDisplayTest, HardwareMatchesTheReferencePictureOfEveryFormat )
   {
     const char* const Grey = "Raw Grayscale Decoder";
@@ -38,7 +40,7 @@ namespace
         { ZOL::PixelFormat_BayerGR8, 37, 21, 2, Bayer },
         { ZOL::PixelFormat_BayerBG8, 40, 24, 2, Bayer },
         { ZOL::PixelFormat_BayerGB7, 37, 24, 2, Bayer },
-        { ZOL::PixelFormat_BayerGB6, 40, 21, 2, Bayer },
+        { ZOL::PixelFormat_BayerGB6, 37, 21, 2, Bayer },
         // The card widens 5 and 6 bits by repeating the top bits, the processor by zeros.
         { ZOL::PixelFormat_R5G6B5, 37, 21, 7, RGB },
         { ZOL::PixelFormat_R8G8B8, 37, 21, 0, RGB },
