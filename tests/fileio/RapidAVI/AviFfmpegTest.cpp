@@ -40,12 +40,8 @@ namespace
   const VVideoCase s_VideoCases[] = {
       { "Bgr24BottomUp", "-c:v rawvideo -pix_fmt bgr24 -flipped_raw_rgb 1", ZOL::VideoPayload_Uncompressed,
         ZOL::PixelFormat_B8G8R8, "bgr24", 3, true, 0.0 },
-      { "Gray", "-c:v rawvideo -pix_fmt gray", ZOL::VideoPayload_Uncompressed, ZOL::PixelFormat_Luminance8, "gray", 1,
-        false, 0.0 },
       { "Uyvy422", "-c:v rawvideo -pix_fmt uyvy422", ZOL::VideoPayload_Uncompressed, ZOL::PixelFormat_U8Y8V8Y8,
         "uyvy422", 2, false, 0.0 },
-      { "Mjpeg420", "-c:v mjpeg -pix_fmt yuvj420p -q:v 2", ZOL::VideoPayload_ImageJPEG, ZOL::PixelFormat_R8G8B8,
-        "rgb24", 3, false, 3.0 },
       { "H264", "-c:v libx264 -bf 0 -g 3 -pix_fmt yuv420p", ZOL::VideoPayload_VideoH264, ZOL::PixelFormat_U8Y8V8Y8,
         "uyvy422", 2, false, 2.5 },
   };

@@ -4,8 +4,6 @@
 
 #include "AviTestSupport.h"
 
-#include "tests/support/TestNames.h"
-
 #include <gtest/gtest.h>
 
 using namespace AviTest;
@@ -200,66 +198,45 @@ TEST( AviIndex, DamagedEntriesFailOnlyTheirFrame )
 
 TEST( AviAudio, ChunksBelongToFramesByPlayTime )
 {
-  const VBytes Mono16 = WaveFormat( 1, 1, 48000, 16 );
+  // Half-frame chunks, two a frame; then a chunk of two frames, after which each chunk starts a
+  // frame one frame early, and the last frame is left without audio.
+  const std::vector< std::size_t > ChunkBytes = { 1920, 1920, 1920, 1920, 7680, 3840, 3840 };
+  const std::vector< std::uint64_t > ChunkOfFrame = { 0, 2, 4, 5, 6 };
+  const std::vector< std::vector< std::uint64_t > > Blocks = { { 1920, 1920 }, { 1920, 1920 }, { 7680 },
+                                                               { 3840 },       { 3840 },       {} };
+  // A format refused leaves every frame readable without sound. The formats taken are ffmpeg's
+  // (AviFfmpeg.AudioEveryByteOnceInOrder); IEEE float is taken in its extensible form only.
   const struct
   {
     const char* Name;
     VBytes Format;
-    std::vector< std::size_t > ChunkBytes;
-    std::vector< std::uint64_t > ChunkOfFrame;
-    // The sizes of the audio blocks of each frame.
-    std::vector< std::vector< std::uint64_t > > Frames;
-    // For a format refused, which leaves every frame readable without sound.
-    const char* LogLine = "";
-  } Cases[] = {
-      { "AudioShorterThanVideo", Mono16, { 3840, 3840 }, { 0, 1 }, { { 3840 }, { 3840 }, {}, {}, {} } },
-      // Half-frame chunks, two a frame; then a chunk of two frames, after which each chunk
-      // starts a frame one frame early, and the last frame is left without audio.
-      { "ChunksOfOtherLengths",
-        Mono16,
-        { 1920, 1920, 1920, 1920, 7680, 3840, 3840 },
-        { 0, 2, 4, 5, 6 },
-        { { 1920, 1920 }, { 1920, 1920 }, { 7680 }, { 3840 }, { 3840 }, {} } },
-      { "ZeroSampleRate", WaveFormat( 1, 1, 0, 16 ), { 3840, 3840 }, {}, { {}, {} } },
-      // The formats taken are ffmpeg's (AviFfmpeg.AudioEveryByteOnceInOrder).
-      { "PcmS12",
-        WaveFormat( 1, 1, 48000, 12 ),
-        { 3840, 3840 },
-        {},
-        { {}, {} },
-        "Unsupported audio bits per sample in AVI file." },
-      // IEEE float is taken in its extensible form only.
-      { "PlainFloatTag",
-        WaveFormat( 3, 1, 48000, 32 ),
-        { 3840, 3840 },
-        {},
-        { {}, {} },
-        "Unsupported audio payload in AVI file." },
-  };
-  for( const auto& rCase : Cases )
+    std::string LogLine;
+  } Formats[] = { { "Pcm16", WaveFormat( 1, 1, 48000, 16 ), "" },
+                  { "NoSampleRate", WaveFormat( 1, 1, 0, 16 ), "" },
+                  { "Pcm12", WaveFormat( 1, 1, 48000, 12 ), "Unsupported audio bits per sample in AVI file." },
+                  { "PlainFloatTag", WaveFormat( 3, 1, 48000, 32 ), "Unsupported audio payload in AVI file." } };
+  for( const auto& rFormat : Formats )
   {
-    SCOPED_TRACE( rCase.Name );
-    VAviSpec Spec = GreySpec( static_cast< int >( rCase.Frames.size() ) );
-    Spec.AudioFormat = rCase.Format;
-    for( std::size_t Bytes : rCase.ChunkBytes )
+    const bool bTaken = &rFormat == &Formats[0];
+    SCOPED_TRACE( rFormat.Name );
+    VAviSpec Spec = GreySpec( 6 );
+    Spec.AudioFormat = rFormat.Format;
+    for( std::size_t Bytes : ChunkBytes )
       Spec.AudioChunks.push_back( Frame( Bytes, 0x80 ) );
     LumekTest::VLogCapture Log;
     VOpenedAvi Avi = OpenAvi( BuildAvi( Spec ) );
     ASSERT_TRUE( Avi.bOpened );
-    if( *rCase.LogLine != 0 )
-    {
-      EXPECT_TRUE( Log.Has( rCase.LogLine ) ) << rCase.LogLine;
-      EXPECT_EQ( Avi.pReader->GetAudioPayload(), ZOL::AudioPayload_None );
-    }
-    EXPECT_EQ( Avi.pReader->GetAudioChunkOfFrame(), rCase.ChunkOfFrame );
-    for( std::uint64_t i = 0; i < rCase.Frames.size(); ++i )
+    EXPECT_TRUE( rFormat.LogLine.empty() || Log.Has( rFormat.LogLine ) ) << rFormat.LogLine;
+    EXPECT_TRUE( rFormat.LogLine.empty() || Avi.pReader->GetAudioPayload() == ZOL::AudioPayload_None );
+    EXPECT_EQ( Avi.pReader->GetAudioChunkOfFrame(), bTaken ? ChunkOfFrame : std::vector< std::uint64_t >() );
+    for( std::uint64_t i = 0; i < Blocks.size(); ++i )
     {
       ZOL::IVideoFrame Frame;
       ASSERT_TRUE( Avi.pReader->ReadFrame( i, Frame, true, true ) );
       std::vector< std::uint64_t > Sizes;
       for( const auto& pBlock : Frame.Audio )
         Sizes.push_back( pBlock->GetSize() );
-      EXPECT_EQ( Sizes, rCase.Frames[i] ) << "frame " << i;
+      EXPECT_EQ( Sizes, bTaken ? Blocks[i] : std::vector< std::uint64_t >() ) << "frame " << i;
     }
   }
 }
@@ -346,20 +323,31 @@ namespace
     }
   }
 
-  struct VCorruptionCase
+  // Both index kinds, audio, an AVIX part and a pad byte; or ffmpeg's files.
+  VBytes CorruptionFile( const std::string& i_rName )
   {
-    const char* Name;
-    VBytes ( *Make )();
-  };
+    if( i_rName == "FfmpegMjpegWithAudio" )
+      return ContainerTest::ReadFile( FfmpegAvi(
+          "CorruptMjpeg.avi", "-f lavfi -i sine=sample_rate=8000 -c:v mjpeg -c:a pcm_s16le -shortest -frames:v 3" ) );
+    if( i_rName == "FfmpegH264" )
+      return ContainerTest::ReadFile( FfmpegAvi( "CorruptH264.avi", "-c:v libx264 -bf 0 -frames:v 3" ) );
+    VAviSpec Spec = GreySpec( 6 );
+    Spec.StandardIndexFrames = 4;
+    Spec.AudioFormat = WaveFormat( 1, 2, 48000, 16 );
+    Spec.AudioChunks.assign( 6, Frame( 7680, 0x55 ) );
+    Spec.ExtendedFrames = { Frame( 32, 50 ) };
+    Spec.ExtraMoviChunks = Chunk( "JUNK", VBytes( 3 ) );
+    return BuildAvi( Spec );
+  }
 
-  class AviCorruption : public ::testing::TestWithParam< VCorruptionCase >
+  class AviCorruption : public ::testing::TestWithParam< std::string >
   {
   };
 } // namespace
 
 TEST_P( AviCorruption, CutsAndFlips )
 {
-  const VBytes File = GetParam().Make();
+  const VBytes File = CorruptionFile( GetParam() );
   if( File.empty() )
     GTEST_SKIP() << "no fixture";
   // Thousands of refusals each say why; only a crash or a hang would matter here.
@@ -378,31 +366,5 @@ TEST_P( AviCorruption, CutsAndFlips )
     }
 }
 
-INSTANTIATE_TEST_SUITE_P( Files, AviCorruption,
-                          ::testing::Values( VCorruptionCase{ "HandBuilt",
-                                                              []
-                                                              {
-                                                                // Both index kinds, audio, an AVIX part and a pad byte.
-                                                                VAviSpec Spec = GreySpec( 6 );
-                                                                Spec.StandardIndexFrames = 4;
-                                                                Spec.AudioFormat = WaveFormat( 1, 2, 48000, 16 );
-                                                                Spec.AudioChunks.assign( 6, Frame( 7680, 0x55 ) );
-                                                                Spec.ExtendedFrames = { Frame( 32, 50 ) };
-                                                                Spec.ExtraMoviChunks = Chunk( "JUNK", VBytes( 3 ) );
-                                                                return BuildAvi( Spec );
-                                                              } },
-                                             VCorruptionCase{ "FfmpegMjpegWithAudio",
-                                                              []
-                                                              {
-                                                                return ContainerTest::ReadFile( FfmpegAvi(
-                                                                    "CorruptMjpeg.avi",
-                                                                    "-f lavfi -i sine=sample_rate=8000 -c:v mjpeg "
-                                                                    "-c:a pcm_s16le -shortest -frames:v 3" ) );
-                                                              } },
-                                             VCorruptionCase{ "FfmpegH264",
-                                                              [] {
-                                                                return ContainerTest::ReadFile(
-                                                                    FfmpegAvi( "CorruptH264.avi",
-                                                                               "-c:v libx264 -bf 0 -frames:v 3" ) );
-                                                              } } ),
-                          LumekTest::VCaseName() );
+INSTANTIATE_TEST_SUITE_P( Files, AviCorruption, ::testing::Values( "HandBuilt", "FfmpegMjpegWithAudio", "FfmpegH264" ),
+                          []( const ::testing::TestParamInfo< std::string >& i_rInfo ) { return i_rInfo.param; } );
