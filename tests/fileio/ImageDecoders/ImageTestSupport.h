@@ -41,6 +41,16 @@ namespace LumekTest
     return WriteWholeFile( i_rPath, VBytes( i_rText.begin(), i_rText.end() ) );
   }
 
+  // The bytes cut at i_Position when i_Flip is zero, else whole with the byte there XORed with it.
+  inline VBytes Damaged( const VBytes& i_rWhole, std::size_t i_Position, std::uint8_t i_Flip )
+  {
+    VBytes Bytes( i_rWhole.begin(),
+                  i_rWhole.begin() + std::min( i_Flip ? i_rWhole.size() : i_Position, i_rWhole.size() ) );
+    if( i_Flip && i_Position < Bytes.size() )
+      Bytes[i_Position] ^= i_Flip;
+    return Bytes;
+  }
+
   // A fresh temporary folder that goes with everything in it.
   class VTempFolder
   {

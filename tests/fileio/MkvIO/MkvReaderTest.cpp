@@ -270,14 +270,11 @@ namespace
     for( std::size_t Position = 0; Position < Original.size(); ++Position )
       for( const bool bFlip : { false, true } )
       {
-        VBytes Damaged = Original;
-        if( bFlip )
-          Damaged[Position] ^=
-              static_cast< std::uint8_t >( 0x80 >> ( Position % 8 ) | ( Position % 3 == 0 ? 0xFF : 0 ) );
-        else
-          Damaged.resize( Position );
+        const VBytes Changed = Damaged(
+            Original, Position,
+            bFlip ? static_cast< std::uint8_t >( 0x80 >> ( Position % 8 ) | ( Position % 3 == 0 ? 0xFF : 0 ) ) : 0 );
         MkvIO::VMkvReader Reader;
-        if( !Reader.Open( std::make_unique< libebml::MemReadIOCallback >( Damaged.data(), Damaged.size() ) ) )
+        if( !Reader.Open( std::make_unique< libebml::MemReadIOCallback >( Changed.data(), Changed.size() ) ) )
           continue;
         for( std::uint64_t Frame = 0; Frame < Reader.GetFrameCount() && Frame < 16; ++Frame )
         {
