@@ -20,16 +20,6 @@ namespace
   using namespace LumekVideoToolTest;
   namespace fs = boost::filesystem;
 
-  std::uint64_t LargestPartialSize( const std::string& i_rFolder )
-  {
-    std::uint64_t Largest = 0;
-    boost::system::error_code Error;
-    for( fs::directory_iterator It( i_rFolder, Error ), End; !Error && It != End; It.increment( Error ) )
-      if( It->path().filename().string().find( ".partial-" ) != std::string::npos )
-        Largest = std::max< std::uint64_t >( Largest, fs::file_size( It->path(), Error ) );
-    return Largest;
-  }
-
   TEST( ConvertReplace, AStoppedConversionLeavesTheExistingOutputUntouched )
   {
     const VScratch Scratch;
@@ -60,16 +50,15 @@ namespace
         _exit( 127 );
       }
       const auto Deadline = std::chrono::steady_clock::now() + std::chrono::seconds( 60 );
-      while( LargestPartialSize( Scratch.Path( "" ) ) < ( 8u << 20 ) && std::chrono::steady_clock::now() < Deadline )
+      while( Scratch.Partial().value_or( 0 ) < ( 8u << 20 ) && std::chrono::steady_clock::now() < Deadline )
         std::this_thread::sleep_for( std::chrono::milliseconds( 1 ) );
       const bool bRunning = waitpid( Child, nullptr, WNOHANG ) == 0;
       kill( Child, Signal );
       waitpid( Child, nullptr, 0 );
       ASSERT_TRUE( bRunning ) << "the conversion ended before it could be stopped";
-      EXPECT_EQ( Scratch.HasPartial(), Signal == SIGKILL );
+      EXPECT_EQ( Scratch.Partial().has_value(), Signal == SIGKILL );
       EXPECT_EQ( ReadFileBytes( Output ), Before );
-      const VRun Info = RunTool( { "info", Output } );
-      EXPECT_EQ( Info.ExitCode, 0 ) << Info.Err;
+      EXPECT_EQ( RunInProcess( { "info", Output } ).ExitCode, 0 );
     }
   }
 

@@ -23,22 +23,21 @@ namespace
   }
 } // namespace
 
-TEST( FrameEncoding, BayerSitesFollowTheirPattern )
+TEST( FrameEncoding, LayoutsWorkedOutByHand )
 {
-  const VRGBImage Image = Uniform( 4, 2, 10, 20, 30 );
-  EXPECT_EQ( LumekVideoTool::EncodeFrame( Image, ZOL::PixelFormat_BayerRG8 ),
+  // Bayer sites follow their pattern.
+  const VRGBImage Bayer = Uniform( 4, 2, 10, 20, 30 );
+  EXPECT_EQ( LumekVideoTool::EncodeFrame( Bayer, ZOL::PixelFormat_BayerRG8 ),
              ( std::vector< std::uint8_t >{ 10, 20, 10, 20, 20, 30, 20, 30 } ) );
-  EXPECT_EQ( LumekVideoTool::EncodeFrame( Image, ZOL::PixelFormat_BayerGB8 ),
+  EXPECT_EQ( LumekVideoTool::EncodeFrame( Bayer, ZOL::PixelFormat_BayerGB8 ),
              ( std::vector< std::uint8_t >{ 20, 30, 20, 30, 10, 20, 10, 20 } ) );
-  EXPECT_EQ( LumekVideoTool::EncodeFrame( Image, ZOL::PixelFormat_BayerGR8 ),
+  EXPECT_EQ( LumekVideoTool::EncodeFrame( Bayer, ZOL::PixelFormat_BayerGR8 ),
              ( std::vector< std::uint8_t >{ 20, 10, 20, 10, 30, 20, 30, 20 } ) );
-  EXPECT_EQ( LumekVideoTool::EncodeFrame( Image, ZOL::PixelFormat_BayerBG8 ),
+  EXPECT_EQ( LumekVideoTool::EncodeFrame( Bayer, ZOL::PixelFormat_BayerBG8 ),
              ( std::vector< std::uint8_t >{ 30, 20, 30, 20, 20, 10, 20, 10 } ) );
-}
 
-TEST( FrameEncoding, PackedSamplesAreMostSignificantBitFirst )
-{
-  // The luma of white is 254: seven ones per sample, no gaps.
+  // Packed samples are most significant bit first. The luma of white is 254: seven ones per
+  // sample, no gaps.
   const auto Seven = LumekVideoTool::EncodeFrame( Uniform( 8, 1, 255, 255, 255 ), ZOL::PixelFormat_Luminance7 );
   EXPECT_EQ( Seven, std::vector< std::uint8_t >( 7, 0xFF ) );
   // One white sample among black: 000000 111111 000000 000000 -> 0000 0011 | 1111 0000 | 0000 0000.
@@ -46,11 +45,9 @@ TEST( FrameEncoding, PackedSamplesAreMostSignificantBitFirst )
   Image.Pixels[3] = Image.Pixels[4] = Image.Pixels[5] = 255; // second pixel
   const auto Six = LumekVideoTool::EncodeFrame( Image, ZOL::PixelFormat_Luminance6 );
   EXPECT_EQ( Six, ( std::vector< std::uint8_t >{ 0x03, 0xF0, 0x00 } ) );
-}
 
-TEST( FrameEncoding, TenBitYUVGroupsAndRowPadding )
-{
-  // Grey 128: Y = 127, U = V = 128, so the samples are U 512, Y 508, V 512.
+  // Ten-bit YUV in groups, rows padded. Grey 128: Y = 127, U = V = 128, so the samples are
+  // U 512, Y 508, V 512.
   const auto Frame = LumekVideoTool::EncodeFrame( Uniform( 50, 2, 128, 128, 128 ), ZOL::PixelFormat_U10Y10V10Y10 );
   ASSERT_EQ( Frame.size(), 2u * 2 * 128 ); // two groups of 48 pixels per row
   const std::uint32_t Word = Frame[0] | Frame[1] << 8 | Frame[2] << 16 | static_cast< std::uint32_t >( Frame[3] ) << 24;

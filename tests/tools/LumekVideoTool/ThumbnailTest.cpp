@@ -31,35 +31,21 @@ namespace
     return Largest;
   }
 
-  double MeanOf( const QImage& i_rImage, int i_Channel )
-  {
-    double Sum = 0.0;
-    for( int y = 0; y < i_rImage.height(); ++y )
-      for( int x = 0; x < i_rImage.width(); ++x )
-        Sum += i_rImage.constScanLine( y )[x * 3 + i_Channel];
-    return Sum / ( double( i_rImage.width() ) * i_rImage.height() );
-  }
-
   struct VThumbnailCase
   {
     const char* Name;
-    ZOL::EPixelFormat Format;
-    int Width;
-    int Height;
-    std::vector< std::uint64_t > Frames;
-    bool bInverted;
+    VRecordingSpec Spec; // format, width, height, frames, sound, rows stored bottom to top
     int Size;
-    int ExpectedWidth; // by hand: the longer side becomes Size, never more than the picture
-    int ExpectedHeight;
+    QSize Expected; // by hand: the longer side becomes Size, never more than the picture
   };
 
   const VThumbnailCase s_Cases[] = {
-      { "BayerGB8", ZOL::PixelFormat_BayerGB8, 48, 32, { 0, 1 }, false, 24, 24, 16 },
-      { "YUV422", ZOL::PixelFormat_U8Y8V8Y8, 48, 32, { 0, 1 }, false, 32, 32, 21 },
-      { "Luminance8", ZOL::PixelFormat_Luminance8, 40, 40, { 0 }, false, 10, 10, 10 },
-      { "RGBNotEnlarged", ZOL::PixelFormat_R8G8B8, 48, 32, { 0, 1 }, false, 128, 48, 32 },
-      { "BGRInverted", ZOL::PixelFormat_B8G8R8, 30, 40, { 0, 1 }, true, 20, 15, 20 },
-      { "StartingWithMissingFrames", ZOL::PixelFormat_R8G8B8, 48, 32, { 3, 4, 5 }, false, 16, 16, 11 },
+      { "BayerGB8", { ZOL::PixelFormat_BayerGB8, 48, 32, { 0, 1 } }, 24, { 24, 16 } },
+      { "YUV422", { ZOL::PixelFormat_U8Y8V8Y8, 48, 32, { 0, 1 } }, 32, { 32, 21 } },
+      { "Luminance8", { ZOL::PixelFormat_Luminance8, 40, 40, { 0 } }, 10, { 10, 10 } },
+      { "RGBNotEnlarged", { ZOL::PixelFormat_R8G8B8, 48, 32, { 0, 1 } }, 128, { 48, 32 } },
+      { "BGRInverted", { ZOL::PixelFormat_B8G8R8, 30, 40, { 0, 1 }, false, true }, 20, { 15, 20 } },
+      { "StartingWithMissingFrames", { ZOL::PixelFormat_R8G8B8, 48, 32, { 3, 4, 5 } }, 16, { 16, 11 } },
   };
 
   TEST( Thumbnail, FitsTheSquareAndShowsTheFirstFrameThatReads )
@@ -68,16 +54,11 @@ namespace
     {
       SCOPED_TRACE( rCase.Name );
       VScratch Scratch;
-      VRecordingSpec Spec;
-      Spec.Format = rCase.Format;
-      Spec.Width = rCase.Width;
-      Spec.Height = rCase.Height;
-      Spec.Frames = rCase.Frames;
-      Spec.bInverted = rCase.bInverted;
+      VRecordingSpec Spec = rCase.Spec;
       Spec.Settings.GammaCorrection = 1.4f;
       Spec.Settings.Saturation = 0.7f;
       const std::string Input = WriteRecording( Scratch, "clip.lvid", Spec );
-      const std::string First = std::to_string( rCase.Frames.front() );
+      const std::string First = std::to_string( Spec.Frames.front() );
       ASSERT_EQ(
           RunInProcess( { "thumbnail", Input, Scratch.Path( "thumb.png" ), "--size", std::to_string( rCase.Size ) } )
               .ExitCode,
@@ -88,20 +69,18 @@ namespace
       const QImage Thumbnail = LoadPNG( Scratch.Path( "thumb.png" ) );
       const QImage Frame = LoadPNG( Scratch.Path( "frame_00000" + First + ".png" ) );
       ASSERT_FALSE( Thumbnail.isNull() || Frame.isNull() );
-      EXPECT_EQ( Thumbnail.size(), QSize( rCase.ExpectedWidth, rCase.ExpectedHeight ) );
+      EXPECT_EQ( Thumbnail.size(), rCase.Expected );
       // The viewer's picture of the frame, scaled; scaling moves no colour.
       EXPECT_LE( LargestDifference( Thumbnail, Frame ), 2 );
-      for( int Channel = 0; Channel < 3; ++Channel )
-        EXPECT_NEAR( MeanOf( Thumbnail, Channel ), MeanOf( Frame, Channel ), 4.0 ) << "channel " << Channel;
 
       // RGB is shown as stored, so the written picture itself is the expectation, upside down
       // where the rows were stored bottom to top.
-      if( rCase.Format == ZOL::PixelFormat_R8G8B8 || rCase.Format == ZOL::PixelFormat_B8G8R8 )
+      if( Spec.Format == ZOL::PixelFormat_R8G8B8 || Spec.Format == ZOL::PixelFormat_B8G8R8 )
       {
-        const LumekVideoTool::VRGBImage Written = PictureFor( rCase.Frames.front(), rCase.Width, rCase.Height );
+        const LumekVideoTool::VRGBImage Written = PictureFor( Spec.Frames.front(), Spec.Width, Spec.Height );
         EXPECT_LE( LargestDifference( Thumbnail, QImage( Written.Pixels.data(), Written.Width, Written.Height,
                                                          Written.Width * 3, QImage::Format_RGB888 )
-                                                     .mirrored( false, rCase.bInverted ) ),
+                                                     .mirrored( false, Spec.bInverted ) ),
                    2 );
       }
     }

@@ -35,11 +35,8 @@ namespace LumekVideoToolTest
   {
     const LumekTest::VLogCapture Quiet;
     std::ostringstream Out, Err;
-    VRun Run;
-    Run.ExitCode = LumekVideoTool::RunTool( i_rArguments, Out, Err );
-    Run.Out = Out.str();
-    Run.Err = Err.str();
-    return Run;
+    const int ExitCode = LumekVideoTool::RunTool( i_rArguments, Out, Err );
+    return { ExitCode, Out.str(), Err.str() };
   }
 
   boost::property_tree::ptree ParseJson( const std::string& i_rText )
@@ -57,23 +54,14 @@ namespace LumekVideoToolTest
     return Tree;
   }
 
-  VScratch::VScratch() : m_Folder( fs::temp_directory_path() / fs::unique_path( "lvtool-test-%%%%%%%%" ) )
+  std::optional< std::uint64_t > VScratch::Partial() const
   {
-    fs::create_directories( m_Folder );
-  }
-
-  VScratch::~VScratch()
-  {
+    std::optional< std::uint64_t > Largest;
     boost::system::error_code Error;
-    fs::remove_all( m_Folder, Error );
-  }
-
-  bool VScratch::HasPartial() const
-  {
-    for( const auto& rEntry : fs::directory_iterator( m_Folder ) )
-      if( rEntry.path().filename().string().find( ".partial" ) != std::string::npos )
-        return true;
-    return false;
+    for( fs::directory_iterator It( Folder, Error ), End; !Error && It != End; It.increment( Error ) )
+      if( It->path().filename().string().find( ".partial" ) != std::string::npos )
+        Largest = std::max( Largest.value_or( 0 ), fs::file_size( It->path(), Error ) );
+    return Largest;
   }
 
   LumekVideoTool::VRGBImage PictureFor( std::uint64_t i_Frame, int i_Width, int i_Height )

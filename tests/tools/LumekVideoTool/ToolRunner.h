@@ -10,6 +10,7 @@
 #include <boost/filesystem.hpp>
 #include <boost/property_tree/ptree.hpp>
 
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -33,17 +34,17 @@ namespace LumekVideoToolTest
   boost::property_tree::ptree ParseJson( const std::string& i_rText );
 
   // A folder of its own for each test, removed at the end.
-  class VScratch
+  struct VScratch
   {
-  public:
-    VScratch();
-    ~VScratch();
-    std::string Path( const std::string& i_rName ) const { return ( m_Folder / i_rName ).string(); }
-    // Whether a conversion left a temporary file here.
-    bool HasPartial() const;
+    VScratch() { boost::filesystem::create_directories( Folder ); }
+    ~VScratch() { boost::filesystem::remove_all( Folder, Error ); }
+    std::string Path( const std::string& i_rName ) const { return ( Folder / i_rName ).string(); }
+    // The size of the largest temporary file a conversion left here, if it left any.
+    std::optional< std::uint64_t > Partial() const;
 
-  private:
-    boost::filesystem::path m_Folder;
+    const boost::filesystem::path Folder =
+        boost::filesystem::temp_directory_path() / boost::filesystem::unique_path( "lvtool-test-%%%%%%%%" );
+    boost::system::error_code Error;
   };
 
   struct VRecordingSpec
@@ -54,7 +55,7 @@ namespace LumekVideoToolTest
     std::vector< std::uint64_t > Frames = { 0, 1, 2 };
     bool bAudio = false;
     bool bInverted = false; // rows stored bottom to top
-    ZOL::IVideoSettings Settings;
+    ZOL::IVideoSettings Settings = {};
   };
 
   // A recording whose frame n is PictureFor( n ), written with the .lvid writer, with 25 fps
