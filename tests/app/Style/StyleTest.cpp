@@ -16,10 +16,8 @@
 #include <QDir>
 #include <QGroupBox>
 #include <QHBoxLayout>
-#include <QLabel>
 #include <QLineEdit>
 #include <QMenuBar>
-#include <QPainter>
 #include <QPushButton>
 #include <QQmlComponent>
 #include <QQmlEngine>
@@ -60,38 +58,6 @@ namespace
     pButton->setObjectName( i_pName );
     pButton->setEnabled( i_bEnabled );
     return pButton;
-  }
-
-  // A picture drawn at four times its size: how many pixels it covers, where, and how light they
-  // are, weighted by their alpha.
-  struct VInk
-  {
-    int Opaque = 0;
-    double Lightness = 0.0;
-    QRect Bounds;
-  };
-
-  VInk Render( const std::string& i_rName )
-  {
-    QSvgRenderer Renderer( ":/" + s_Prefix + QString::fromStdString( i_rName ) + ".svg" );
-    QImage Image( Renderer.defaultSize() * 4, QImage::Format_ARGB32_Premultiplied );
-    Image.fill( Qt::transparent );
-    QPainter Painter( &Image );
-    Renderer.render( &Painter );
-    Painter.end();
-    VInk Ink;
-    double Weight = 0.0;
-    for( int y = 0; y < Image.height(); ++y )
-      for( int x = 0; x < Image.width(); ++x )
-        if( const QColor Pixel = QColor::fromRgba( Image.pixel( x, y ) ); Pixel.alpha() > 0 )
-        {
-          ++Ink.Opaque;
-          Ink.Bounds |= QRect( x, y, 1, 1 );
-          Ink.Lightness += Pixel.alphaF() * Pixel.lightnessF();
-          Weight += Pixel.alphaF();
-        }
-    Ink.Lightness /= std::max( Weight, 1e-9 );
-    return Ink;
   }
 } // namespace
 
@@ -192,9 +158,9 @@ TEST( Theme, QmlSingletonGivesTheValuesReadOnly )
   EXPECT_EQ( Margin.toInt(), 10 );
 }
 
-// Every picture the sheet or the window names is there, every one there is used, and each is a
-// drawing of glyphs on a transparent ground; a disabled form is the same shape, dimmer.
-TEST( Pictures, AreThereUsedAndDrawn )
+// Every picture the sheet or the window names is there, every one there is used, and each is
+// drawn on a view box of its own shape, so that it scales to any density without distortion.
+TEST( Pictures, AreThereAndUsed )
 {
   std::set< std::string > InResources;
   for( const QString& rEntry : QDir( ":/" ).entryList( { s_Prefix + "*.svg" }, QDir::Files ) )
@@ -206,25 +172,14 @@ TEST( Pictures, AreThereUsedAndDrawn )
     Used.insert( Matches.next().captured( 1 ).toStdString() );
   ASSERT_GT( Used.size(), 3u );
   EXPECT_EQ( Used, InResources ) << "named by the sheet or the window, and there";
-
   for( const std::string& rName : InResources )
   {
-    SCOPED_TRACE( rName );
     QSvgRenderer Renderer( ":/" + s_Prefix + QString::fromStdString( rName ) + ".svg" );
     const QSize Size = Renderer.defaultSize();
-    ASSERT_TRUE( Renderer.isValid() && !Size.isEmpty() );
-    // Drawn on a view box of the same shape, so it scales to any density without distortion.
+    ASSERT_TRUE( Renderer.isValid() && !Size.isEmpty() ) << rName;
     EXPECT_NEAR( Renderer.viewBoxF().width() / Renderer.viewBoxF().height(), double( Size.width() ) / Size.height(),
-                 1e-6 );
-    const VInk Enabled = Render( rName );
-    EXPECT_GT( Enabled.Opaque, 0 );
-    EXPECT_LT( Enabled.Opaque, Size.width() * Size.height() * 16 );
-    if( InResources.count( rName + "Disabled" ) )
-    {
-      const VInk Disabled = Render( rName + "Disabled" );
-      EXPECT_EQ( Disabled.Bounds, Enabled.Bounds );
-      EXPECT_LT( Disabled.Lightness, Enabled.Lightness - 0.2 );
-    }
+                 1e-6 )
+        << rName;
   }
 }
 
@@ -248,9 +203,9 @@ TEST_F( StyleSheet, NoTokenOrExpressionIsLeft )
   }
 }
 
-// One of each widget the sheet styles, in the states it has rules for, shown and painted with
-// its menus and a tool tip at three densities, so that every rule is parsed and every picture
-// read; the transport buttons and the time bar grow with the density.
+// The sheet on the widgets it has rules for, in their states, shown and painted with a menu
+// and a tool tip at three densities: Qt parses every rule without complaint, and the transport
+// buttons and the time bar grow with the density.
 TEST_F( StyleSheet, QtAppliesItWithoutComplaintAtEveryDensity )
 {
   const std::tuple< int, int, int > Rows[] = { { 96, 40, 20 }, { 144, 60, 30 }, { 192, 80, 40 } };
@@ -263,65 +218,38 @@ TEST_F( StyleSheet, QtAppliesItWithoutComplaintAtEveryDensity )
     QWidget Window;
     auto* pMenuBar = new QMenuBar;
     QMenu* pMenu = pMenuBar->addMenu( "&Playback" );
-    QMenu* pDecoder = pMenu->addMenu( "Decoder" );
-    auto* pGroup = new QActionGroup( pMenu );
-    for( QAction* pAction : { pMenu->addAction( "&Looping" ), pGroup->addAction( pDecoder->addAction( "Hardware" ) ),
-                              pGroup->addAction( pDecoder->addAction( "Software" ) ) } )
-    {
-      pAction->setCheckable( true );
-      pAction->setChecked( pAction->text() != "Software" );
-    }
+    pMenu->addAction( "&Looping" )->setCheckable( true );
     pMenu->addSeparator();
     pMenu->addAction( "Stop" )->setEnabled( false );
-    auto* pLogo = new QLabel;
-    pLogo->setObjectName( "Logo" );
-    pLogo->setPixmap( QPixmap( ":/" + s_Prefix + "LumekLogo.svg" ) );
     auto* pTable = new QTableView;
-    auto* pModel = new QStandardItemModel( 40, 2, pTable );
-    pModel->setHorizontalHeaderLabels( { "Name", "Value" } );
-    pTable->setModel( pModel );
+    pTable->setModel( new QStandardItemModel( 40, 2, pTable ) );
     pTable->setSortingEnabled( true );
-    pTable->setAlternatingRowColors( true );
-    auto* pCheck = new QCheckBox( "Checked" );
-    pCheck->setChecked( true );
     auto* pPartial = new QCheckBox( "Partial" );
     pPartial->setTristate( true );
     pPartial->setCheckState( Qt::PartiallyChecked );
-    pPartial->setEnabled( false );
     auto* pSlider = new LumekVideoViewer::VLabelSlider( Qt::Horizontal );
     auto* pProxy = new LumekVideoViewer::VProxyStyle( pSlider->style() );
     pProxy->setParent( pSlider );
     pSlider->setStyle( pProxy );
     auto* pPlay = NamedButton( "Play" );
-
-    // The panels' own rules reach their children.
-    auto* pInfo = new QWidget;
-    pInfo->setObjectName( "InfoPanel" );
-    auto* pInfoLayout = new QHBoxLayout( pInfo );
-    for( QWidget* pChild :
-         std::initializer_list< QWidget* >{ new QLabel( "No file open" ), pCheck, pPartial, new QLineEdit( "1.23" ) } )
-      pInfoLayout->addWidget( pChild );
+    // The controls' own rules reach their children.
     auto* pControls = new QGroupBox;
     pControls->setObjectName( "Controls" );
     auto* pControlsLayout = new QHBoxLayout( pControls );
     for( QWidget* pChild : std::initializer_list< QWidget* >{ pSlider, new LumekVideoViewer::VClickSpinBox, pPlay,
-                                                              NamedButton( "Stop" ), NamedButton( "FullScreen" ),
-                                                              NamedButton( "Pause", false ), NamedButton( "Close" ) } )
+                                                              NamedButton( "Stop" ), NamedButton( "Pause", false ) } )
       pControlsLayout->addWidget( pChild );
     auto* pLayout = new QVBoxLayout( &Window );
-    for( QWidget* pChild : std::initializer_list< QWidget* >{ pMenuBar, pLogo, pTable, pInfo, pControls } )
+    for( QWidget* pChild :
+         std::initializer_list< QWidget* >{ pMenuBar, pTable, pPartial, new QLineEdit( "1.23" ), pControls } )
       pLayout->addWidget( pChild );
     Window.resize( 800, 600 );
     Window.show();
     QApplication::processEvents();
     (void)Window.grab();
-    for( QMenu* pPopup : { pMenu, pDecoder } )
-    {
-      pPopup->popup( QPoint( 0, 0 ) );
-      QApplication::processEvents();
-      (void)pPopup->grab();
-      pPopup->hide();
-    }
+    pMenu->popup( QPoint( 0, 0 ) );
+    QApplication::processEvents();
+    (void)pMenu->grab();
     QToolTip::showText( QPoint( 10, 10 ), "Play video", &Window );
     QApplication::processEvents();
     QToolTip::hideText();
