@@ -12,7 +12,6 @@
 
 #include <fstream>
 #include <set>
-#include <sstream>
 
 namespace fs = boost::filesystem;
 using LumekTest::RunCommand;
@@ -77,17 +76,15 @@ namespace
 
 TEST_F( InstalledTree, HoldsExactlyTheProgramsTheirPagesAndTheDesktopFiles )
 {
-  std::set< std::string > Expected = {
-      "bin/lumekvideoviewer",
-      "bin/lumekvideotool",
-      "share/applications/" + s_AppId + ".desktop",
-      "share/metainfo/" + s_AppId + ".metainfo.xml",
-      "share/mime/packages/" + s_AppId + ".xml",
-      "share/thumbnailers/lumekvideotool.thumbnailer",
-      "share/icons/hicolor/scalable/apps/" + s_AppId + ".svg",
-      "share/man/man1/lumekvideoviewer.1.gz",
-      "share/man/man1/lumekvideotool.1.gz",
-  };
+  std::set< std::string > Expected = { "bin/lumekvideoviewer",
+                                       "bin/lumekvideotool",
+                                       "share/applications/" + s_AppId + ".desktop",
+                                       "share/metainfo/" + s_AppId + ".metainfo.xml",
+                                       "share/mime/packages/" + s_AppId + ".xml",
+                                       "share/thumbnailers/lumekvideotool.thumbnailer",
+                                       "share/icons/hicolor/scalable/apps/" + s_AppId + ".svg",
+                                       "share/man/man1/lumekvideoviewer.1.gz",
+                                       "share/man/man1/lumekvideotool.1.gz" };
   for( int Size : { 16, 22, 24, 32, 48, 64, 128, 256 } )
   {
     const std::string Icon =
@@ -122,9 +119,8 @@ TEST_F( InstalledTree, HoldsExactlyTheProgramsTheirPagesAndTheDesktopFiles )
 // and the file type database built from them names each type.
 TEST_F( InstalledTree, DesktopFilesAreValidAndWorkAsWritten )
 {
-  std::stringstream File;
-  File << std::ifstream( ( Share() / "thumbnailers/lumekvideotool.thumbnailer" ).string() ).rdbuf();
-  const std::string Text = File.str();
+  const std::string Text =
+      MustRun( "cat " + ShellQuote( ( Share() / "thumbnailers/lumekvideotool.thumbnailer" ).string() ) );
   const auto Exec = Text.find( "\nExec=" ) + 6;
   std::string Command = Text.substr( Exec, Text.find( '\n', Exec ) - Exec );
   EXPECT_EQ( Command, "lumekvideotool thumbnail %i %o --size %s" );

@@ -30,7 +30,6 @@
 
 #include <boost/algorithm/string/join.hpp>
 
-#include <functional>
 #include <memory>
 #include <string>
 #include <thread>
@@ -73,10 +72,8 @@ namespace
       Requests << QString::fromLatin1( Request.left( Request.indexOf( "\r\n" ) ).split( ' ' ).value( 1 ) );
       if( bSilent )
         return;
-      QByteArray Header = QStringLiteral( "HTTP/1.1 %1 %2\r\nContent-Type: text/html\r\nConnection: close\r\n" )
-                              .arg( Status )
-                              .arg( Status == 200 ? "OK" : "Not Found" )
-                              .toLatin1();
+      QByteArray Header = "HTTP/1.1 " + QByteArray::number( Status ) + ( Status == 200 ? " OK" : " Not Found" ) +
+                          "\r\nContent-Type: text/html\r\nConnection: close\r\n";
       if( bAnnounceLength )
         Header += "Content-Length: " + QByteArray::number( qsizetype( Body.size() ) ) + "\r\n";
       io_rSocket.write( Header + "\r\n" + QByteArray::fromStdString( Body ) );
@@ -91,18 +88,19 @@ namespace
     QStringList Requests; // the request targets received so far, e.g. "/?protocol=1.0&name=..."
   };
 
-  // Runs the event loop until i_Done holds or the time is up; deferred deletes happen on the way.
-  // (QTest::qWaitFor sleeps 10 ms a round, which an exchange needs several of.)
-  bool RunUntil( const std::function< bool() >& i_Done )
+  // Runs the event loop until i_rCheck has no listener left or the time is up; deferred deletes
+  // happen on the way. (QTest::qWaitFor sleeps 10 ms a round, which an exchange needs several of.)
+  bool RunUntilIdle( const QObject& i_rCheck )
   {
+    const auto Idle = [&] { return i_rCheck.findChildren< VVersionCheckListener* >().isEmpty(); };
     QEventLoop Loop;
     QTimer Poll;
-    QObject::connect( &Poll, &QTimer::timeout, &Loop, [&] { i_Done() ? Loop.quit() : void(); } );
+    QObject::connect( &Poll, &QTimer::timeout, &Loop, [&] { Idle() ? Loop.quit() : void(); } );
     Poll.start( 5 );
     QTimer::singleShot( 15000, &Loop, &QEventLoop::quit );
-    if( !i_Done() )
+    if( !Idle() )
       Loop.exec();
-    return i_Done();
+    return Idle();
   }
 
   // What a check reports at its end: status, message type, error text and the body.
@@ -112,19 +110,16 @@ namespace
   // written down as "report <status> <message type>".
   struct VRecordingSettings : public VVersionCheckSettings
   {
-    VRecordingSettings( QSettings* i_pStore, std::vector< std::string >& io_rEvents )
-        : VVersionCheckSettings( i_pStore, "LumekVideoViewer", false ), m_rEvents( io_rEvents )
-    {
-    }
+    explicit VRecordingSettings( QSettings* i_pStore ) : VVersionCheckSettings( i_pStore, "LumekVideoViewer", false ) {}
     void Report( int i_Status, const std::string& i_rBody, const std::string& i_rType,
                  const std::string& i_rError ) override
     {
       Outcomes.emplace_back( i_Status, i_rType, i_rError, i_rBody );
-      m_rEvents.push_back( "report " + std::to_string( i_Status ) + " " + i_rType );
+      Events.push_back( "report " + std::to_string( i_Status ) + " " + i_rType );
     }
 
     std::vector< IOutcome > Outcomes;
-    std::vector< std::string >& m_rEvents;
+    std::vector< std::string > Events;
   };
 
   // A dialog as the user sees it: "<icon>[+box]: <text>", the icon being the one of the style's
@@ -178,7 +173,6 @@ namespace
           [this]( bool i_bStartup ) { Events.push_back( i_bStartup ? "done at start" : "done on request" ); } );
     }
     ~VCheckHarness() { Store.clear(); }
-    static bool Idle( const QObject& i_rCheck ) { return i_rCheck.findChildren< VVersionCheckListener* >().isEmpty(); }
 
     bool Send( bool i_bStartupCheck, unsigned i_TimeoutSeconds = 10 )
     {
@@ -186,17 +180,17 @@ namespace
                           i_TimeoutSeconds, "1.0" );
     }
 
-    // One check, run until every listener is gone.
-    bool RunCheck( bool i_bStartupCheck, unsigned i_TimeoutSeconds = 10 )
+    // One check, sent and run until every listener is gone.
+    void RunCheck( bool i_bStartupCheck, unsigned i_TimeoutSeconds = 10 )
     {
-      const bool bSent = Send( i_bStartupCheck, i_TimeoutSeconds );
-      EXPECT_TRUE( RunUntil( [this] { return Idle( Check ); } ) );
-      return bSent;
+      EXPECT_TRUE( Send( i_bStartupCheck, i_TimeoutSeconds ) );
+      EXPECT_TRUE( RunUntilIdle( Check ) );
     }
 
     QSettings Store{ "Lumek Labs Ltd", "LumekVideoViewer" };
-    std::vector< std::string > Events, Shown;
-    std::shared_ptr< VRecordingSettings > pSettings = std::make_shared< VRecordingSettings >( &Store, Events );
+    std::shared_ptr< VRecordingSettings > pSettings = std::make_shared< VRecordingSettings >( &Store );
+    std::vector< std::string >& Events = pSettings->Events; // what the check did, in order
+    std::vector< std::string > Shown;
     VTestServer Server;
     VVersionCheck Check{ nullptr, "" };
     bool bTickBox = false;
@@ -214,7 +208,7 @@ namespace
   TEST( VersionCheckExchange, ShowsAndReportsWhatTheReplyAsksFor )
   {
     const std::string Whitelisted = Page( "3.0", "NONE", "A", ",\"Whitelist\":[\"1.10.0.137509h\",\"1.9.0.1h\"]" );
-    const std::string Newest = "version 1.11.0.140100h";
+    const std::string Newest = "version 1.11.0.140100h", Start = "done at start", Asked = "done on request";
     const struct
     {
       const char* Name;
@@ -225,38 +219,33 @@ namespace
       std::vector< std::string > Events;
     } Cases[] = {
         // clang-format off
-        { "NoneAtStart", None, 200, true, false, { Newest, "report 0 NONE", "done at start" } },
+        { "NoneAtStart", None, 200, true, false, { Newest, "report 0 NONE", Start } },
         // A "2.0" reply is answered by silence.
         { "Format2AtStart", Page( "2.0", "REQUIRED", "A" ), 200, true, false, {} },
         { "Format3NewAtStart", Whitelisted, 200, true, false,
-          { "whitelist [1.10.0.137509h 1.9.0.1h]", Newest, "report 0 NONE", "done at start" } },
-        { "Format3DeclinedAtStart", Whitelisted, 200, true, true, { "report 0 NONE", "done at start" } },
+          { "whitelist [1.10.0.137509h 1.9.0.1h]", Newest, "report 0 NONE", Start } },
+        { "Format3DeclinedAtStart", Whitelisted, 200, true, true, { "report 0 NONE", Start } },
         { "Format3WithoutWhitelistDeclinedOnRequest", Page( "3.0", "NONE", "A" ), 200, false, true,
-          { "whitelist []", Newest, "report 0 NONE", "done on request" } },
-        { "UnknownFormatOnRequest", Page( "4.0", "REQUIRED", "A" ), 200, false, false,
-          { "report 0 REQUIRED", "done on request" } },
-        { "NoCommentAtStart", "<html><body>Down for maintenance</body></html>", 200, true, false,
-          { "report 0 NONE", "done at start" } },
+          { "whitelist []", Newest, "report 0 NONE", Asked } },
+        { "UnknownFormatOnRequest", Page( "4.0", "REQUIRED", "A" ), 200, false, false, { "report 0 REQUIRED", Asked } },
+        { "NoCommentAtStart", "<html><body>Down</body></html>", 200, true, false, { "report 0 NONE", Start } },
         // Nothing at start depends on the server: only a user who asked hears that it failed.
-        { "NotFoundAtStart", Page( "1.0", "REQUIRED", "A" ), 404, true, false, { "report 203 NONE", "done at start" } },
+        { "NotFoundAtStart", Page( "1.0", "REQUIRED", "A" ), 404, true, false, { "report 203 NONE", Start } },
         { "RefusedOnRequest", "", 0, false, false,
           { "critical: Unable to contact version check server.\nPlease check your network connection and try again.\n"
-            "https://support.lumek.example/LumekVideoViewer/", "report 1 NONE", "done on request" } },
+            "https://support.lumek.example/LumekVideoViewer/", "report 1 NONE", Asked } },
         // clang-format on
     };
     for( const auto& rCase : Cases )
     {
       SCOPED_TRACE( rCase.Name );
       VCheckHarness H;
-      if( rCase.bDeclined )
-      {
-        H.pSettings->SetMessageId( "A" );
-        H.pSettings->SetShowOnStartup( false );
-      }
+      H.pSettings->SetMessageId( rCase.bDeclined ? "A" : "" );
+      H.pSettings->SetShowOnStartup( !rCase.bDeclined );
       H.Check.SetServer( rCase.HttpStatus == 0 ? VTestServer::ClosedUrl() : H.Server.Url().toStdString() );
       H.Server.Body = rCase.Body;
       H.Server.Status = rCase.HttpStatus;
-      ASSERT_TRUE( H.RunCheck( rCase.bStartupCheck ) );
+      H.RunCheck( rCase.bStartupCheck );
       EXPECT_EQ( H.Events, rCase.Events );
       // The settings are given the body as it came, from a server that failed too.
       for( const IOutcome& rOutcome : H.pSettings->Outcomes )
@@ -313,7 +302,7 @@ namespace
   TEST_F( VersionCheckTest, SilentOrFloodingServerFailsQuietly )
   {
     Server.bSilent = true;
-    ASSERT_TRUE( RunCheck( false, 1 ) );
+    RunCheck( false, 1 );
     EXPECT_EQ( pSettings->Outcomes, ( std::vector< IOutcome >{ { 4, "NONE", "Version check request timeout", "" } } ) );
     EXPECT_EQ( Server.Requests.size(), 1 );
 
@@ -338,7 +327,7 @@ namespace
     bool bSentFromThread = true;
     std::thread( [&] { bSentFromThread = Send( true ); } ).join();
     EXPECT_FALSE( bSentFromThread );
-    EXPECT_TRUE( Idle( Check ) );
+    EXPECT_TRUE( Check.findChildren< VVersionCheckListener* >().isEmpty() );
 
     // A listener that finishes without a reply has nothing to read; a later timeout adds nothing.
     VVersionCheckListener Listener( "LumekVideoViewer", true, pSettings, nullptr, {}, nullptr );
@@ -417,7 +406,7 @@ namespace
                                                  { Shown.push_back( Describe( io_rBox ) ); } );
     ASSERT_TRUE( pSpoofed->CheckAtStartup() );
     ASSERT_TRUE( pSpoofed->CheckOnRequest() );
-    RunUntil( [&] { return Idle( pSpoofed->GetVersionCheck() ); } );
+    RunUntilIdle( pSpoofed->GetVersionCheck() );
     const QString Request =
         QString::fromStdString( "/?protocol=1.0&name=LumekVideoViewer&version=0.3.0.55914h&system=" + SystemText() );
     EXPECT_EQ( Server.Requests, ( QStringList{ Request, Request } ) );
