@@ -86,47 +86,32 @@ namespace
     EXPECT_GT( Log.Messages.size(), LinesBefore );
   }
 
-  // 80 frames, a key frame every 30: key frames at 0, 30 and 60.
-  class H264RandomAccess : public H264Decoder
+  // 80 frames, a key frame every 30: key frames at 0, 30 and 60. The video source reaches any
+  // frame by decoding forward from the key frame before it.
+  TEST_F( H264Decoder, TheVideoSourceGivesFfmpegsFramesWhereverItGoes )
   {
-  protected:
-    void SetUp() override
-    {
-      H264Decoder::SetUp();
-      if( IsSkipped() )
-        return;
-      Stream = MakeH264Stream( 96, 64, 80, 30 );
-      Expected = ExpectedUYVYFrames( Stream );
-      ASSERT_EQ( Stream.AccessUnits.size(), 80u );
-      ASSERT_EQ( Expected.size(), 80u );
-    }
-
-    std::shared_ptr< VMemoryH264Reader > Open( const VH264Stream& i_rStream,
-                                               const std::vector< std::uint64_t >& i_rNumbers = {} )
+    const VH264Stream Stream = MakeH264Stream( 96, 64, 80, 30 );
+    const std::vector< VBytes > Expected = ExpectedUYVYFrames( Stream );
+    ASSERT_EQ( Stream.AccessUnits.size(), 80u );
+    ASSERT_EQ( Expected.size(), 80u );
+    std::unique_ptr< VVideoSource > pSource;
+    auto Open = [&]( const VH264Stream& i_rStream, const std::vector< std::uint64_t >& i_rNumbers = {} )
     {
       auto pReader = std::make_shared< VMemoryH264Reader >( i_rStream, i_rNumbers );
-      Source = std::make_unique< VVideoSource >();
-      EXPECT_TRUE( Source->Open( "memory.h264", pReader ) );
+      pSource = std::make_unique< VVideoSource >();
+      EXPECT_TRUE( pSource->Open( "memory.h264", pReader ) );
       return pReader;
-    }
-
-    ::testing::AssertionResult FrameIs( std::uint64_t i_Index, std::size_t i_Expected )
+    };
+    auto FrameIs = [&]( std::uint64_t i_Index, std::size_t i_Expected )
     {
       ZOL::IVideoFrame Frame;
-      if( !Source->GetFrame( i_Index, Frame ) || !Frame.Video )
+      if( !pSource->GetFrame( i_Index, Frame ) || !Frame.Video )
         return ::testing::AssertionFailure() << "frame " << i_Index << " did not decode";
       if( Bytes( *Frame.Video ) != Expected[i_Expected] )
         return ::testing::AssertionFailure() << "frame " << i_Index << " differs from ffmpeg's";
       return ::testing::AssertionSuccess();
-    }
+    };
 
-    VH264Stream Stream;
-    std::vector< VBytes > Expected;
-    std::unique_ptr< VVideoSource > Source;
-  };
-
-  TEST_F( H264RandomAccess, JumpsGiveFfmpegsFrames )
-  {
     // Alone mid-group, around a key frame and at the end; backwards; forward within a group;
     // across groups.
     for( const char* pJump :
@@ -137,10 +122,7 @@ namespace
       for( std::uint64_t Index = 0; Jump >> Index; )
         EXPECT_TRUE( FrameIs( Index, Index ) ) << "jumping " << pJump;
     }
-  }
 
-  TEST_F( H264RandomAccess, PlaybackReadsEachFrameOnceAcrossGapsInTheIndex )
-  {
     // Stored under numbers with holes after 9 and 49, frames still follow each other in
     // decoding order, so nothing is decoded twice. The first frame is read once more, to see
     // that it is a key frame.
@@ -157,17 +139,14 @@ namespace
     // A jump into the second hole's far side still finds the key frame before it.
     Open( Stream, Holes );
     EXPECT_TRUE( FrameIs( Holes[55], 55 ) );
-  }
 
-  TEST_F( H264RandomAccess, FramesWithoutTheirKeyFrameAreFalseAnswers )
-  {
     // The first ten frames are gone: 0 to 19 of the rest lack their references, 20 (the
     // original 30) is a key frame and everything from there matches.
     VH264Stream Cut = Stream;
     Cut.AccessUnits.erase( Cut.AccessUnits.begin(), Cut.AccessUnits.begin() + 10 );
     Open( Cut );
     ZOL::IVideoFrame Frame;
-    EXPECT_FALSE( Source->GetFrame( 5, Frame ) );
+    EXPECT_FALSE( pSource->GetFrame( 5, Frame ) );
     EXPECT_TRUE( FrameIs( 21, 31 ) );
     EXPECT_TRUE( FrameIs( 20, 30 ) );
     for( std::uint64_t i = 21; i < 70; ++i )
@@ -179,7 +158,7 @@ namespace
     Cut.AccessUnits.insert( Cut.AccessUnits.end(), 1500, Stream.AccessUnits[1] );
     const auto pReader = Open( Cut );
     VLogCapture Log( "H264IO" );
-    EXPECT_FALSE( Source->GetFrame( 1400, Frame ) );
+    EXPECT_FALSE( pSource->GetFrame( 1400, Frame ) );
     EXPECT_TRUE( Log.Has( "No key frame within 1200 frames before frame 1400." ) );
     EXPECT_EQ( pReader->Reads, 1200u );
     EXPECT_TRUE( FrameIs( 0, 0 ) );
