@@ -49,8 +49,7 @@ namespace
   protected:
     static void SetUpTestSuite()
     {
-      s_Root = fs::temp_directory_path() / fs::unique_path( "lumek-install-%%%%%%%%" );
-      fs::create_directories( s_Root );
+      s_Root = boost::trim_copy( MustRun( "mktemp -d" ) );
       MustRun( "cmake --install " + ShellQuote( LUMEK_BUILD_DIR ) + " --prefix " + ShellQuote( Prefix().string() ) );
       for( fs::recursive_directory_iterator It( Prefix() ), End; It != End; ++It )
         if( !fs::is_directory( It->path() ) )
@@ -58,11 +57,7 @@ namespace
       MustRun( ShellQuote( ( Prefix() / "bin/lumekvideotool" ).string() ) + " make-sample " +
                ShellQuote( Recording() ) + " --width 64 --height 48 --frames 2 --no-audio" );
     }
-    static void TearDownTestSuite()
-    {
-      boost::system::error_code Error;
-      fs::remove_all( s_Root, Error );
-    }
+    static void TearDownTestSuite() { RunCommand( "rm -rf " + ShellQuote( s_Root.string() ) ); }
     static fs::path Prefix() { return s_Root / "prefix"; }
     static fs::path Share() { return Prefix() / "share"; }
     static fs::path Scratch( const std::string& i_rName ) { return s_Root / i_rName; }
@@ -152,7 +147,6 @@ TEST_F( InstalledTree, DesktopFilesAreValidAndWorkAsWritten )
       EXPECT_EQ( Out.find( pWord ), std::string::npos ) << rCommand << "\n" << Out;
   }
 
-  fs::create_directories( Scratch( "home" ) );
   const std::string Renamed = Scratch( "take.bin" ).string(), Sequence = Scratch( "take.lumekimagesequence" ).string();
   fs::copy_file( Recording(), Renamed );
   std::ofstream( Sequence ) << "frames/take_%06d.png\n";
@@ -161,9 +155,9 @@ TEST_F( InstalledTree, DesktopFilesAreValidAndWorkAsWritten )
        { std::pair( Recording(), "video/x-lumek-lvid" ), std::pair( Renamed, "video/x-lumek-lvid" ),
          std::pair( Sequence, "application/x-lumek-imagesequence" ) } )
   {
-    const std::string Type = MustRun(
-        "XDG_CURRENT_DESKTOP=GNOME XDG_DATA_HOME=" + ShellQuote( Scratch( "home" ).string() ) +
-        " XDG_DATA_DIRS=" + ShellQuote( Share().string() ) + " xdg-mime query filetype " + ShellQuote( Path ) );
+    const std::string Type = MustRun( "XDG_CURRENT_DESKTOP=GNOME XDG_DATA_HOME=" + ShellQuote( s_Root.string() ) +
+                                      " XDG_DATA_DIRS=" + ShellQuote( Share().string() ) + " xdg-mime query filetype " +
+                                      ShellQuote( Path ) );
     EXPECT_EQ( boost::trim_copy( Type ), Expected ) << Path;
   }
 }

@@ -58,7 +58,6 @@ namespace
                         } );
     }
 
-    // "http://127.0.0.1:<port>/"
     QString Url() const { return QStringLiteral( "http://127.0.0.1:%1/" ).arg( Listener.serverPort() ); }
     // The address of a port on 127.0.0.1 where nothing listens.
     static std::string ClosedUrl() { return VTestServer().Url().toStdString(); }
@@ -274,7 +273,6 @@ namespace
     bTickBox = false;
     RunCheck( true );
     EXPECT_TRUE( pSettings->GetShowOnStartup() );
-    EXPECT_EQ( Store.value( "LumekVideoViewer.MessageId" ).toString(), "B" );
     bTickBox = true;
     RunCheck( true );
     EXPECT_FALSE( pSettings->GetShowOnStartup() );
@@ -286,7 +284,6 @@ namespace
     EXPECT_EQ( Shown, ( std::vector< std::string >{ "information+box: Message A", "information: Message A",
                                                     "information+box: Message B", "information+box: Message B",
                                                     "information: Message B", "information: Message B" } ) );
-    EXPECT_EQ( Server.Requests.size(), 7 );
 
     // A forced setting shows at start whatever the store says; without a store nothing is kept.
     EXPECT_TRUE( VVersionCheckSettings( &Store, "LumekVideoViewer", true ).GetShowOnStartup() );
@@ -304,7 +301,6 @@ namespace
     Server.bSilent = true;
     RunCheck( false, 1 );
     EXPECT_EQ( pSettings->Outcomes, ( std::vector< IOutcome >{ { 4, "NONE", "Version check request timeout", "" } } ) );
-    EXPECT_EQ( Server.Requests.size(), 1 );
 
     Server.bSilent = false;
     Server.Body = std::string( 2 * VVersionCheck::MaximumReplyBytes, 'x' );
@@ -393,20 +389,16 @@ namespace
   {
     VApplicationVersionCheck Unreleased( nullptr, nullptr, nullptr, "http://127.0.0.1:9/", "" );
     EXPECT_FALSE( Unreleased.CheckAtStartup() || Unreleased.CheckOnRequest() ) << "no release record, nothing sent";
-    const auto Released = [&]( const std::string& i_rSpoofVersion )
-    {
-      return std::make_unique< VApplicationVersionCheck >( nullptr, &Store, &LumekVideoViewer::ApplicationVersion(),
-                                                           Server.Url().toStdString(), i_rSpoofVersion );
-    };
-    EXPECT_EQ( Released( "" )->GetVersionText(), "1.10.0.137509h" );
+    const VApplicationVersionCheck Released( nullptr, &Store, &LumekVideoViewer::ApplicationVersion(), "", "" );
+    EXPECT_EQ( Released.GetVersionText(), "1.10.0.137509h" );
 
     Server.Body = None;
-    const auto pSpoofed = Released( "0.3.0.55914h" );
-    pSpoofed->GetVersionCheck().SetDialogRunner( [&]( VVersionCheckMessageBox& io_rBox )
-                                                 { Shown.push_back( Describe( io_rBox ) ); } );
-    ASSERT_TRUE( pSpoofed->CheckAtStartup() );
-    ASSERT_TRUE( pSpoofed->CheckOnRequest() );
-    RunUntilIdle( pSpoofed->GetVersionCheck() );
+    VApplicationVersionCheck Spoofed( nullptr, &Store, &LumekVideoViewer::ApplicationVersion(),
+                                      Server.Url().toStdString(), "0.3.0.55914h" );
+    Spoofed.GetVersionCheck().SetDialogRunner( [&]( VVersionCheckMessageBox& io_rBox )
+                                               { Shown.push_back( Describe( io_rBox ) ); } );
+    ASSERT_TRUE( Spoofed.CheckAtStartup() && Spoofed.CheckOnRequest() );
+    RunUntilIdle( Spoofed.GetVersionCheck() );
     const QString Request =
         QString::fromStdString( "/?protocol=1.0&name=LumekVideoViewer&version=0.3.0.55914h&system=" + SystemText() );
     EXPECT_EQ( Server.Requests, ( QStringList{ Request, Request } ) );

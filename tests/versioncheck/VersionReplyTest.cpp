@@ -12,6 +12,8 @@
 
 #include <regex>
 #include <string>
+#include <tuple>
+#include <utility>
 #include <vector>
 
 namespace
@@ -84,11 +86,8 @@ namespace
     std::string Deep = "<HTML><BODY>";
     for( int Index = 0; Index < 100000; ++Index )
       Deep += "<a>";
-    const struct
-    {
-      std::string Body, MessageType;
-      std::vector< std::string > Lines;
-    } Cases[] = {
+    // The page, the message type, the lines logged.
+    const std::tuple< std::string, std::string, std::vector< std::string > > Cases[] = {
         { Page, "REQUIRED", { "2 New release", "2 Please update & restart" } },
         { Page, "NONE", { "5 New release", "5 Please update & restart" } },
         { Page, "OPTIONAL", { "3 New release", "3 Please update & restart" } },
@@ -97,21 +96,18 @@ namespace
         { "<HTML><BODY><p>unclosed</BODY>", "NONE", Failed },
         { Deep, "NONE", Failed },
     };
-    for( const auto& rCase : Cases )
+    for( const auto& [Body, MessageType, Lines] : Cases )
     {
-      SCOPED_TRACE( rCase.Body.substr( 0, 40 ) + " as " + rCase.MessageType );
+      SCOPED_TRACE( Body.substr( 0, 40 ) + " as " + MessageType );
       LumekTest::VLogCapture Capture( "CheckVersion" );
-      EXPECT_EQ( VersionCheck::ReadHtmlReply( rCase.Body, rCase.MessageType ), rCase.Lines != Failed );
-      EXPECT_EQ( Capture.Lines(), rCase.Lines );
+      EXPECT_EQ( VersionCheck::ReadHtmlReply( Body, MessageType ), Lines != Failed );
+      EXPECT_EQ( Capture.Lines(), Lines );
     }
   }
 
   TEST( SystemText, GoldenOsReleaseFiles )
   {
-    const struct
-    {
-      std::string OsRelease, SystemText;
-    } Cases[] = {
+    const std::pair< std::string, std::string > Cases[] = {
         { "PRETTY_NAME=\"Debian GNU/Linux 12 (bookworm)\"\nNAME=\"Debian GNU/Linux\"\nVERSION_ID=\"12\"\n",
           "Debian+GNU/Linux+12+(bookworm)+64Bit" },
         { "NAME=x\nPRETTY_NAME='Fedora Linux 40'\n", "Fedora+Linux+40+64Bit" },
@@ -122,10 +118,9 @@ namespace
         { "XPRETTY_NAME=no\nNAME=yes\n", "yes+64Bit" },                         // a prefix is not the key
         { "", "Linux+64Bit" },
     };
-    for( const auto& rCase : Cases )
-      EXPECT_EQ( VersionCheck::SystemTextFromName( VersionCheck::OperatingSystemName( rCase.OsRelease ) ),
-                 rCase.SystemText )
-          << rCase.OsRelease;
+    for( const auto& [OsRelease, SystemText] : Cases )
+      EXPECT_EQ( VersionCheck::SystemTextFromName( VersionCheck::OperatingSystemName( OsRelease ) ), SystemText )
+          << OsRelease;
   }
 
   // A build that is never told a server must not reach a real host: every address the check knows
