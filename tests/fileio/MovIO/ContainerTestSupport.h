@@ -5,6 +5,7 @@
 // conversion of a file to a recording.
 
 #include "tests/support/FfmpegFixtures.h"
+#include "tests/support/LogCapture.h"
 #include "utils/MemoryStream.h"
 #include "videointerface/AttributeRecords.h"
 
@@ -79,6 +80,26 @@ namespace ContainerTest
     EXPECT_TRUE( ZOL::WriteVideoFrameInfo( FrameStore, Info ) && ZOL::WriteVideoTiming( io_rAttributes, o_rTiming ) &&
                  FrameStore.WriteTo( Stores ) && io_rAttributes.WriteTo( Stores ) );
     return Stores.GetData();
+  }
+
+  // i_Read on the file cut short, and with one byte zeroed or its lowest or highest bit flipped, at
+  // every byte of [i_DenseFrom, i_DenseTo) and at every i_Step-th byte elsewhere. Every outcome is
+  // allowed but a crash, a hang or a read outside the file; the sanitizer build fails those.
+  inline void CutsAndFlips( const VBytes& i_rFile, std::size_t i_DenseFrom, std::size_t i_DenseTo, std::size_t i_Step,
+                            const std::function< void( const VBytes& ) >& i_Read )
+  {
+    // Thousands of refusals each say why; only a crash or a hang would matter here.
+    LumekTest::VLogCapture Quiet( "", 0 );
+    for( std::size_t At = 0; At < i_rFile.size(); At += At >= i_DenseFrom && At < i_DenseTo ? 1 : i_Step )
+    {
+      i_Read( VBytes( i_rFile.begin(), i_rFile.begin() + static_cast< std::ptrdiff_t >( At ) ) );
+      for( const int Value : { 0, i_rFile[At] ^ 0x01, i_rFile[At] ^ 0x80 } )
+      {
+        VBytes Damaged = i_rFile;
+        Damaged[At] = static_cast< std::uint8_t >( Value );
+        i_Read( Damaged );
+      }
+    }
   }
 
 #ifdef LUMEK_TOOL_PATH

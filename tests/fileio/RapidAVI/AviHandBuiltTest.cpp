@@ -345,25 +345,13 @@ namespace
   };
 } // namespace
 
+// Every byte of the headers, then a spread over the rest.
 TEST_P( AviCorruption, CutsAndFlips )
 {
   const VBytes File = CorruptionFile( GetParam() );
   if( File.empty() )
     GTEST_SKIP() << "no fixture";
-  // Thousands of refusals each say why; only a crash or a hang would matter here.
-  LumekTest::VLogCapture Quiet( "", 0 );
-  // Cuts: every byte of the headers, then a spread over the rest.
-  const std::size_t Step = std::max< std::size_t >( 1, File.size() / 300 );
-  for( std::size_t Cut = 0; Cut < File.size(); Cut += Cut < 512 ? 1 : Step )
-    ReadEverything( VBytes( File.begin(), File.begin() + static_cast< std::ptrdiff_t >( Cut ) ) );
-  // Flips: each byte of the headers and indexes turned to a few values that matter.
-  for( std::size_t At = 0; At < File.size(); At += At < 512 ? 1 : Step )
-    for( std::uint8_t Value : { std::uint8_t( 0x00 ), std::uint8_t( 0xFF ), std::uint8_t( File[At] ^ 0x80 ) } )
-    {
-      VBytes Damaged = File;
-      Damaged[At] = Value;
-      ReadEverything( Damaged );
-    }
+  ContainerTest::CutsAndFlips( File, 0, 512, std::max< std::size_t >( 1, File.size() / 300 ), ReadEverything );
 }
 
 INSTANTIATE_TEST_SUITE_P( Files, AviCorruption, ::testing::Values( "HandBuilt", "FfmpegMjpegWithAudio", "FfmpegH264" ),
