@@ -122,23 +122,10 @@ TEST( LabelSlider, PaintsMarksWhereTheFramesAre )
   }
 }
 
-// The slider declines the wheel, so that Qt hands a turn over the bar on to the window, which
-// steps the frames.
-TEST( LabelSlider, DeclinesTheWheel )
-{
-  VLabelSlider Slider( Qt::Horizontal );
-  Slider.setRange( 0, 100 );
-  Slider.setValue( 50 );
-  QWheelEvent Wheel( QPointF( 5, 5 ), QPointF( 5, 5 ), QPoint(), QPoint( 0, 120 ), Qt::NoButton, Qt::NoModifier,
-                     Qt::NoScrollPhase, false );
-  QApplication::sendEvent( &Slider, &Wheel );
-  EXPECT_FALSE( Wheel.isAccepted() );
-  EXPECT_EQ( Slider.value(), 50 );
-}
-
 // The time bar and the frame box as the window builds them, with and without the sheet. The
 // window moves both while playing: only the user's clicks may reach the seek. With the proxy, a
-// click on the groove jumps there; the plain style pages.
+// click on the groove jumps there; the plain style pages. The bar declines the wheel, so that Qt
+// hands a turn over it on to the window, which steps the frames.
 TEST( Controls, WindowMovesAreSilentAndClicksAreHeard )
 {
   const std::tuple< bool, bool, int, QStyle::SubControl, int > Rows[] = {
@@ -179,6 +166,10 @@ TEST( Controls, WindowMovesAreSilentAndClicksAreHeard )
     QTest::mouseClick( &Slider, Qt::LeftButton, Qt::NoModifier, QPoint( X, Groove.center().y() ) );
     EXPECT_NEAR( Slider.value(), Jumped, 1 );
     EXPECT_EQ( SliderChanged.count(), 1 );
+    QWheelEvent Wheel( QPointF( X, 5 ), QPointF( X, 5 ), QPoint(), QPoint( 0, 120 ), Qt::NoButton, Qt::NoModifier,
+                       Qt::NoScrollPhase, false );
+    QApplication::sendEvent( &Slider, &Wheel );
+    EXPECT_FALSE( Wheel.isAccepted() );
     QTest::mouseClick( &Box, Qt::LeftButton, Qt::NoModifier, Box.ArrowCentre( Arrow ) );
     ASSERT_EQ( BoxChanged.count(), 1 );
     EXPECT_EQ( BoxChanged.front().front().toInt(), Stepped );

@@ -53,17 +53,6 @@ namespace
   };
 } // namespace
 
-// The window shows these while no file is open.
-TEST_F( VideoSource, WithoutAFileAnswersFromDefaults )
-{
-  EXPECT_FALSE( Source.IsOpen() );
-  EXPECT_EQ( Source.GetVideoPayload(), ZOL::VideoPayload_None );
-  EXPECT_FALSE( Source.GetFrame( 0, Frame ) );
-  EXPECT_EQ( Source.FindFrameAtOrBefore( 1 ), std::nullopt );
-  EXPECT_EQ( LumekVideoViewer::ComposeInfoPanelTexts( Source, 0 ).Timecode, "No file open" );
-  EXPECT_TRUE( LumekVideoViewer::ComposePropertyRows( Source ).empty() );
-}
-
 TEST_F( VideoSource, AFailedOpenLeavesNoFileAndAnEmptyRecordingOpens )
 {
   ASSERT_TRUE( Open( Bayer( { 0, 1, 2 } ) ) );
@@ -72,9 +61,14 @@ TEST_F( VideoSource, AFailedOpenLeavesNoFileAndAnEmptyRecordingOpens )
   std::filesystem::copy_file( rPath, Upper );
   EXPECT_FALSE( Source.Open( Upper ) ); // the name decides, and the comparison does not fold case
   std::filesystem::remove( Upper );
+  EXPECT_FALSE( Source.Open( rPath + ".absent.lvid" ) );
+  // What the window shows while no file is open.
   EXPECT_FALSE( Source.IsOpen() );
   EXPECT_EQ( Source.GetVideoPayload(), ZOL::VideoPayload_None );
-  EXPECT_FALSE( Source.Open( rPath + ".absent.lvid" ) );
+  EXPECT_FALSE( Source.GetFrame( 0, Frame ) );
+  EXPECT_EQ( Source.FindFrameAtOrBefore( 1 ), std::nullopt );
+  EXPECT_EQ( LumekVideoViewer::ComposeInfoPanelTexts( Source, 0 ).Timecode, "No file open" );
+  EXPECT_TRUE( LumekVideoViewer::ComposePropertyRows( Source ).empty() );
 
   ASSERT_TRUE( Open( Bayer( {} ) ) );
   EXPECT_EQ( Source.GetFrameCount(), 0u );

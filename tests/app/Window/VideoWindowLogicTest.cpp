@@ -113,38 +113,12 @@ TEST( FrameChoice, WildIndicesAreNotWalked )
   EXPECT_EQ( Reads, ( std::vector< std::uint64_t >{ 2000000001, 2000000000, 0 } ) );
 }
 
-TEST( SurfaceGeometry, OffsetsNeedASensorToBeMeasuredOn )
-{
-  ZOL::IVideoFrameInfo Info;
-  Info.TwiceOffsetX = 20;
-  Info.ImageWidth = 64;
-  EXPECT_EQ( SurfaceGeometry( Info, {} ).TwiceOffsetX, 0 );
-  EXPECT_EQ( SurfaceGeometry( Info, {} ).ImageWidth, 64 );
-  CoreLumekTypes::VCameraHardware Camera;
-  Camera.SensorWidthInPixels = 128;
-  Camera.SensorHeightInPixels = 96;
-  EXPECT_EQ( SurfaceGeometry( Info, Camera ).TwiceOffsetX, 20 );
-}
-
 TEST( Timebar, TickIntervalGuardsAnEmptyFile )
 {
   EXPECT_EQ( TimebarTickInterval( 700, 1 ), 700 );
   EXPECT_EQ( TimebarTickInterval( 700, 100 ), 7 );
   EXPECT_EQ( TimebarTickInterval( 700, 1000 ), 0 );
   EXPECT_EQ( TimebarTickInterval( 700, 0 ), 0 );
-}
-
-TEST( DisplaySettings, OnlyUncompressedBayerFrames )
-{
-  const std::set< std::uint32_t > Bayer = { 2, 3, 4, 5, 14, 15 };
-  for( std::uint32_t Format = 0; Format < ZOL::PixelFormatCount; ++Format )
-  {
-    const auto PixelFormat = static_cast< ZOL::EPixelFormat >( Format );
-    EXPECT_EQ( HasDisplaySettings( ZOL::VideoPayload_Uncompressed, PixelFormat ), Bayer.count( Format ) == 1 )
-        << Format;
-    EXPECT_FALSE( HasDisplaySettings( ZOL::VideoPayload_ImageJPEG, PixelFormat ) ) << Format;
-    EXPECT_FALSE( HasDisplaySettings( ZOL::VideoPayload_VideoH264, PixelFormat ) ) << Format;
-  }
 }
 
 // The sample layout follows the file; rate and channels too, and the rest stays the device's.
@@ -156,9 +130,8 @@ TEST( AudioOutput, FormatFollowsTheFileAndKeepsTheDeviceForTheRest )
   Preferred.setByteOrder( QAudioFormat::BigEndian );
   // Each kind of sample, and one the file does not name, which keeps the device's kind.
   const std::tuple< ZOL::EAudioSampleFormat, int, QAudioFormat::SampleType > Rows[] = {
-      { ZOL::AudioSampleFormat_Int8, 8, QAudioFormat::SignedInt },
-      { ZOL::AudioSampleFormat_UInt16, 16, QAudioFormat::UnSignedInt },
       { ZOL::AudioSampleFormat_Int24, 24, QAudioFormat::SignedInt },
+      { ZOL::AudioSampleFormat_UInt16, 16, QAudioFormat::UnSignedInt },
       { ZOL::AudioSampleFormat_Float32, 32, QAudioFormat::Float },
       { ZOL::AudioSampleFormat_Unspecified, 0, QAudioFormat::Float } };
   for( const auto& [SampleFormat, Size, Type] : Rows )
