@@ -15,88 +15,56 @@ namespace
              0,          i_Remainder,         i_SubFramePeriod };
   }
 
-  const std::uint32_t s_FramesPerSecond[] = { 24, 24, 25, 30, 30, 30 }; // by standard, as labels count
-
-  // A second, independent way to count labels: step one frame at a time, as a timecode
-  // generator does, skipping labels 0 and 1 at each minute but every tenth under drop frame.
-  void Step( ITimecode& io_rLabel )
-  {
-    if( ++io_rLabel.Frames < s_FramesPerSecond[io_rLabel.Standards] )
-      return;
-    io_rLabel.Frames = 0;
-    if( ++io_rLabel.Seconds < 60 )
-      return;
-    io_rLabel.Seconds = 0;
-    if( ++io_rLabel.Minutes == 60 )
-    {
-      io_rLabel.Minutes = 0;
-      if( ++io_rLabel.Hours == 24 )
-      {
-        io_rLabel.Hours = 0;
-        ++io_rLabel.Days;
-      }
-    }
-    if( io_rLabel.Standards == TimecodeStandard_29_97_DF && io_rLabel.Minutes % 10 != 0 )
-      io_rLabel.Frames = 2;
-  }
-
   std::string Text( const ITimecode& i_rTimecode )
   {
     return i_rTimecode.ToText( 0, false, false );
   }
 } // namespace
 
-TEST( TimecodeTicks, EdgesAndAnUnknownStandard )
+// Labels at the carries, where counting goes wrong first, by hand: drop frame skips labels 0 and 1
+// at every minute but each tenth, and a day wraps into Days either way. Moved back by the same
+// ticks, every label counts back to the start: AddTicks turns labels into ticks again.
+TEST( TimecodeTicks, LabelsAtTheCarriesAndBackAgain )
 {
-  ITimecode Timecode = Label( TimecodeStandard_30, 0, 0, 0, 0 );
-  ASSERT_TRUE( Timecode.SetFromTicks( -1 ) ); // the last tick of the previous day
-  EXPECT_EQ( -1, Timecode.Days );
-  EXPECT_EQ( "23:59:59:29", Text( Timecode ) );
-  EXPECT_EQ( 4499999u, Timecode.TickRemainder );
-  Timecode = Label( TimecodeStandard_29_97_DF, 0, 0, 0, 0 );
-  ASSERT_TRUE( Timecode.SetFromTicks( 1800ll * 4504500 ) );
-  EXPECT_EQ( "00:01:00;02", Text( Timecode ) );
-
-  Timecode = ITimecode();
-  Timecode.Hours = 5;
-  EXPECT_FALSE( Timecode.SetFromTicks( 123456789 ) );
-  EXPECT_EQ( 5, Timecode.Hours );
-  EXPECT_EQ( 0u, Timecode.GetTicksPerFrame() );
-  EXPECT_EQ( 0u, Timecode.GetTicksPerDay() );
-  Timecode.AddTicks( 4500000 );
-  EXPECT_EQ( 5, Timecode.Hours );
-  EXPECT_EQ( "", Timecode.ToText( 4, true, true ) );
-}
-
-TEST( TimecodeStandards, TicksToLabelMatchesFrameByFrameCounting )
-{
-  for( std::uint32_t Standard = 0; Standard < 6; ++Standard )
+  constexpr std::uint32_t DF = TimecodeStandard_29_97_DF;
+  const struct
   {
-    SCOPED_TRACE( "standard " + std::to_string( Standard ) );
-    // Covers a whole day and a little more, where the day wraps and Days counts up. Every frame is
-    // compared over the first eleven minutes (a whole drop-frame cycle) and around the wrap; in
-    // between, the frames either side of each second's carry, where a label goes wrong first.
-    ITimecode Counted = Label( Standard, 0, 0, 0, 0 );
-    const std::uint64_t Period = Counted.GetTicksPerFrame();
-    const std::uint64_t FramesPerDay = Counted.GetTicksPerDay() / Period;
-    const std::uint64_t Dense = 11 * 60 * 30;
-    const std::uint32_t LastLabel = s_FramesPerSecond[Standard] - 1;
-    for( std::uint64_t Frame = 0; Frame < FramesPerDay + 40000; Step( Counted ), ++Frame )
-    {
-      if( Frame >= Dense && Frame + Dense < FramesPerDay && Counted.Frames > 2 && Counted.Frames != LastLabel )
-        continue;
-      ITimecode FromTicks = Label( Standard, 0, 0, 0, 0 );
-      ASSERT_TRUE( FromTicks.SetFromTicks( static_cast< std::int64_t >( Frame * Period + Period / 2 ) ) );
-      Counted.TickRemainder = static_cast< std::uint32_t >( Period / 2 );
-      ASSERT_EQ( Counted, FromTicks ) << "frame " << Frame << ": " << Text( Counted ) << " against "
-                                      << Text( FromTicks );
-      ASSERT_TRUE( FromTicks.IsValid() );
-      // Moved back by the same ticks, the label counts back to the start: AddTicks turns labels
-      // into ticks again, dropped labels and whole days included.
-      FromTicks.AddTicks( -static_cast< std::int64_t >( Frame * Period + Period / 2 ) );
-      ASSERT_EQ( Label( Standard, 0, 0, 0, 0 ), FromTicks ) << "frame " << Frame;
-    }
+    std::uint32_t Standard;
+    std::int64_t Frame;
+    const char* Text;
+    std::int32_t Days;
+  } Cases[] = { { DF, 1799, "00:00:59;29", 0 },
+                { DF, 1800, "00:01:00;02", 0 },
+                { DF, 3598, "00:02:00;02", 0 },
+                { DF, 17981, "00:09:59;29", 0 },
+                { DF, 17982, "00:10:00;00", 0 },
+                { DF, 19782, "00:11:00;02", 0 },
+                { DF, 2589407, "23:59:59;29", 0 },
+                { DF, 2589408 * 3 + 1800, "00:01:00;02", 3 },
+                { DF, -1, "23:59:59;29", -1 },
+                { TimecodeStandard_30, -1, "23:59:59:29", -1 },
+                { TimecodeStandard_23_98, 24 * 86400 - 1, "23:59:59:23", 0 },
+                { TimecodeStandard_25, 25 * 86400 * 2 + 26, "00:00:01:01", 2 } };
+  for( const auto& rCase : Cases )
+  {
+    SCOPED_TRACE( std::to_string( rCase.Standard ) + ", frame " + std::to_string( rCase.Frame ) );
+    ITimecode Timecode = Label( rCase.Standard, 0, 0, 0, 0 );
+    const std::int64_t Ticks = rCase.Frame * static_cast< std::int64_t >( Timecode.GetTicksPerFrame() ) + 7;
+    ASSERT_TRUE( Timecode.SetFromTicks( Ticks ) );
+    EXPECT_EQ( rCase.Text, Text( Timecode ) );
+    EXPECT_EQ( rCase.Days, Timecode.Days );
+    EXPECT_EQ( 7u, Timecode.TickRemainder );
+    Timecode.AddTicks( -Ticks );
+    EXPECT_EQ( Label( rCase.Standard, 0, 0, 0, 0 ), Timecode );
   }
+
+  ITimecode Unknown;
+  Unknown.Hours = 5;
+  EXPECT_FALSE( Unknown.SetFromTicks( 123456789 ) );
+  EXPECT_EQ( 0u, Unknown.GetTicksPerFrame() + Unknown.GetTicksPerDay() );
+  Unknown.AddTicks( 4500000 );
+  EXPECT_EQ( 5, Unknown.Hours );
+  EXPECT_EQ( "", Unknown.ToText( 4, true, true ) );
 }
 
 TEST( TimecodeValid, RangesAndDroppedLabels )
