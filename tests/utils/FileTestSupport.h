@@ -14,24 +14,16 @@
 namespace LumekTest
 {
   // A folder of its own for each test, removed with everything in it.
-  class VTemporaryFolder
+  struct VTemporaryFolder
   {
-  public:
-    VTemporaryFolder()
-        : m_Path( boost::filesystem::temp_directory_path() / boost::filesystem::unique_path( "fileio-%%%%-%%%%-%%%%" ) )
-    {
-      boost::filesystem::create_directories( m_Path );
-    }
-    ~VTemporaryFolder()
-    {
-      boost::system::error_code Error;
-      boost::filesystem::remove_all( m_Path, Error );
-    }
+    const boost::filesystem::path m_Path =
+        boost::filesystem::temp_directory_path() / boost::filesystem::unique_path( "fileio-%%%%-%%%%-%%%%" );
+    boost::system::error_code m_Error;
+
+    VTemporaryFolder() { boost::filesystem::create_directories( m_Path ); }
+    ~VTemporaryFolder() { boost::filesystem::remove_all( m_Path, m_Error ); }
     std::string File( const std::string& i_rName ) const { return ( m_Path / i_rName ).string(); }
     std::string Path() const { return m_Path.string(); }
-
-  private:
-    boost::filesystem::path m_Path;
   };
 
   // Bytes that differ at every position within a page, so a byte read from the wrong offset shows.
