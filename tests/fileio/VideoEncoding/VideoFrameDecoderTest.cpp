@@ -1,6 +1,6 @@
 // What the frame decoder makes of each payload: raw frames used where they lie when they hold
 // their description, H.264 through the decoder it is given, still images checked by their
-// signature before anything is allocated for them.
+// signature before anything is allocated for them; and the pixel format it announces for each.
 
 #include "fileio/VideoEncoding/VideoFrameDecoder.h"
 
@@ -10,6 +10,9 @@
 #include <gtest/gtest.h>
 
 #include <cstring>
+#include <fstream>
+#include <iterator>
+#include <sstream>
 #include <string>
 #include <tuple>
 #include <vector>
@@ -90,60 +93,53 @@ namespace
   // A stand-in decoder: notes what it is given and answers as told.
   struct VFakeH264Decoder : IH264Decoder
   {
-    VFakeH264Decoder( std::shared_ptr< IBufferAllocator > i_pAllocator, bool i_bSucceed, bool i_bGiveFrame )
-        : pAllocator( std::move( i_pAllocator ) ), bSucceed( i_bSucceed ), bGiveFrame( i_bGiveFrame )
-    {
-    }
     bool Decode( const IBufferConst& i_rInput, EPixelFormat i_PixelFormat, std::shared_ptr< IBuffer >& o_rOutput,
                  IVideoFrameInfo& io_VideoFrameInfo ) override
     {
       InputSize = i_rInput.GetSize();
       Wished = i_PixelFormat;
-      if( bGiveFrame )
+      if( pPicture )
       {
         io_VideoFrameInfo = Info( 2, 2, PixelFormat_U8Y8V8Y8 );
-        pAllocator->Allocate( o_rOutput, 8 );
+        o_rOutput = pPicture;
       }
       return bSucceed;
     }
-    std::shared_ptr< IBufferAllocator > pAllocator;
-    bool bSucceed, bGiveFrame;
+    bool bSucceed = false;
+    std::shared_ptr< IBuffer > pPicture; // given out when there is one
     std::uint64_t InputSize = 0;
     EPixelFormat Wished = PixelFormat_Unspecified;
   };
 
   TEST_F( FrameDecoder, H264GoesThroughTheDecoder )
   {
-    {
-      // Without a decoder every frame says so, and the stored bytes stay.
-      LumekTest::VLogCapture Log( "VideoEncoding" );
-      auto pBuffer = Payload( { 0, 0, 0, 1, 0x65 } );
-      IBuffer* pBefore = pBuffer.get();
-      IVideoFrameInfo FrameInfo = Info( 16, 16, PixelFormat_U8Y8V8Y8 );
-      EXPECT_FALSE( Decode( VideoPayload_VideoH264, FrameInfo, pBuffer ) );
-      EXPECT_FALSE( Decode( VideoPayload_VideoH264, FrameInfo, pBuffer ) );
-      EXPECT_EQ( pBuffer.get(), pBefore );
-      EXPECT_EQ( Log.Lines(),
-                 std::vector< std::string >( 2, "2 H.264 video for decoding but no H.264 decoder provided." ) );
-    }
+    // Without a decoder every frame says so, and the stored bytes stay.
+    LumekTest::VLogCapture Log( "VideoEncoding" );
+    auto pStored = Payload( { 0, 0, 0, 1, 0x65 } );
+    IBuffer* pBefore = pStored.get();
+    IVideoFrameInfo Stored = Info( 16, 16, PixelFormat_U8Y8V8Y8 );
+    EXPECT_FALSE( Decode( VideoPayload_VideoH264, Stored, pStored ) );
+    EXPECT_FALSE( Decode( VideoPayload_VideoH264, Stored, pStored ) );
+    EXPECT_EQ( pStored.get(), pBefore );
+    EXPECT_EQ( Log.Lines(),
+               std::vector< std::string >( 2, "2 H.264 video for decoding but no H.264 decoder provided." ) );
     // Only success with a picture is a frame. The stored bytes are released either way; what the
     // decoder gave, if anything, is kept.
     for( const bool bSucceed : { true, false } )
       for( const bool bGiveFrame : { true, false } )
       {
         SCOPED_TRACE( std::string( bSucceed ? "succeeds" : "fails" ) + ( bGiveFrame ? " with" : " without" ) );
-        auto pDecoder = std::make_shared< VFakeH264Decoder >( m_pFrameAllocator, bSucceed, bGiveFrame );
+        auto pDecoder = std::make_shared< VFakeH264Decoder >();
+        pDecoder->bSucceed = bSucceed;
+        pDecoder->pPicture = bGiveFrame ? Payload( std::vector< std::uint8_t >( 8 ) ) : nullptr;
         auto pBuffer = Payload( { 0, 0, 0, 1, 0x65, 0x88 } );
         IVideoFrameInfo FrameInfo = Info( 640, 480, PixelFormat_Y8U8Y8V8 );
         EXPECT_EQ( Decode( VideoPayload_VideoH264, FrameInfo, pBuffer, pDecoder ), bSucceed && bGiveFrame );
         EXPECT_EQ( pDecoder->InputSize, 6u );
         EXPECT_EQ( pDecoder->Wished, PixelFormat_Y8U8Y8V8 );
-        EXPECT_EQ( pBuffer != nullptr, bGiveFrame );
-        if( bGiveFrame )
-        {
-          EXPECT_EQ( pBuffer->GetSize(), 8u );
-          EXPECT_EQ( FrameInfo, Info( 2, 2, PixelFormat_U8Y8V8Y8 ) );
-        }
+        EXPECT_EQ( pBuffer ? pBuffer->GetSize() : 0u, bGiveFrame ? 8u : 0u );
+        EXPECT_EQ( FrameInfo,
+                   bGiveFrame ? Info( 2, 2, PixelFormat_U8Y8V8Y8 ) : Info( 640, 480, PixelFormat_Y8U8Y8V8 ) );
       }
   }
 
@@ -183,5 +179,38 @@ namespace
       EXPECT_EQ( Log.Lines(),
                  rCase.LogLine.empty() ? std::vector< std::string >() : std::vector< std::string >{ rCase.LogLine } );
     }
+  }
+
+  TEST( PixelFormatForPayloadFormat, GoldenTable )
+  {
+    // One line per payload; the columns are the stored formats 0 to 19, then 20 (no such format).
+    // Forcing colour changes JPEG alone.
+    std::ostringstream Text;
+    for( const bool bForceColour : { false, true } )
+    {
+      Text << ( bForceColour ? "colour forced\n" : "colour as stored\n" );
+      for( int Payload = 0; Payload <= 5; ++Payload )
+      {
+        Text << ToString( static_cast< EVideoPayload >( Payload ) ) << ":";
+        for( int F = 0; F <= 20; ++F )
+        {
+          EPixelFormat Output = static_cast< EPixelFormat >( 99 );
+          EXPECT_TRUE( VideoEncoding::PixelFormatForPayloadFormat(
+              static_cast< EVideoPayload >( Payload ), static_cast< EPixelFormat >( F ), Output, bForceColour ) );
+          Text << " " << static_cast< int >( Output );
+        }
+        Text << "\n";
+      }
+    }
+    std::ifstream Golden( VIDEOENCODING_GOLDEN_FOLDER "/payload-pixel-formats.txt" );
+    EXPECT_EQ( Text.str(), std::string( std::istreambuf_iterator< char >( Golden ), {} ) );
+
+    // An unknown payload is logged and leaves the output as it was.
+    LumekTest::VLogCapture Log( "VideoEncoding" );
+    EPixelFormat Output = PixelFormat_B8G8R8;
+    EXPECT_FALSE( VideoEncoding::PixelFormatForPayloadFormat( static_cast< EVideoPayload >( 6 ), PixelFormat_Luminance8,
+                                                              Output, false ) );
+    EXPECT_EQ( Output, PixelFormat_B8G8R8 );
+    EXPECT_EQ( Log.Lines(), std::vector< std::string >{ "2 Unsupported video payload format 'Unspecified'." } );
   }
 } // namespace
