@@ -10,6 +10,7 @@
 #include <array>
 #include <functional>
 #include <limits>
+#include <tuple>
 
 using namespace LumekVideoTest;
 
@@ -184,7 +185,7 @@ namespace
   };
 
   // Sound alone skips the video by a seek; reading on after a failed one would take the video's
-  // bytes for the sound's count and samples.
+  // bytes for the sound's count and samples. Every other failed seek fails the read as well.
   TEST( LvidReader, AudioAloneFailsWhenTheSeekPastTheVideoFails )
   {
     // The video itself starts like a sound block, so that reading on from the wrong place
@@ -192,16 +193,19 @@ namespace
     VRecordingPlan Plan = SmallPlan();
     Plan.Records[0].Video = { 4, 0, 0, 0, 0xA1, 0xA2, 0xA3, 0xA4, 9, 9, 9, 9, 9, 9, 9 };
     const VBytes Bytes = Assemble( Plan ).Bytes;
-    for( const bool bFail : { false, true } )
+    // The first seek goes to the frame; the second past its video, or to the boundary after it.
+    const std::tuple< bool, int, bool > Cases[] = {
+        { false, 0, true }, { false, 1, false }, { false, 2, false }, { true, 2, false } };
+    for( const auto& [bVideo, FailingSeek, bReads] : Cases )
     {
+      SCOPED_TRACE( ( bVideo ? "video and sound, seek " : "sound alone, seek " ) + std::to_string( FailingSeek ) );
       auto pStream = std::make_shared< VSeekFailingStream >( Bytes.data(), Bytes.size() );
       LumekVideo::VReader Reader;
       ASSERT_TRUE( Reader.Open( pStream ) );
-      // The first seek goes to the frame, the second past its video.
       pStream->Seeks = 0;
-      pStream->FailingSeek = bFail ? 2 : 0;
-      const auto Read = ReadBytes( Reader, 0, false, true );
-      EXPECT_EQ( Read.has_value(), !bFail );
+      pStream->FailingSeek = FailingSeek;
+      const auto Read = ReadBytes( Reader, 0, bVideo, true );
+      EXPECT_EQ( Read.has_value(), bReads );
       if( Read )
       {
         EXPECT_EQ( Read->Audio, std::vector< VBytes >{ *Plan.Records[0].Audio } );
