@@ -83,19 +83,29 @@ namespace
     EXPECT_EQ( Byte, Bytes[5] );
   }
 
-  TEST( FileOperations, RemoveLogsAndAnAbsentFileIsNoFailureButAFullFolderIs )
+  // Removing logs, and an absent file is no failure but a full folder is; copying and moving never
+  // replace a file unless asked.
+  TEST( FileOperations, RemoveCopyAndMove )
   {
     const LumekTest::VTemporaryFolder Folder;
-    const std::string Path = Folder.File( "gone.lvid" );
-    WriteText( Path, "x" );
-    const LumekTest::VLogCapture Log( "System" );
-    EXPECT_EQ( RemoveFile( Path ), ZOL::Result_Ok );
-    EXPECT_FALSE( boost::filesystem::exists( Path ) );
-    EXPECT_TRUE( Log.Has( "Removed file '" + Path + "'." ) );
-    EXPECT_EQ( RemoveFile( Path ), ZOL::Result_Ok );
-    EXPECT_TRUE( Log.Has( "Nothing to remove: '" + Path + "' did not exist." ) );
+    const std::string A = Folder.File( "a" ), B = Folder.File( "b" ), C = Folder.File( "c" );
+    WriteText( A, "a" );
+    WriteText( B, "b" );
+    EXPECT_EQ( CopyFile( A, B, true ), ZOL::Result_AlreadyPresent );
+    EXPECT_EQ( MoveFile( A, B ), ZOL::Result_AlreadyPresent );
+    EXPECT_EQ( ReadText( A ) + ReadText( B ), "ab" );
+    EXPECT_EQ( CopyFile( A, B, false ), ZOL::Result_Ok );
+    EXPECT_EQ( ReadText( B ), "a" );
+    EXPECT_EQ( MoveFile( A, C ), ZOL::Result_Ok );
+    EXPECT_EQ( ReadText( C ), "a" );
+    EXPECT_EQ( MoveFile( A, C ), ZOL::Result_FileNotFound );
 
-    WriteText( Folder.File( "inside" ), "x" );
+    const LumekTest::VLogCapture Log( "System" );
+    EXPECT_EQ( RemoveFile( C ), ZOL::Result_Ok );
+    EXPECT_FALSE( boost::filesystem::exists( C ) );
+    EXPECT_TRUE( Log.Has( "Removed file '" + C + "'." ) );
+    EXPECT_EQ( RemoveFile( C ), ZOL::Result_Ok );
+    EXPECT_TRUE( Log.Has( "Nothing to remove: '" + C + "' did not exist." ) );
     const ZOL::ResultCode Result = RemoveFile( Folder.Path() );
     EXPECT_FALSE( ZOL::Succeeded( Result ) );
     EXPECT_TRUE( Log.Has( "Failed to remove file '" + Folder.Path() + "': " + ZOL::GetResultText( Result ) ) );
@@ -132,24 +142,6 @@ namespace
       EXPECT_TRUE( Log.Has( "Failed to replace file " + Old + " with file " + New + ": " +
                             ZOL::GetResultText( ZOL::Result_FileNotFound ) + "." ) );
     }
-  }
-
-  TEST( FileOperations, CopyAndMoveNeverReplaceUnlessAsked )
-  {
-    const LumekTest::VTemporaryFolder Folder;
-    const std::string A = Folder.File( "a" ), B = Folder.File( "b" ), C = Folder.File( "c" );
-    WriteText( A, "a" );
-    WriteText( B, "b" );
-    EXPECT_EQ( CopyFile( A, B, true ), ZOL::Result_AlreadyPresent );
-    EXPECT_EQ( MoveFile( A, B ), ZOL::Result_AlreadyPresent );
-    EXPECT_EQ( ReadText( A ), "a" );
-    EXPECT_EQ( ReadText( B ), "b" );
-    EXPECT_EQ( CopyFile( A, B, false ), ZOL::Result_Ok );
-    EXPECT_EQ( ReadText( B ), "a" );
-    EXPECT_EQ( MoveFile( A, C ), ZOL::Result_Ok );
-    EXPECT_FALSE( boost::filesystem::exists( A ) );
-    EXPECT_EQ( ReadText( C ), "a" );
-    EXPECT_EQ( MoveFile( A, C ), ZOL::Result_FileNotFound );
   }
 
   // A child program that holds a file open for as long as the test keeps it. posix_spawn returns

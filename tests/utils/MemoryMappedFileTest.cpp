@@ -156,18 +156,11 @@ namespace
                                : dynamic_cast< VFileInputStreamVirtual* >( pStream.get() )       ? "plain"
                                                                                                  : "";
       EXPECT_EQ( rCase.Stream, Kind );
-      EXPECT_EQ( rCase.bFallsBack, Log.Contains( "falling back" ) );
-      if( Kind == "plain" )
-      {
-        EXPECT_TRUE( Log.Has( "Failed to open memory mapped input file stream " + rCase.Path + " (" +
-                              ZOL::GetResultText( ZOL::Result_FileIOFailure ) +
-                              "), falling back to a standard input file stream." ) );
-        std::uint64_t Size = 1;
-        ASSERT_TRUE( pStream->GetSize( Size ) );
-        EXPECT_EQ( Size, 0u );
-        std::uint8_t Byte = 0;
-        EXPECT_FALSE( pStream->Read( &Byte, 1 ) );
-      }
+      EXPECT_EQ( rCase.bFallsBack, Log.Has( "Failed to open memory mapped input file stream " + rCase.Path + " (" +
+                                            ZOL::GetResultText( ZOL::Result_FileIOFailure ) +
+                                            "), falling back to a standard input file stream." ) );
+      std::uint64_t Size = 1;
+      EXPECT_TRUE( Kind != "plain" || ( pStream->GetSize( Size ) && Size == 0 ) );
     }
   }
 } // namespace
