@@ -1,15 +1,30 @@
 // The tool's contract as scripts see it: the usage text, exit codes and their messages, the
-// pictures and recordings it writes, and damaged recordings that never crash it.
+// pictures, recordings and reports it writes. Reports moved from a writer of our own to Qt's JSON
+// classes: every key and value must stay, and other parsers must still read them. A conversion
+// that is interrupted or killed leaves an existing output as it was, and a recording still being
+// written is reported with the program that writes it.
 
 #include "ToolRunner.h"
 
 #include "fileio/ImageSequenceIO/VImageSequenceReader.h"
+#include "tools/LumekVideoTool/Json.h"
 #include "tools/LumekVideoTool/SampleScene.h"
 #include "tools/LumekVideoTool/ToolCommands.h"
 
 #include <gtest/gtest.h>
 
+#include <QJsonDocument>
+
+#include <fcntl.h>
+#include <signal.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <chrono>
 #include <map>
+#include <numeric>
+#include <thread>
 #include <tuple>
 
 using namespace LumekVideoToolTest;
@@ -254,5 +269,133 @@ namespace
     EXPECT_EQ( Damaged.ExitCode, 3 );
     EXPECT_NE( Damaged.Err.find( "Frame 1 could not be read or decoded." ), std::string::npos ) << Damaged.Err;
     EXPECT_EQ( FolderFiles( Scratch.Path( "damaged" ) ).size(), 3u );
+  }
+
+  QJsonObject ParseObject( const std::string& i_rText )
+  {
+    QJsonParseError Error{};
+    const QJsonDocument Document = QJsonDocument::fromJson( QByteArray::fromStdString( i_rText ), &Error );
+    EXPECT_EQ( Error.error, QJsonParseError::NoError ) << i_rText;
+    return Document.object();
+  }
+
+  std::size_t LineCount( const std::string& i_rText )
+  {
+    return std::count( i_rText.begin(), i_rText.end(), '\n' );
+  }
+
+  TEST( JsonReport, InfoAndBenchKeepEveryKeyOfTheEarlierWriterInEveryLayout )
+  {
+    const VScratch Scratch;
+    const std::string Path = Scratch.Path( "a.lvid" );
+    const VRun Make = RunInProcess(
+        { "make-sample", Path, "--width", "16", "--height", "8", "--frames", "3", "--format", "BayerGB8" } );
+    ASSERT_EQ( Make.ExitCode, 0 ) << Make.Err;
+    // The golden file is the earlier writer's compact report of this very sample.
+    const VBytes Golden = ReadFileBytes( LUMEK_TOOL_GOLDEN_FOLDER "/info-sample-BayerGB8-16x8-frame1.json" );
+    QJsonObject Expected = ParseObject( std::string( Golden.begin(), Golden.end() ) );
+    ASSERT_FALSE( Expected.isEmpty() );
+    Expected["file"] = QString::fromStdString( Path );
+    // A pipe gets the compact form by itself.
+    for( const char* pLayout : { "", "--compact", "--pretty" } )
+    {
+      SCOPED_TRACE( pLayout );
+      std::vector< std::string > Arguments = { "info", Path, "--frame", "1", pLayout };
+      if( !*pLayout )
+        Arguments.pop_back();
+      const VRun Run = RunTool( Arguments );
+      ASSERT_EQ( Run.ExitCode, 0 ) << Run.Err;
+      EXPECT_EQ( ParseObject( Run.Out ), Expected ) << Run.Out;
+      if( std::string( pLayout ) == "--pretty" )
+        EXPECT_EQ( Run.Out.rfind( "{\n    \"", 0 ), 0u ) << Run.Out;
+      else
+        EXPECT_EQ( LineCount( Run.Out ), 1u );
+      // What a script would do with the report: read it with a parser that is not Qt's.
+      EXPECT_EQ( ParseJson( Run.Out ).get< std::string >( "infoPanel.video" ),
+                 "V: 16 x 8 / BayerGB8 / 100.00Hz / 3 frames (0 missing) / 0.03s" );
+    }
+
+    const VRun Bench = RunTool( { "bench", Path, "--software" } );
+    ASSERT_EQ( Bench.ExitCode, 0 ) << Bench.Err;
+    EXPECT_EQ( LineCount( Bench.Out ), 1u );
+    const auto Report = ParseJson( Bench.Out );
+    // Later figures may join these; the earlier writer's must stay.
+    EXPECT_EQ( Report.get< int >( "frames" ), 3 );
+    EXPECT_GT( Report.get< double >( "fps" ), 0.0 );
+    EXPECT_GT( Report.get< double >( "peakRssMiB" ), 0.0 );
+    EXPECT_GE( Report.get< double >( "seconds" ), 0.0 );
+    EXPECT_NEAR( Report.get< double >( "msPerFrame" ) * Report.get< double >( "fps" ), 1000.0, 1e-6 );
+  }
+
+  TEST( JsonText, TextsFromADamagedFileStayValid )
+  {
+    std::ostringstream Out;
+    LumekVideoTool::WriteJson( Out,
+                               QJsonObject{ { "a\"b", LumekVideoTool::JsonText( "line\n\x01\xff\xc3\xa9" ) },
+                                            { "n", QJsonArray{ LumekVideoTool::JsonCount( ( 1ull << 53 ) - 1 ),
+                                                               LumekVideoTool::JsonNumber( 2.5 ),
+                                                               LumekVideoTool::JsonNumber( 1.0 / 0.0 ) } } },
+                               LumekVideoTool::EJsonLayout::Compact );
+    EXPECT_EQ( Out.str(), "{\"a\\\"b\":\"line\\n\\u0001\xef\xbf\xbd\xc3\xa9\",\"n\":[9007199254740991,2.5,null]}\n" );
+  }
+
+  TEST( ConvertReplace, AStoppedConversionLeavesTheExistingOutputUntouched )
+  {
+    const VScratch Scratch;
+    const std::string Output = Scratch.Path( "out.lvid" );
+    ASSERT_EQ( RunTool( { "convert", WriteRecording( Scratch, "small.lvid", {} ), Output } ).ExitCode, 0 );
+    const VBytes Before = ReadFileBytes( Output );
+    ASSERT_FALSE( Before.empty() );
+    // Large enough that the conversion is still writing when the test looks.
+    VRecordingSpec Large;
+    Large.Width = 1280;
+    Large.Height = 720;
+    Large.Frames.resize( 60 );
+    std::iota( Large.Frames.begin(), Large.Frames.end(), 0 );
+    const std::string LargeInput = WriteRecording( Scratch, "large.lvid", Large );
+
+    // A user's Ctrl+C lets the tool remove its temporary file; a kill leaves it behind. Either
+    // way the output is replaced by a whole recording or not at all.
+    for( const int Signal : { SIGINT, SIGKILL } )
+    {
+      SCOPED_TRACE( Signal == SIGINT ? "interrupted" : "killed" );
+      const pid_t Child = fork();
+      ASSERT_GE( Child, 0 );
+      if( Child == 0 )
+      {
+        std::freopen( "/dev/null", "w", stderr );
+        execl( LUMEK_TOOL_PATH, LUMEK_TOOL_PATH, "convert", LargeInput.c_str(), Output.c_str(),
+               static_cast< char* >( nullptr ) );
+        _exit( 127 );
+      }
+      const auto Deadline = std::chrono::steady_clock::now() + std::chrono::seconds( 60 );
+      while( Scratch.Partial().value_or( 0 ) < ( 8u << 20 ) && std::chrono::steady_clock::now() < Deadline )
+        std::this_thread::sleep_for( std::chrono::milliseconds( 1 ) );
+      const bool bRunning = waitpid( Child, nullptr, WNOHANG ) == 0;
+      kill( Child, Signal );
+      waitpid( Child, nullptr, 0 );
+      ASSERT_TRUE( bRunning ) << "the conversion ended before it could be stopped";
+      EXPECT_EQ( Scratch.Partial().has_value(), Signal == SIGKILL );
+      EXPECT_EQ( ReadFileBytes( Output ), Before );
+      EXPECT_EQ( RunInProcess( { "info", Output } ).ExitCode, 0 );
+    }
+  }
+
+  TEST( ConvertReplace, ARecordingStillBeingWrittenNamesItsWriter )
+  {
+    const VScratch Scratch;
+    const std::string Path = Scratch.Path( "capturing.lvid" );
+    // A capture that has its header but not yet its index, held open for writing by this test.
+    const VBytes Whole = ReadFileBytes( WriteRecording( Scratch, "whole.lvid", {} ) );
+    WriteFileBytes( Path, VBytes( Whole.begin(), Whole.begin() + Whole.size() / 2 ) );
+    const int Held = open( Path.c_str(), O_WRONLY | O_APPEND | O_CLOEXEC );
+    ASSERT_GE( Held, 0 );
+    const VRun Run = RunTool( { "info", Path } );
+    EXPECT_EQ( Run.ExitCode, 1 );
+    EXPECT_EQ( Run.Err.rfind( "The video file could not be opened. It is still being written by ", 0 ), 0u ) << Run.Err;
+    EXPECT_NE( Run.Err.find( " (process " + std::to_string( getpid() ) + ")." ), std::string::npos ) << Run.Err;
+    close( Held );
+    const VRun After = RunTool( { "info", Path } );
+    EXPECT_EQ( After.Err.find( "still being written" ), std::string::npos ) << After.Err;
   }
 } // namespace
