@@ -82,7 +82,6 @@ namespace MovTest
     bool bCo64Only = false;
     bool bTwoMdiaFirstEmpty = false;
     bool bLargeMdatFirst = false;
-    bool bNoVideo = false;
     std::uint32_t StrayBytes = 0;
   };
   constexpr std::uint32_t Timescale = 600;
@@ -163,21 +162,18 @@ namespace MovTest
     w.Begin( "moov" ).BeginFull( "mvhd" ).Zeros( 8 ).U32( 600 ).U32( Duration ).U32( 0x10000 ).U16( 0x100 ).Zeros( 10 );
     Matrix( w );
     w.Zeros( 24 ).U32( 4 ).End();
-    if( !s.bNoVideo )
-    {
-      BeginTrack( w, 1, Duration, 0, s.Width, s.Height, Timescale, Duration, "vide", s.bTwoMdiaFirstEmpty );
-      // The sample description, with its extensions.
-      w.Begin( "minf" ).BeginFull( "vmhd", 1 ).Zeros( 8 ).End().Begin( "stbl" ).BeginFull( "stsd" ).U32( 1 );
-      w.Begin( "2vuy" ).Zeros( 6 ).U16( 1 ).U32( 0 ).Text( "lumk" ).U32( 0 ).U32( 512 ).U16( s.Width );
-      w.U16( s.Height ).U32( 72 << 16 ).U32( 72 << 16 ).U32( 0 ).U16( 1 ).Zeros( 32 ).U16( 24 ).U16( 0xFFFF );
-      w.Begin( "pasp" ).U32( 1 ).U32( 1 ).End().Begin( "colr" ).Text( "nclc" ).U16( 1 ).U16( 1 ).U16( 1 ).End();
-      w.End().End(); // 2vuy, stsd
-      const std::uint32_t PerChunk = s.SamplesPerChunk ? s.SamplesPerChunk : s.Frames;
-      std::vector< std::uint64_t > Offsets;
-      for( std::uint32_t f = 0; f < s.Frames; f += PerChunk )
-        Offsets.push_back( VideoStart + f * Bytes );
-      SampleTables( w, s.Frames, SampleDuration, std::uint32_t( Bytes ), PerChunk, Offsets, s.bCo64Only );
-    }
+    BeginTrack( w, 1, Duration, 0, s.Width, s.Height, Timescale, Duration, "vide", s.bTwoMdiaFirstEmpty );
+    // The sample description, with its extensions.
+    w.Begin( "minf" ).BeginFull( "vmhd", 1 ).Zeros( 8 ).End().Begin( "stbl" ).BeginFull( "stsd" ).U32( 1 );
+    w.Begin( "2vuy" ).Zeros( 6 ).U16( 1 ).U32( 0 ).Text( "lumk" ).U32( 0 ).U32( 512 ).U16( s.Width );
+    w.U16( s.Height ).U32( 72 << 16 ).U32( 72 << 16 ).U32( 0 ).U16( 1 ).Zeros( 32 ).U16( 24 ).U16( 0xFFFF );
+    w.Begin( "pasp" ).U32( 1 ).U32( 1 ).End().Begin( "colr" ).Text( "nclc" ).U16( 1 ).U16( 1 ).U16( 1 ).End();
+    w.End().End(); // 2vuy, stsd
+    const std::uint32_t PerChunk = s.SamplesPerChunk ? s.SamplesPerChunk : s.Frames;
+    std::vector< std::uint64_t > Offsets;
+    for( std::uint32_t f = 0; f < s.Frames; f += PerChunk )
+      Offsets.push_back( VideoStart + f * Bytes );
+    SampleTables( w, s.Frames, SampleDuration, std::uint32_t( Bytes ), PerChunk, Offsets, s.bCo64Only );
     if( s.AudioRate != 0 )
     {
       BeginTrack( w, 2, Duration, 0x100, 0, 0, s.AudioRate, AudioSamples, "soun" );

@@ -149,41 +149,21 @@ TEST( AviIndex, OldIndexOfHundredAgainstStandardIndexOfNinety )
 
 TEST( AviIndex, DamagedEntriesFailOnlyTheirFrame )
 {
-  const struct
+  // Frame 1's audio runs past the file by its idx1 entry: the frame fails only when its audio is
+  // asked for. (Damaged video entries in either index are among the flips of AviCorruption.)
+  VAviSpec Audible = GreySpec( 3 );
+  Audible.AudioFormat = WaveFormat( 1, 1, 48000, 16 );
+  Audible.AudioChunks.assign( 3, Frame( 3840, 0x80 ) );
+  VBytes File = BuildAvi( Audible );
+  Patch( File, "idx1", 4 * 16 + 12, 0x40000F00, 4 );
+  VOpenedAvi Damaged = OpenAvi( File );
+  ASSERT_TRUE( Damaged.bOpened );
+  for( std::uint64_t i = 0; i < 3; ++i )
   {
-    const char* Name;
-    const char* Chunk; // whose payload is patched
-    std::size_t Offset;
-    std::uint64_t Value;
-    bool bStandardIndex;
-    // The damage is to frame 1's audio, which fails the frame only when audio is asked for.
-    bool bAudio;
-  } Cases[] = {
-      { "StandardIndexSizeTopBit", "ix00", 24 + 8 + 4, 0x80000020, true, false },
-      { "OldIndexOffsetBeyondFile", "idx1", 16 + 8, 0x7FFFFFF0, false, false },
-      { "AudioSizeBeyondFile", "idx1", 4 * 16 + 12, 0x40000F00, false, true },
-  };
-  for( const auto& rCase : Cases )
-  {
-    SCOPED_TRACE( rCase.Name );
-    VAviSpec Spec = GreySpec( 3 );
-    Spec.StandardIndexFrames = rCase.bStandardIndex ? 3 : -1;
-    if( rCase.bAudio )
-    {
-      Spec.AudioFormat = WaveFormat( 1, 1, 48000, 16 );
-      Spec.AudioChunks.assign( 3, Frame( 3840, 0x80 ) );
-    }
-    VBytes File = BuildAvi( Spec );
-    Patch( File, rCase.Chunk, rCase.Offset, rCase.Value, 4 );
-    VOpenedAvi Avi = OpenAvi( File );
-    ASSERT_TRUE( Avi.bOpened );
-    for( std::uint64_t i = 0; i < 3; ++i )
-    {
-      std::shared_ptr< ZOL::IBuffer > pVideo;
-      ZOL::IAudioBuffers Audio;
-      EXPECT_EQ( Avi.pReader->ReadFrameData( i, pVideo, Audio, true, true ), i != 1 ) << "frame " << i;
-      EXPECT_EQ( ReadVideo( *Avi.pReader, i ).empty(), i == 1 && !rCase.bAudio ) << "frame " << i;
-    }
+    std::shared_ptr< ZOL::IBuffer > pVideo;
+    ZOL::IAudioBuffers Audio;
+    EXPECT_EQ( Damaged.pReader->ReadFrameData( i, pVideo, Audio, true, true ), i != 1 ) << "frame " << i;
+    EXPECT_FALSE( ReadVideo( *Damaged.pReader, i ).empty() ) << "frame " << i;
   }
   // A raw frame one byte too long fails without a word: a player asks for it again and again.
   VAviSpec Spec = GreySpec( 2 );
