@@ -129,7 +129,7 @@ namespace
     return pOut;
   }
 
-  TEST( StreamUtils, RealAccessUnitsConvertBothWaysAndAreInspected )
+  TEST( StreamUtils, FormsConvertBothWaysAndLengthsAreChecked )
   {
     if( !HaveFfmpeg() )
       GTEST_SKIP() << "ffmpeg is not installed";
@@ -155,23 +155,16 @@ namespace
     EXPECT_TRUE( ContainsNALUnit( VBytesBuffer( Stream.AccessUnits[5] ), H264NALUnitType_CodedSliceIDR,
                                   EH264StreamForm::AnnexB ) );
     char SliceType = 0;
-    EXPECT_TRUE( IsSingleSlice( *pKey, SliceType ) );
-    EXPECT_EQ( SliceType, 'I' );
-    EXPECT_TRUE( IsSingleSlice( *pOther, SliceType ) );
-    EXPECT_EQ( SliceType, 'P' );
-  }
+    EXPECT_TRUE( IsSingleSlice( *pKey, SliceType ) && SliceType == 'I' );
+    EXPECT_TRUE( IsSingleSlice( *pOther, SliceType ) && SliceType == 'P' );
 
-  TEST( StreamUtils, StartCodesAndLengths )
-  {
     // Junk before the first start code is no unit; a 3-byte code is as good as a 4-byte one.
     const VBytes Input = { 0xAA, 0, 0, 1, 0x09, 0xF0, 0, 0, 0, 1, 0x67, 0x42, 0, 0, 1, 0x68 };
     EXPECT_EQ( Bytes( *Prefixed( Input ) ), JoinNALUnits( { { 0x09, 0xF0 }, { 0x67, 0x42 }, { 0x68 } }, true ) );
 
     // Lengths that do not walk exactly to the end are refused, at every cut.
     std::shared_ptr< ZOL::IBuffer > pOut;
-    EXPECT_TRUE( LengthPrefixedToAnnexB( nullptr, 0, pOut, *s_pAllocator ) );
-    ASSERT_TRUE( pOut );
-    EXPECT_EQ( pOut->GetSize(), 0u );
+    EXPECT_TRUE( LengthPrefixedToAnnexB( nullptr, 0, pOut, *s_pAllocator ) && pOut && pOut->GetSize() == 0 );
     const VBytes Sample = JoinNALUnits( { { 0x65, 1, 2, 3 }, { 0x41, 9 } }, true );
     for( std::size_t Cut = 1; Cut < Sample.size(); ++Cut )
       EXPECT_EQ( LengthPrefixedToAnnexB( Sample.data(), Cut, pOut, *s_pAllocator ), Cut == 8 ) << "cut " << Cut;
@@ -223,9 +216,7 @@ namespace
       const VBytes PPSUnit = SplitNALUnits( Stream.AccessUnits[0], 8 ).at( 0 );
       VH264SPS SPS;
       ASSERT_TRUE( ParseSPS( SPSUnit.data(), SPSUnit.size(), SPS ) );
-      EXPECT_EQ( SPS.profile_idc, Profile );
-      EXPECT_EQ( SPS.GetWidth(), 98u );
-      EXPECT_EQ( SPS.GetHeight(), 62u );
+      EXPECT_EQ( std::tuple( SPS.profile_idc, SPS.GetWidth(), SPS.GetHeight() ), std::tuple( Profile, 98u, 62u ) );
       // Compared without emulation prevention: the writer leaves a zero third byte unescaped
       // where an encoder escapes it.
       VBytes Written;
@@ -242,10 +233,8 @@ namespace
         (void)ParseSPS( VBytes( SPSUnit.begin(), SPSUnit.begin() + Cut ).data(), Cut, Again );
       if( !bTiming )
         continue;
-      ASSERT_TRUE( SPS.vui.nal_hrd_parameters_present_flag );
-      ASSERT_TRUE( SPS.vui.pic_struct_present_flag );
-      EXPECT_EQ( SPS.vui.num_units_in_tick, 1u );
-      EXPECT_EQ( SPS.vui.time_scale, 50u );
+      ASSERT_TRUE( SPS.vui.nal_hrd_parameters_present_flag && SPS.vui.pic_struct_present_flag );
+      EXPECT_EQ( std::tuple( SPS.vui.num_units_in_tick, SPS.vui.time_scale ), std::tuple( 1u, 50u ) );
       std::ostringstream Text;
       for( const VBytes& rSEI : SplitNALUnits( Stream.AccessUnits[0], 6 ) )
         DescribeNALUnit( rSEI.data(), rSEI.size(), Text, 0, SPS );

@@ -12,7 +12,6 @@
 #include "utils/MemoryStream.h"
 
 #include <gtest/gtest.h>
-#include <turbojpeg.h>
 
 #include <algorithm>
 #include <cmath>
@@ -118,63 +117,30 @@ namespace
     EXPECT_TRUE( Parse( Whole ).bResult );
   }
 
-  // A JPEG and ffmpeg's own decode of it, in its stored planes.
-  struct VSource
+  // A JPEG of ffmpeg's test picture in its stored planes ("yuvj420p", "yuvj422p"). testsrc2 is
+  // smoother but of even sizes only; odd sizes come from testsrc.
+  std::string MakeJPEG( const char* i_pPlanes, int i_Width, int i_Height )
   {
-    const char* Name;
-    const char* PixelFormat; // ffmpeg's name of the stored planes; "gray" for a grey JPEG
-    int Width, Height;
-    int ChromaShiftX; // 1 for 4:2:x
-    int ChromaShiftY; // 1 for 4:2:0
-  };
-
-  // A grey JPEG of a smooth picture, which ffmpeg's encoder cannot make.
-  std::string GreyJPEG( int i_Width, int i_Height )
-  {
-    VBytes Pixels( static_cast< std::size_t >( i_Width ) * i_Height );
-    for( int y = 0; y < i_Height; ++y )
-      for( int x = 0; x < i_Width; ++x )
-        Pixels[y * i_Width + x] = static_cast< std::uint8_t >( ( x * 5 + y * 3 + ( x * y ) % 17 ) & 0xFF );
-    tjhandle Handle = tjInitCompress();
-    unsigned char* pJPEG = nullptr;
-    unsigned long Size = 0;
-    if( tjCompress2( Handle, Pixels.data(), i_Width, 0, i_Height, TJPF_GRAY, &pJPEG, &Size, TJSAMP_GRAY, 90, 0 ) != 0 )
-      Size = 0;
-    const std::string Path = ::testing::TempDir() + "grey_" + std::to_string( getpid() ) + ".jpg";
-    EXPECT_TRUE( WriteWholeFile( Path, VBytes( pJPEG, pJPEG + Size ) ) );
-    tjFree( pJPEG );
-    tjDestroy( Handle );
-    return Path;
-  }
-
-  std::string MakeJPEG( const VSource& i_rSource )
-  {
-    if( std::string( i_rSource.PixelFormat ) == "gray" )
-      return GreyJPEG( i_rSource.Width, i_rSource.Height );
-    // testsrc2 is smoother but of even sizes only; odd sizes come from testsrc.
-    const bool bOdd = i_rSource.Width % 2 != 0 || i_rSource.Height % 2 != 0;
-    const std::string Source = std::string( bOdd ? "testsrc" : "testsrc2" ) +
-                               "=s=" + std::to_string( i_rSource.Width ) + "x" + std::to_string( i_rSource.Height );
-    return FfmpegFixture(
-        std::string( "still_" ) + i_rSource.Name + ".jpg",
-        { "-f", "lavfi", "-i", Source, "-frames:v", "1", "-pix_fmt", i_rSource.PixelFormat, "-q:v", "3" } );
+    const std::string Size = std::to_string( i_Width ) + "x" + std::to_string( i_Height );
+    const bool bOdd = i_Width % 2 != 0 || i_Height % 2 != 0;
+    return FfmpegFixture( std::string( "still_" ) + i_pPlanes + Size + ".jpg",
+                          { "-f", "lavfi", "-i", std::string( bOdd ? "testsrc" : "testsrc2" ) + "=s=" + Size,
+                            "-frames:v", "1", "-pix_fmt", i_pPlanes, "-q:v", "3" } );
   }
 
   // ffmpeg's planes turned into the delivered format by the JFIF equations, with chroma
   // repeated rather than interpolated, as the fast upsampling of the reader does. Each format
   // lays out a pixel (a pair for the packed YUV formats, whose second luma is 'y') by its
   // letters; '#' is the unused byte, written opaque.
-  VBytes Expected( const VSource& i_rSource, const VBytes& i_rPlanes, EPixelFormat i_Format )
+  VBytes Expected( const VBytes& i_rPlanes, int W, int H, bool i_b420, EPixelFormat i_Format )
   {
     const std::map< EPixelFormat, std::string > Layouts = {
         { PixelFormat_Luminance8, "Y" },  { PixelFormat_R8G8B8, "RGB" },    { PixelFormat_B8G8R8, "BGR" },
         { PixelFormat_R8G8B8u8, "RGB#" }, { PixelFormat_B8G8R8u8, "BGR#" }, { PixelFormat_U8Y8V8Y8, "UYVy" },
         { PixelFormat_Y8U8Y8V8, "YUyV" } };
     const std::string Layout = Layouts.at( i_Format );
-    const int W = i_rSource.Width, H = i_rSource.Height, Step = Layout.find( 'y' ) == std::string::npos ? 1 : 2;
-    const bool bGrey = std::string( i_rSource.PixelFormat ) == "gray";
-    const int CW = ( W + ( 1 << i_rSource.ChromaShiftX ) - 1 ) >> i_rSource.ChromaShiftX;
-    const int CH = ( H + ( 1 << i_rSource.ChromaShiftY ) - 1 ) >> i_rSource.ChromaShiftY;
+    const int Step = Layout.find( 'y' ) == std::string::npos ? 1 : 2, ShiftY = i_b420 ? 1 : 0;
+    const int CW = ( W + 1 ) / 2, CH = ( H + ShiftY ) >> ShiftY;
     const std::uint8_t* pY = i_rPlanes.data();
     const std::uint8_t* pU = pY + W * H;
     const std::uint8_t* pV = pU + CW * CH;
@@ -184,9 +150,8 @@ namespace
       for( int x = 0; x < W; x += Step )
       {
         const std::uint8_t Y = pY[y * W + x];
-        const int C = ( y >> i_rSource.ChromaShiftY ) * CW + ( x >> i_rSource.ChromaShiftX );
-        const double Cb = bGrey ? 0.0 : pU[C] - 128.0;
-        const double Cr = bGrey ? 0.0 : pV[C] - 128.0;
+        const int C = ( y >> ShiftY ) * CW + x / 2;
+        const double Cb = pU[C] - 128.0, Cr = pV[C] - 128.0;
         for( const char Letter : Layout )
           Out.push_back( Letter == 'Y'   ? Y
                          : Letter == 'y' ? pY[y * W + x + 1]
@@ -219,11 +184,11 @@ namespace
       GTEST_SKIP() << "no ffmpeg";
     // Odd sizes, where the last chroma sample serves one pixel, and an even-width 4:2:2 image,
     // which the packed formats take without a colour conversion.
-    const VSource Sources[] = { { "YUV420_37x29", "yuvj420p", 37, 29, 1, 1 },
-                                { "YUV422_38x30", "yuvj422p", 38, 30, 1, 0 },
-                                { "YUV422_35x17", "yuvj422p", 35, 17, 1, 0 },
-                                { "YUV444_40x24", "yuvj444p", 40, 24, 0, 0 },
-                                { "Grey_48x32", "gray", 48, 32, 0, 0 } };
+    // An odd size, where the last chroma sample serves one pixel, and an even-width 4:2:2 image,
+    // which the packed formats take without a colour conversion. TurboJPEG alone tells the
+    // other chroma layouts apart.
+    const std::tuple< const char*, int, int > Sources[] = {
+        { "yuvj420p", 37, 29 }, { "yuvj422p", 38, 30 }, { "yuvj422p", 35, 17 } };
     // The wish, what any image delivers for it, and what a 4:2:2 image of even width delivers.
     const EPixelFormat Wishes[][3] = {
         { PixelFormat_U8Y8V8Y8, PixelFormat_R8G8B8, PixelFormat_U8Y8V8Y8 },
@@ -237,23 +202,23 @@ namespace
         { PixelFormat_BayerRG8, PixelFormat_R8G8B8, PixelFormat_R8G8B8 },
         { PixelFormat_PlanarY8U8V8, PixelFormat_R8G8B8, PixelFormat_R8G8B8 },
     };
-    for( const VSource& rSource : Sources )
+    for( const auto& [pPlanes, Width, Height] : Sources )
     {
-      const std::string Path = MakeJPEG( rSource );
+      const std::string Path = MakeJPEG( pPlanes, Width, Height );
       const VBytes JPEG = ReadWholeFile( Path );
-      ASSERT_FALSE( JPEG.empty() ) << rSource.Name;
-      const VBytes Planes = FfmpegDecode( Path, rSource.PixelFormat );
-      const bool bPacked422 = std::string( rSource.PixelFormat ) == "yuvj422p" && rSource.Width % 2 == 0;
+      ASSERT_FALSE( JPEG.empty() ) << Path;
+      const VBytes Planes = FfmpegDecode( Path, pPlanes );
+      const bool b420 = std::string( pPlanes ) == "yuvj420p", bPacked422 = !b420 && Width % 2 == 0;
       for( const auto& rWish : Wishes )
       {
-        SCOPED_TRACE( std::string( rSource.Name ) + " to format " + std::to_string( rWish[0] ) );
+        SCOPED_TRACE( Path + " to format " + std::to_string( rWish[0] ) );
         IVideoFrameInfo Info;
         std::shared_ptr< IBuffer > pOutput;
         ASSERT_TRUE( Read( JPEG, rWish[0], pOutput, &Info ) );
         EXPECT_EQ( std::tie( Info.PixelFormat, Info.ImageWidth, Info.ImageHeight ),
-                   std::tie( rWish[bPacked422 ? 2 : 1], rSource.Width, rSource.Height ) );
+                   std::tie( rWish[bPacked422 ? 2 : 1], Width, Height ) );
         ASSERT_TRUE( pOutput );
-        const VBytes Want = Expected( rSource, Planes, Info.PixelFormat );
+        const VBytes Want = Expected( Planes, Width, Height, b420, Info.PixelFormat );
         ASSERT_EQ( Want.size(), pOutput->GetSize() );
         ASSERT_EQ( pOutput->GetSize(), GetVideoFrameSizeInBytes64( Info ) );
         const VDifference Distance = Difference( Want, *pOutput );

@@ -94,15 +94,14 @@ namespace
   {
     if( !HaveFfmpeg() )
       GTEST_SKIP() << "needs ffmpeg";
+    // Both payloads go through the one wrapper, whose ways with each sample layout the PNG rows
+    // walk; the TIFF row shows that the payload reaches it.
     const std::tuple< const char*, EVideoPayload, const char*, EPixelFormat > Cases[] = {
         { "png", VideoPayload_ImagePNG, "rgb24", PixelFormat_R8G8B8 },
         { "png", VideoPayload_ImagePNG, "gray", PixelFormat_Luminance8 },
         { "png", VideoPayload_ImagePNG, "pal8", PixelFormat_R8G8B8 },
         { "png", VideoPayload_ImagePNG, "rgba", PixelFormat_Unspecified }, // refused
         { "tiff", VideoPayload_ImageTIFF, "rgb24", PixelFormat_R8G8B8 },
-        { "tiff", VideoPayload_ImageTIFF, "gray", PixelFormat_Luminance8 },
-        { "tiff", VideoPayload_ImageTIFF, "pal8", PixelFormat_R8G8B8 },
-        { "tiff", VideoPayload_ImageTIFF, "rgba", PixelFormat_Unspecified },
     };
     for( const auto& [pExtension, Payload, pStored, Delivered] : Cases )
     {
@@ -145,6 +144,7 @@ namespace
     EXPECT_EQ( Bytes( pFrame ), Ramp() );
 
     VBytes Target( Width * Height );
+    const VLogCapture Quiet( "TIFFIO" );
     for( std::size_t Cut = 0; Cut < TIFF.size(); Cut += 7 )
     {
       Info = FrameInfo( Width, Height, PixelFormat_Luminance8 );
