@@ -12,7 +12,6 @@ TEST( LongPath, NarrowAndWideFormsAgreeAndASecondConversionChangesNothing )
     const char* Long;
   } Cases[] = { { "C:\\data\\clip.lvid", "\\\\?\\C:\\data\\clip.lvid" },
                 { "d:/data/clip.lvid", "\\\\?\\d:\\data\\clip.lvid" },
-                { "C:\\", "\\\\?\\C:\\" },
                 { "C:clip.lvid", "C:clip.lvid" }, // relative to the drive's current folder
                 { "C:", "C:" },
                 { "1:\\clip", "1:\\clip" }, // not a drive letter
@@ -23,7 +22,6 @@ TEST( LongPath, NarrowAndWideFormsAgreeAndASecondConversionChangesNothing )
                 { "\\\\", "\\\\?\\UNC\\" },
                 { "data/clip.lvid", "data\\clip.lvid" },
                 { "/data/clip.lvid", "\\data\\clip.lvid" }, // a POSIX absolute path is not absolute there
-                { "/", "\\" },
                 { "", "" } };
   for( const auto& rCase : Cases )
   {

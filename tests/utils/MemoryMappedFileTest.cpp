@@ -118,15 +118,6 @@ namespace
     bStop = true;
     Cutter.join();
     EXPECT_GT( Failed, 0 );
-
-    // Once the cut stays, what was lost fails, a range that only starts in what is left fails, and
-    // what is left reads.
-    ASSERT_TRUE( CutTo( 8 ) );
-    Read.resize( s_Page );
-    EXPECT_FALSE( ReadAt( Stream, 40 * s_Page, Read ) );
-    EXPECT_FALSE( ReadAt( Stream, 8 * s_Page - 10, Read ) );
-    ASSERT_TRUE( ReadAt( Stream, s_Page, Read ) );
-    EXPECT_EQ( Read, Slice( s_Page, s_Page ) );
   }
 
   // A file that cannot be mapped (an empty one) falls back to the plain stream with a log line; a

@@ -149,9 +149,7 @@ TEST( AttributeRecords, EachRequiredKeyFailsItsOwnRecordAlone )
   }
 }
 
-// ---------------------------------------------------------------------------------------------
 // Frame description.
-
 TEST( FrameInfo, NoVideoWritesOnlyPresentFalseAndUnusableDescriptionsNothing )
 {
   IVideoAttributes Store;
@@ -210,9 +208,7 @@ TEST( FrameInfo, ConversionDistortionFlagFollowsTheHistory )
   EXPECT_FALSE( Single.HasConversionDistortion() );
 }
 
-// ---------------------------------------------------------------------------------------------
 // Audio, lens, history.
-
 TEST( AudioFrameInfo, NoAudioIsAnAnswerZeroChannelsAndUnknownFormatsAreNot )
 {
   for( const IAudioFrameInfo& rWritten : { IAudioFrameInfo(), IAudioFrameInfo{ AudioSampleFormat_Int16, 44100, 0 } } )

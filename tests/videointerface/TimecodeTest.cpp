@@ -125,9 +125,7 @@ TEST( TimecodeText, Golden )
   EXPECT_EQ( "", ITimecode::GetStandardText( 0xFFFFFFFFu, true ) );
 }
 
-// ---------------------------------------------------------------------------------------------
 // The status line's timecode of one frame.
-
 TEST( FrameTimecode, Golden )
 {
   ITimecode HugeDays = Label( 3, 23, 59, 59, 29 );
@@ -144,7 +142,6 @@ TEST( FrameTimecode, Golden )
       { "rate 120 counts as thirty", Label( 2, 1, 0, 0, 0 ), { 135000000, 1125000, 0 }, 1, "01:00:00:00+25 [30 fps]" },
       { "rate 120, fifth frame", Label( 3, 1, 0, 0, 0 ), { 135000000, 1125000, 0 }, 5, "01:00:00:01+25 [30 fps]" },
       { "rate 25", Label( 3, 0, 0, 0, 0 ), { 25, 1, 0 }, 26, "00:00:01:01+00 [25 fps]" },
-      { "rate 24", Label( 3, 0, 0, 0, 0 ), { 24, 1, 0 }, 24, "00:00:01:00+00 [24 fps]" },
       { "rate 23.98", Label( 3, 0, 0, 0, 0 ), { 135000000, 5630625, 0 }, 25, "00:00:01:01+00 [23.98 fps]" },
       { "rate 59.94", Label( 3, 0, 0, 0, 0 ), { 135000000, 2252250, 0 }, 3, "00:00:00:01+50 [29.97 fps]" },
       { "drop frame shows non-drop", Label( 5, 0, 0, 59, 29 ), { 30000, 1001, 0 }, 1, "00:01:00:00+00 [29.97 fps]" },
