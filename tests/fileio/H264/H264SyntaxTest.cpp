@@ -200,7 +200,6 @@ namespace
     // The encoder's arguments, the profile they give, and whether the SPS has HRD and picture
     // timing, with which the SEI is described.
     const std::tuple< const char*, std::uint32_t, bool > Encoders[] = {
-        { "-profile:v baseline", 66, false },
         { "-profile:v high -x264-params cqm=jvt", 100, false },
         { "-profile:v main -b:v 300k -maxrate 300k -bufsize 600k -x264-params nal-hrd=cbr:force-cfr=1:pic-struct=1", 77,
           true },

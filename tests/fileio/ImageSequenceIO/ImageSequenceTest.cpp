@@ -167,11 +167,11 @@ namespace
     WriteWholeFile( Folder / "g4000000000.png", "beyond the count" );
     VImageSequenceReader Reader;
     ASSERT_TRUE( Reader.Open( Folder / "g.lumekimagesequence" ) );
-    EXPECT_EQ( 2u, Reader.GetStoredFrameCount() );
-    EXPECT_EQ( std::nullopt, Reader.FindStoredFrameAtOrBefore( 4 ) );
-    EXPECT_EQ( 5u, Reader.FindStoredFrameAtOrBefore( 3999999997u ) );
-    EXPECT_EQ( 3999999998u, Reader.FindStoredFrameAtOrAfter( 6 ) );
-    EXPECT_EQ( std::nullopt, Reader.FindStoredFrameAtOrAfter( 3999999999u ) );
+    using VFound = std::optional< std::uint64_t >;
+    EXPECT_EQ( std::tuple( Reader.GetStoredFrameCount(), Reader.FindStoredFrameAtOrBefore( 4 ),
+                           Reader.FindStoredFrameAtOrBefore( 3999999997u ), Reader.FindStoredFrameAtOrAfter( 6 ),
+                           Reader.FindStoredFrameAtOrAfter( 3999999999u ) ),
+               std::tuple( 2u, VFound(), VFound( 5 ), VFound( 3999999998u ), VFound() ) );
 
     VLogCapture Log( "ImageSequenceIO" );
     std::shared_ptr< ZOL::IBuffer > pVideo;
@@ -219,10 +219,9 @@ namespace
       EXPECT_EQ( Folder / rCase.FirstFile, pSequence->ExpandFileName( 0 ) );
       EXPECT_EQ( rCase.PadWidth, pSequence->GetSequenceInfo().FrameIndexPadWidth );
       const ZOL::IVideoFrameInfo& rInfo = pSequence->GetVideoFrameInfo();
-      EXPECT_EQ( std::tie( rInfo.ImageWidth, rInfo.ImageHeight, rInfo.PixelFormat ),
-                 std::tuple( 40, 30, ZOL::PixelFormat_R8G8B8 ) );
-      EXPECT_EQ( ZOL::VideoPayload_ImagePNG, pSequence->GetVideoPayload() );
-      EXPECT_DOUBLE_EQ( 30.0, pSequence->GetVideoTiming().GetFrameRate() );
+      EXPECT_EQ( std::tuple( rInfo.ImageWidth, rInfo.ImageHeight, rInfo.PixelFormat, pSequence->GetVideoPayload(),
+                             pSequence->GetVideoTiming().GetFrameRate() ),
+                 std::tuple( 40, 30, ZOL::PixelFormat_R8G8B8, ZOL::VideoPayload_ImagePNG, 30.0 ) );
       EXPECT_EQ( rCase.Stored, StoredFrames( *pSequence, rCase.FrameCount ) );
     }
 
@@ -244,18 +243,15 @@ namespace
         WriteDescriptor( Folder / "shot.lumekimagesequence", MakeDescriptor( "shot_%FRAME_NUMBER%.png", 10, 8, 4 ) ) );
     VImageSequenceReader Reader;
     ASSERT_TRUE( Reader.Open( Folder / "shot_0002.png" ) );
-    EXPECT_EQ( Folder / "shot.lumekimagesequence", Reader.GetDescriptorPath() );
-    EXPECT_EQ( 10u, Reader.GetFrameCount() );
-    EXPECT_EQ( 48, Reader.GetVideoFrameInfo().ImageWidth );
-    EXPECT_DOUBLE_EQ( 25.0, Reader.GetVideoTiming().GetFrameRate() );
-    EXPECT_EQ( 3u, Reader.GetStoredFrameCount() );
+    EXPECT_EQ( std::tuple( Reader.GetDescriptorPath(), Reader.GetFrameCount(), Reader.GetVideoFrameInfo().ImageWidth,
+                           Reader.GetVideoTiming().GetFrameRate(), Reader.GetStoredFrameCount() ),
+               std::tuple( Folder / "shot.lumekimagesequence", 10u, 48, 25.0, 3u ) );
 
     // A descriptor of other files is not the run's.
     ASSERT_TRUE( WriteDescriptor( Folder / "shot.lumekimagesequence", MakeDescriptor( "shot_%FRAME%.jpg", 10 ) ) );
     ASSERT_TRUE( Reader.Open( Folder / "shot_0002.png" ) );
-    EXPECT_EQ( "", Reader.GetDescriptorPath() );
-    EXPECT_EQ( 4u, Reader.GetFrameCount() );
-    EXPECT_EQ( 40, Reader.GetVideoFrameInfo().ImageWidth );
+    EXPECT_EQ( std::tuple( Reader.GetDescriptorPath(), Reader.GetFrameCount(), Reader.GetVideoFrameInfo().ImageWidth ),
+               std::tuple( "", 4u, 40 ) );
   }
 
   TEST( ImageHeader, ReadsTheStatedSizeAndSurvivesEveryCut )
