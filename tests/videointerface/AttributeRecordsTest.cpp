@@ -249,8 +249,8 @@ TEST( LensDistortion, ModelsWithoutParametersReadWithoutThemAndAnUnknownModelFai
 }
 
 // Written again, what was read gives the same keys: no field of any record lost, moved or changed.
-// A record without its pixel format ends the list; an unknown container text keeps the default.
-TEST( ConversionRecords, RoundTripInOrderAndAGapEndsTheList )
+// An unknown container text keeps the default. (A gap ending the list is a row of the flag's test.)
+TEST( ConversionRecords, RoundTripInOrderAndAnUnknownContainerKeepsTheDefault )
 {
   const VConversionRecord Full{ VideoContainer_AVI,
                                 { 0.5f, 1.8f },
@@ -266,10 +266,7 @@ TEST( ConversionRecords, RoundTripInOrderAndAGapEndsTheList )
   ASSERT_EQ( 11u, Read.size() );
   ASSERT_TRUE( WriteConversionRecords( Again, Read ) );
   EXPECT_TRUE( Again == Store );
-
-  Store.Remove( "ConversionRecord.1.VideoFrameInfo.PixelFormat" );
   Store.Set( "ConversionRecord.0.Container", "avi" );
   ReadConversionRecords( Store, Read );
-  ASSERT_EQ( 1u, Read.size() );
   EXPECT_EQ( VideoContainer_LVID, Read[0].Container );
 }
