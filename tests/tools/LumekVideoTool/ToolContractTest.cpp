@@ -101,19 +101,16 @@ namespace
     // Samples make-sample refuses to write, and must leave no file behind.
     const std::string Refused = Scratch.Path( "refused" );
     fs::create_directories( Refused );
-    const std::vector< std::vector< std::string > > Refusals = {
-        { "take.avi" }, // no writer
-        { "take.LVID" },
-        { "take" },
-        { "take.lvid", "--frame-format", "png" },
-        { "take.lumekimagesequence", "--frame-format", "gif" },
-        { "take.lumekimagesequence", "--format", "BayerGB8" },
-    };
-    for( const auto& rRefusal : Refusals )
+    for( const std::vector< std::string >& Refusal :
+         std::vector< std::vector< std::string > >{ { "/take.avi" }, // no writer
+                                                    { "/take.LVID" },
+                                                    { "/take" },
+                                                    { "/take.lvid", "--frame-format", "png" },
+                                                    { "/take.lumekimagesequence", "--frame-format", "gif" },
+                                                    { "/take.lumekimagesequence", "--format", "BayerGB8" } } )
     {
-      std::vector< std::string > Arguments = { "make-sample", Refused + "/" + rRefusal[0], "--frames", "2" };
-      Arguments.insert( Arguments.end(), rRefusal.begin() + 1, rRefusal.end() );
-      Cases.push_back( { Arguments, 2, Sample } );
+      Cases.push_back( { { "make-sample", Refused + Refusal[0], "--frames", "2" }, 2, Sample } );
+      Cases.back().Arguments.insert( Cases.back().Arguments.end(), Refusal.begin() + 1, Refusal.end() );
     }
 
     const VBytes ClipBytes = ReadFileBytes( Clip );
@@ -172,20 +169,6 @@ namespace
       EXPECT_EQ( OutProperties["ConversionRecord.0.Container"], "LVID" );
       EXPECT_EQ( OutProperties["ConversionRecord.0.VideoFrameInfo.PixelFormat"], Name );
     }
-  }
-
-  TEST( ToolMakeSample, WritesTheAskedRecording )
-  {
-    // The default sample, with sound, is the golden report's.
-    VScratch Scratch;
-    const std::string Path = Scratch.Path( "sample.lvid" );
-    const VRun Make = RunTool( { "make-sample", Path, "--width", "96", "--height", "54", "--frames", "10", "--fps",
-                                 "50", "--format", "U8Y8V8Y8", "--no-audio" } );
-    ASSERT_EQ( Make.ExitCode, 0 ) << Make.Err;
-    const auto Json = ParseJson( RunInProcess( { "info", Path } ).Out );
-    EXPECT_EQ( Json.get< std::string >( "infoPanel.video" ),
-               "V: 96 x 54 / U8Y8V8Y8 / 50.00Hz / 10 frames (2 missing) / 0.20s" );
-    EXPECT_EQ( Json.get< std::string >( "audio.payload" ), "None" );
   }
 
   TEST( ToolMakeSample, WritesImageSequencesOfTheScene )
@@ -325,6 +308,15 @@ namespace
     EXPECT_GT( Report.get< double >( "peakRssMiB" ), 0.0 );
     EXPECT_GE( Report.get< double >( "seconds" ), 0.0 );
     EXPECT_NEAR( Report.get< double >( "msPerFrame" ) * Report.get< double >( "fps" ), 1000.0, 1e-6 );
+
+    // The sample's options, the default one being the golden report's.
+    const VRun Asked = RunTool( { "make-sample", Path, "--width", "96", "--height", "54", "--frames", "10", "--fps",
+                                  "50", "--format", "U8Y8V8Y8", "--no-audio" } );
+    ASSERT_EQ( Asked.ExitCode, 0 ) << Asked.Err;
+    const auto Json = ParseJson( RunInProcess( { "info", Path } ).Out );
+    EXPECT_EQ( Json.get< std::string >( "infoPanel.video" ),
+               "V: 96 x 54 / U8Y8V8Y8 / 50.00Hz / 10 frames (2 missing) / 0.20s" );
+    EXPECT_EQ( Json.get< std::string >( "audio.payload" ), "None" );
   }
 
   TEST( JsonText, TextsFromADamagedFileStayValid )
