@@ -81,19 +81,14 @@ namespace
       for( const std::uint64_t f : rGroup )
       {
         ZOL::IVideoFrame Frame;
-        if( bH264 )
-        {
-          std::shared_ptr< ZOL::IBuffer > pUnit;
-          ZOL::IAudioBuffers Audio;
-          ASSERT_TRUE( io_rReader.ReadFrameData( f, pUnit, Audio, true, false ) );
-          Frame.VideoFrameInfo = io_rReader.GetVideoFrameInfo();
-          ASSERT_TRUE( pDecoder->Decode( *pUnit, ZOL::PixelFormat_U8Y8V8Y8, Frame.Video, Frame.VideoFrameInfo ) )
-              << "frame " << f;
-        }
-        else
-        {
-          ASSERT_TRUE( io_rReader.ReadFrame( f, Frame, true, false ) ) << "frame " << f;
-        }
+        std::shared_ptr< ZOL::IBuffer > pUnit;
+        ZOL::IAudioBuffers Audio;
+        Frame.VideoFrameInfo = io_rReader.GetVideoFrameInfo();
+        ASSERT_TRUE( bH264
+                         ? io_rReader.ReadFrameData( f, pUnit, Audio, true, false ) &&
+                               pDecoder->Decode( *pUnit, ZOL::PixelFormat_U8Y8V8Y8, Frame.Video, Frame.VideoFrameInfo )
+                         : io_rReader.ReadFrame( f, Frame, true, false ) )
+            << "frame " << f;
         const std::uint8_t* pWant = Expected.data() + f * ExpectedFrameBytes;
         const std::uint8_t* pHave = Frame.Video->GetData();
         const std::size_t Step = Frame.VideoFrameInfo.PixelFormat == ZOL::PixelFormat_R8G8B8u8 ? 4 : 3;
@@ -155,23 +150,14 @@ TEST( MovFfmpeg, MatchesFfprobeAndFfmpeg )
         Audio.insert( Audio.end(), pBlock->GetData(), pBlock->GetData() + pBlock->GetSize() );
     }
     // H.264 is delivered as access units with the parameter sets, not as stored.
-    if( rCase.Payload != ZOL::VideoPayload_VideoH264 )
-    {
-      EXPECT_TRUE( Video == StreamCopy( Path, "v:0" ) );
-    }
-    if( rCase.AudioFormat != NoAudio )
-    {
-      EXPECT_EQ( Reader.GetAudioFrameInfo().SampleRate, std::stoi( Probe( Path, "stream=sample_rate", "a:0" ) ) );
-    }
-    EXPECT_TRUE( Audio == ( rCase.AudioFormat != NoAudio ? StreamCopy( Path, "a:0" ) : VBytes() ) ) << Audio.size();
-    if( *rCase.RawPixelFormat != 0 )
-    {
-      EXPECT_TRUE( Video == LumekTest::FfmpegDecode( Path, rCase.RawPixelFormat ) );
-    }
-    else if( rCase.Payload != Raw )
-    {
+    const bool bAudio = rCase.AudioFormat != NoAudio;
+    EXPECT_TRUE( rCase.Payload == ZOL::VideoPayload_VideoH264 || Video == StreamCopy( Path, "v:0" ) );
+    EXPECT_EQ( Reader.GetAudioFrameInfo().SampleRate,
+               bAudio ? std::stoi( Probe( Path, "stream=sample_rate", "a:0" ) ) : 0 );
+    EXPECT_TRUE( Audio == ( bAudio ? StreamCopy( Path, "a:0" ) : VBytes() ) ) << Audio.size();
+    EXPECT_TRUE( *rCase.RawPixelFormat == 0 || Video == LumekTest::FfmpegDecode( Path, rCase.RawPixelFormat ) );
+    if( rCase.Payload != Raw )
       ExpectPicturesMatch( Reader, Path, rCase.Tolerance );
-    }
   }
 }
 

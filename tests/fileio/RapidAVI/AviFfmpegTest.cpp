@@ -97,10 +97,8 @@ TEST( AviFfmpeg, MatchesFfprobeAndFfmpegDecodeAfterEachSeek )
       for( std::size_t p = 0; p < FrameBytes; ++p )
       {
         Difference += std::abs( int( Got[p] ) - int( Want[p] ) );
-        if( rCase.Payload == ZOL::VideoPayload_VideoH264 && p % 2 == 1 )
-        {
-          ASSERT_EQ( Got[p], Want[p] ) << "luma byte " << p << " of frame " << i;
-        }
+        ASSERT_TRUE( rCase.Payload != ZOL::VideoPayload_VideoH264 || p % 2 == 0 || Got[p] == Want[p] )
+            << "luma byte " << p << " of frame " << i << ": " << int( Got[p] ) << " for " << int( Want[p] );
       }
       EXPECT_LE( Difference / FrameBytes, rCase.Tolerance ) << "frame " << i;
     }
@@ -208,18 +206,13 @@ TEST( AviMJPEG, AVI1FramesRebuiltWithTheTypicalTablesAndTheOnesRefused )
   LumekTest::VLogCapture Log;
   VOpenedAvi Avi = OpenAvi( BuildAvi( Spec ) );
   ASSERT_TRUE( Avi.bOpened );
+  // The refused frames fail alone; their neighbours decode to the whole frames' pictures.
   for( std::uint64_t i = 0; i < Spec.Frames.size(); ++i )
   {
-    const VBytes Rebuilt = ReadVideo( *Avi.pReader, i, true );
-    if( i >= Frames || i == 2 )
-    {
-      // The refused frames fail alone; their neighbours decode.
-      EXPECT_TRUE( Rebuilt.empty() ) << "frame " << i;
-      continue;
-    }
-    const VBytes Whole = ReadVideo( *pWhole, i, true );
-    ASSERT_EQ( Whole.size(), std::size_t( Width * Height * 3 ) );
-    EXPECT_TRUE( Rebuilt == Whole ) << "frame " << i;
+    const bool bRefused = i >= Frames || i == 2;
+    const VBytes Whole = bRefused ? VBytes() : ReadVideo( *pWhole, i, true );
+    EXPECT_EQ( Whole.size(), bRefused ? 0 : std::size_t( Width * Height * 3 ) );
+    EXPECT_TRUE( ReadVideo( *Avi.pReader, i, true ) == Whole ) << "frame " << i;
   }
   EXPECT_TRUE( Log.Has( "MJPEG not in expected format for AVI: missing APP0." ) );
   EXPECT_TRUE( Log.Has( "MJPEG not in expected format for AVI: APP0 is not 'AVI1' type." ) );
