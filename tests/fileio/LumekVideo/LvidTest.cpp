@@ -307,12 +307,6 @@ namespace
     };
   }
 
-  std::size_t BlocksEnd()
-  {
-    const VRecordingPlan Plan = SmallPlan();
-    return 48 + Plan.DescriptionBlock.size() + Plan.AttributeBlock.size();
-  }
-
   using VFrames = std::array< bool, 3 >;
   constexpr VFrames All{ true, true, true }, None{ false, false, false }, AllButMiddle{ true, false, true };
   constexpr VFrames FirstTwo{ true, true, false };
@@ -329,9 +323,6 @@ namespace
   using B = VBytes;
   using F = const VAssembled;
   const VBrokenCase s_BrokenCases[] = {
-      { "Empty", []( B& b, F& ) { b.clear(); }, false, None },
-      { "ShortHeader", []( B& b, F& ) { b.resize( 47 ); }, false, None },
-      { "HeaderOnly", []( B& b, F& ) { b.resize( 48 ); }, false, None },
       { "BadMagicLastByte", []( B& b, F& ) { b[19] = 0; }, false, None },
       { "FormatVersion2", []( B& b, F& ) { Patch( b, 24, 2, 4 ); }, false, None },
       { "AnySignatureAndRevision",
@@ -341,14 +332,11 @@ namespace
           Patch( b, 28, 0xFFFFFFFF, 4 );
         },
         true, All },
-      { "DescriptionBlockCut", []( B& b, F& ) { b.resize( 48 + 20 ); }, false, None },
-      { "AttributeBlockCut", []( B& b, F& ) { b.resize( BlocksEnd() - 1 ); }, false, None },
       { "NoPixelFormat", Described( s_SmallVideo, "VideoFrameInfo.PixelFormat" ), false, None },
       { "NoImageHeight", Described( s_SmallVideo, "VideoFrameInfo.ImageHeight" ), false, None },
       { "NoAudioPresent", Described( s_SmallVideo, "AudioFrameInfo.Present" ), false, None },
       { "IndexOffsetAtEnd", []( B& b, F& ) { Patch( b, 40, b.size() ); }, false, None },
       { "IndexOffsetSevenBeforeEnd", []( B& b, F& ) { Patch( b, 40, b.size() - 7 ); }, false, None },
-      { "IndexOffsetPastEnd", []( B& b, F& ) { Patch( b, 40, b.size() + 4096 ); }, false, None },
       { "IndexOffsetNegative", []( B& b, F& ) { Patch( b, 40, Largest ); }, false, None },
       { "EntryCountZero", []( B& b, F& f ) { Patch( b, f.IndexOffset, 0 ); }, true, None },
       // The entries that are there stay readable, as after any short read of the index.
@@ -359,8 +347,6 @@ namespace
       { "FrameOffsetAtEnd", []( B& b, F& f ) { Patch( b, Entry( f, 1 ) + 8, b.size() ); }, true, AllButMiddle },
       { "FrameOffsetLastByte", []( B& b, F& f ) { Patch( b, Entry( f, 1 ) + 8, b.size() - 1 ); }, true, AllButMiddle },
       { "FrameOffsetNegative", []( B& b, F& f ) { Patch( b, Entry( f, 1 ) + 8, Largest ); }, true, AllButMiddle },
-      { "FrameOffsetLargestPositive", []( B& b, F& f ) { Patch( b, Entry( f, 1 ) + 8, Largest / 2 ); }, true,
-        AllButMiddle },
       { "ZeroAlignment", []( B& b, F& ) { Patch( b, 32, 0 ); }, true, None },
       { "AlignmentHuge", []( B& b, F& ) { Patch( b, 32, Largest / 2 + 2 ); }, true, None },
       { "AudioByteCountHuge", []( B& b, F& f ) { Patch( b, f.RecordOffsets[1] + 16, ~0u, 4 ); }, true, AllButMiddle },
@@ -411,10 +397,13 @@ namespace
   TEST( LvidDamageSweep, EveryCutAndEveryFlippedByteReturns )
   {
     const VAssembled File = Assemble( SmallPlan() );
-    // The index is the last thing in a recording, so every shorter file lacks part of it.
+    // The index is the last thing in a recording, so every shorter file lacks part of it. None of
+    // them may reach the log: in particular no allocation was attempted.
+    LumekTest::VLogCapture Log;
     for( std::size_t Length = 0; Length < File.Bytes.size(); ++Length )
       EXPECT_FALSE( OpenAndReadEverything( VBytes( File.Bytes.begin(), File.Bytes.begin() + Length ) ) )
           << "cut at " << Length;
+    EXPECT_TRUE( Log.Messages.empty() ) << Log.Messages.front();
     for( std::size_t Position = 0; Position < File.Bytes.size(); ++Position )
       for( std::uint8_t Mask : { 0x01, 0x80, 0xFF } )
       {
