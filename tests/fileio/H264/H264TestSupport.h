@@ -136,9 +136,7 @@ namespace LumekTest
     {
       for( std::size_t i = 0; i < i_rStream.AccessUnits.size(); ++i )
         m_Frames[i < i_rFrameNumbers.size() ? i_rFrameNumbers[i] : i] = i_rStream.AccessUnits[i];
-      m_VideoInfo.ImageWidth = i_rStream.Width;
-      m_VideoInfo.ImageHeight = i_rStream.Height;
-      m_VideoInfo.PixelFormat = ZOL::PixelFormat_U8Y8V8Y8;
+      m_VideoInfo = FrameInfo( i_rStream.Width, i_rStream.Height, ZOL::PixelFormat_U8Y8V8Y8 );
       m_Timing.FramePeriodInTicks = m_Timing.TicksPerSecond / 25;
     }
 

@@ -31,8 +31,8 @@ namespace
     EXPECT_EQ( Reader.GetAudioPayload(), Audio.IsUsable() ? ZOL::AudioPayload_Uncompressed : ZOL::AudioPayload_None );
     EXPECT_EQ( Reader.GetAudioFrameInfo(), Audio );
     // The tags carry the timing, the timecode and the settings exactly.
-    EXPECT_EQ( Reader.GetVideoTiming(), Timing() );
-    EXPECT_EQ( Reader.GetTimecode(), StartTimecode() );
+    EXPECT_EQ( Reader.GetVideoTiming(), s_Timing );
+    EXPECT_EQ( Reader.GetTimecode(), s_StartTimecode );
     EXPECT_EQ( std::tie( Reader.GetVideoSettings().Saturation, Reader.GetVideoSettings().GammaCorrection ),
                std::tuple( 0.75f, 1.25f ) );
     std::string WritingApp;
@@ -147,7 +147,7 @@ namespace
     };
     for( const auto& [Edit, pMessage] : Cases )
     {
-      ASSERT_TRUE( WriteFamilyFile( Path, SmallCase(), {}, Edit ) );
+      ASSERT_TRUE( WriteFamilyFile( Path, s_SmallCase, {}, Edit ) );
       VLogCapture Log( "MkvReader" );
       MkvIO::VMkvReader Reader;
       EXPECT_FALSE( Reader.Open( Path ) );
@@ -168,7 +168,7 @@ namespace
 
   TEST_F( MkvReader, OddClustersReadWhatIsThere )
   {
-    const VFamilyCase Case = SmallCase();
+    const VFamilyCase Case = s_SmallCase;
     const VBytes Video = RawFrame( Case, 1 ), AudioA( 8, 0x11 ), AudioB( 12, 0x22 );
     struct VCase
     {
@@ -240,7 +240,7 @@ namespace
       EXPECT_DOUBLE_EQ( Reader.GetVideoFrameInfo().PixelAspectRatio, PixelAspectRatio );
     }
 
-    ASSERT_TRUE( WriteFamilyFile( Path, SmallCase(), {},
+    ASSERT_TRUE( WriteFamilyFile( Path, s_SmallCase, {},
                                   []( VDescription& io_rD ) { io_rD.Audio.BitDepth = 8, io_rD.Tags = {}; } ) );
     VLogCapture Log( "MkvReader" );
     MkvIO::VMkvReader Reader;
@@ -252,7 +252,7 @@ namespace
   // Cuts at every point and flips at every byte: no crash, no hang, and whatever opens reads.
   TEST_F( MkvReader, SurvivesEveryCutAndFlip )
   {
-    ASSERT_TRUE( WriteFamilyFile( Path, SmallCase() ) );
+    ASSERT_TRUE( WriteFamilyFile( Path, s_SmallCase ) );
     const VBytes Original = ReadWholeFile( Path );
     ASSERT_GT( Original.size(), 100u );
     const VLogCapture Quiet;

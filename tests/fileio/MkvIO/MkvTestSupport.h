@@ -21,29 +21,17 @@ namespace MkvTest
   };
 
   // 4 x 2 RGBA with 16-bit audio, three frames: small enough to cut at every byte.
-  inline VFamilyCase SmallCase()
-  {
-    return { ZOL::PixelFormat_R8G8B8u8, ZOL::AudioSampleFormat_Int16, false, 4, 2, 3 };
-  }
+  inline const VFamilyCase s_SmallCase{ ZOL::PixelFormat_R8G8B8u8, ZOL::AudioSampleFormat_Int16, false, 4, 2, 3 };
 
   inline ZOL::IAudioFrameInfo AudioInfo( const VFamilyCase& i_rCase )
   {
-    ZOL::IAudioFrameInfo Info;
-    if( i_rCase.Audio != ZOL::AudioSampleFormat_Unspecified )
-      Info = { i_rCase.Audio, 48000, 2 };
-    return Info;
+    return i_rCase.Audio != ZOL::AudioSampleFormat_Unspecified ? ZOL::IAudioFrameInfo{ i_rCase.Audio, 48000, 2 }
+                                                               : ZOL::IAudioFrameInfo();
   }
 
   // 50 frames a second, starting 1234 ticks in, at 10:20:30:12 with user bits A5A5.
-  inline ZOL::IVideoTiming Timing()
-  {
-    return { ZOL::DefaultTicksPerSecond, ZOL::DefaultTicksPerSecond / 50, 1234 };
-  }
-
-  inline ZOL::ITimecode StartTimecode()
-  {
-    return { ZOL::TimecodeStandard_25, 10, 20, 30, 12, 0xA5A5 };
-  }
+  inline const ZOL::IVideoTiming s_Timing{ ZOL::DefaultTicksPerSecond, ZOL::DefaultTicksPerSecond / 50, 1234 };
+  inline const ZOL::ITimecode s_StartTimecode{ ZOL::TimecodeStandard_25, 10, 20, 30, 12, 0xA5A5 };
 
   // Frame i of a raw case: bytes that differ at every position and in every frame.
   inline VBytes RawFrame( const VFamilyCase& i_rCase, int i_Frame )
@@ -79,7 +67,7 @@ namespace MkvTest
     Settings.GammaCorrection = 1.25f;
     MkvIO::VMkvDescription Description;
     MkvIO::VMkvWriter Writer;
-    if( !MkvIO::DescribeForMatroska( Video, i_rCase.bJPEG, AudioInfo( i_rCase ), Timing(), StartTimecode(), Settings,
+    if( !MkvIO::DescribeForMatroska( Video, i_rCase.bJPEG, AudioInfo( i_rCase ), s_Timing, s_StartTimecode, Settings,
                                      Description ) )
       return false;
     if( i_rEdit )

@@ -33,8 +33,8 @@ namespace
     ASSERT_TRUE( Reader.Open( Output ) );
     ASSERT_EQ( Reader.GetFrameCount(), static_cast< std::uint64_t >( Case.Frames ) );
     EXPECT_EQ( Reader.GetVideoFrameInfo().PixelFormat, Case.Format );
-    EXPECT_EQ( Reader.GetVideoTiming().FramePeriodInTicks, Timing().FramePeriodInTicks );
-    const ZOL::ITimecode Expected = StartTimecode(), Got = Reader.GetTimecode();
+    EXPECT_EQ( Reader.GetVideoTiming().FramePeriodInTicks, s_Timing.FramePeriodInTicks );
+    const ZOL::ITimecode Expected = s_StartTimecode, Got = Reader.GetTimecode();
     EXPECT_EQ( std::tie( Got.Standards, Got.Hours, Got.Minutes, Got.Seconds, Got.Frames ),
                std::tie( Expected.Standards, Expected.Hours, Expected.Minutes, Expected.Seconds, Expected.Frames ) );
     for( int Frame = 0; Frame < Case.Frames; ++Frame )
