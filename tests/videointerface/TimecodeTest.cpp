@@ -75,7 +75,6 @@ TEST( TimecodeValid, RangesAndDroppedLabels )
     ITimecode Timecode;
     bool Valid;
   } Cases[] = { { "dropped label 0 at minute 1", Label( 5, 0, 1, 0, 0 ), false },
-                { "first label at minute 1", Label( 5, 0, 1, 0, 2 ), true },
                 { "the tenth minute keeps label 0", Label( 5, 0, 10, 0, 0 ), true },
                 { "non-drop keeps label 0", Label( 4, 0, 1, 0, 0 ), true },
                 { "frame 24 at film", Label( 0, 0, 0, 0, 24 ), false },
