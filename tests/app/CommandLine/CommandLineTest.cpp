@@ -1,10 +1,8 @@
 #include "app/CommandLine/CommandLine.h"
+#include "tests/support/FfmpegFixtures.h"
 
 #include <gtest/gtest.h>
 
-#include <sys/wait.h>
-
-#include <cstdio>
 #include <sstream>
 #include <vector>
 
@@ -54,18 +52,11 @@ TEST( CommandLine, GoodAndBadCommandLines )
     EXPECT_EQ( Outcome( Arguments ), Expected ) << testing::PrintToString( Arguments );
 }
 
+// The real binary: exit code and the exact two lines on standard error, with nothing started.
 TEST( CommandLine, TheProgramItselfAnswersOnStandardError )
 {
-  // The real binary: exit code and the exact two lines, with nothing started.
-  const std::string Command = std::string( LUMEK_VIEWER_PATH ) + " --help 2>&1 >/dev/null";
-  FILE* pPipe = popen( Command.c_str(), "r" );
-  ASSERT_NE( pPipe, nullptr );
-  std::string Text;
-  char Buffer[256];
-  while( std::fgets( Buffer, sizeof( Buffer ), pPipe ) )
-    Text += Buffer;
-  const int Status = pclose( pPipe );
-  ASSERT_TRUE( WIFEXITED( Status ) );
-  EXPECT_EQ( WEXITSTATUS( Status ), 255 );
-  EXPECT_EQ( Text, ErrorText( "unrecognised option '--help'" ) );
+  int ExitCode = 0;
+  EXPECT_EQ( LumekTest::RunCommand( LUMEK_VIEWER_PATH " --help 2>&1 >/dev/null", &ExitCode ),
+             ErrorText( "unrecognised option '--help'" ) );
+  EXPECT_EQ( ExitCode, 255 );
 }

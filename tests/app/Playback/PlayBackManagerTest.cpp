@@ -120,37 +120,6 @@ TEST( PlayBackManager, ScriptedClocks )
   }
 }
 
-// The user's hand on a running clock at 10 fps: a jump, a pause, a stop and a reset.
-TEST( PlayBackManager, JumpPauseStopAndReset )
-{
-  VClock Clock( 100, 10 );
-  int FrameSeenByStopped = -1;
-  QObject::connect( &Clock.Manager, &VPlayBackManager::Stopped,
-                    [&] { FrameSeenByStopped = static_cast< int >( Clock.Manager.GetCurrentFrame() ); } );
-  Clock.Manager.Start();
-  Clock.Manager.PlayFrame( 0 ); // the current frame: nothing announced
-  Clock.TickAt( 200.0 );
-  Clock.Manager.PlayFrame( 40 );
-  // The elapsed 200 ms still count from the old start: the next tick lands 2 frames on.
-  Clock.TickAt( 200.0 );
-  // A pause holds the frame however long it lasts.
-  Clock.Manager.Pause();
-  EXPECT_FALSE( Clock.Manager.IsPlaying() );
-  Clock.Now = 5000.0;
-  Clock.Manager.Start();
-  Clock.TickAt( 5100.0 );
-  EXPECT_EQ( Clock.Shown, ( std::vector< int >{ 2, 40, 42, 43 } ) );
-
-  Clock.Manager.Stop();
-  EXPECT_EQ( Clock.Stops, 1 );
-  EXPECT_EQ( FrameSeenByStopped, 43 ); // listeners see the old position
-  EXPECT_EQ( Clock.Manager.GetCurrentFrame(), 0u );
-  Clock.Manager.PlayFrame( 7 );
-  Clock.Manager.Reset();
-  EXPECT_EQ( Clock.Stops, 1 );
-  EXPECT_EQ( Clock.Manager.GetCurrentFrame(), 0u );
-}
-
 int main( int argc, char** argv )
 {
   QCoreApplication Application( argc, argv );

@@ -13,7 +13,7 @@
 
 #include <QApplication>
 #include <QCheckBox>
-#include <QDir>
+#include <QFile>
 #include <QGroupBox>
 #include <QHBoxLayout>
 #include <QLineEdit>
@@ -21,27 +21,17 @@
 #include <QPushButton>
 #include <QQmlComponent>
 #include <QQmlEngine>
-#include <QRegularExpression>
 #include <QStandardItemModel>
-#include <QSvgRenderer>
 #include <QTableView>
 #include <QToolTip>
 
 #include <gtest/gtest.h>
 
 #include <memory>
-#include <set>
 #include <tuple>
 
 namespace
 {
-  const QString s_Prefix = QStringLiteral( "com.Lumek.LumekVideoViewer." );
-
-  QString Sheet()
-  {
-    return LumekVideoViewer::PrepareStyleSheet( *ZOL::ApplicationStyling() );
-  }
-
   class StyleSheet : public testing::Test
   {
   protected:
@@ -156,51 +146,6 @@ TEST( Theme, QmlSingletonGivesTheValuesReadOnly )
   QVariant Margin;
   QMetaObject::invokeMethod( pObject.get(), "margin", Q_RETURN_ARG( QVariant, Margin ) );
   EXPECT_EQ( Margin.toInt(), 10 );
-}
-
-// Every picture the sheet or the window names is there, every one there is used, and each is
-// drawn on a view box of its own shape, so that it scales to any density without distortion.
-TEST( Pictures, AreThereAndUsed )
-{
-  std::set< std::string > InResources;
-  for( const QString& rEntry : QDir( ":/" ).entryList( { s_Prefix + "*.svg" }, QDir::Files ) )
-    InResources.insert( rEntry.mid( s_Prefix.size() ).chopped( 4 ).toStdString() );
-  // The window shows these by itself rather than through the sheet.
-  std::set< std::string > Used = { "LumekLogo", "AppIcon", "AboutLogo" };
-  static const QRegularExpression s_Url( QStringLiteral( R"(url\(:/com\.Lumek\.LumekVideoViewer\.(\w+)\.svg\))" ) );
-  for( auto Matches = s_Url.globalMatch( Sheet() ); Matches.hasNext(); )
-    Used.insert( Matches.next().captured( 1 ).toStdString() );
-  ASSERT_GT( Used.size(), 3u );
-  EXPECT_EQ( Used, InResources ) << "named by the sheet or the window, and there";
-  for( const std::string& rName : InResources )
-  {
-    QSvgRenderer Renderer( ":/" + s_Prefix + QString::fromStdString( rName ) + ".svg" );
-    const QSize Size = Renderer.defaultSize();
-    ASSERT_TRUE( Renderer.isValid() && !Size.isEmpty() ) << rName;
-    EXPECT_NEAR( Renderer.viewBoxF().width() / Renderer.viewBoxF().height(), double( Size.width() ) / Size.height(),
-                 1e-6 )
-        << rName;
-  }
-}
-
-TEST_F( StyleSheet, NoTokenOrExpressionIsLeft )
-{
-  const QString Text = Sheet();
-  ASSERT_FALSE( Text.isEmpty() );
-  // "[Mid]" is matched by no value: the lower-case "[mid]" is the theme's.
-  static const QRegularExpression s_Token( QStringLiteral( R"(\[[A-Za-z][A-Za-z0-9]*\])" ) );
-  for( auto Matches = s_Token.globalMatch( Text ); Matches.hasNext(); )
-    EXPECT_EQ( Matches.next().captured( 0 ), "[Mid]" );
-  // What still looks like arithmetic is a picture's address or a plain number; anything else is
-  // an expression the evaluation could not read, and Qt would not either.
-  static const QRegularExpression s_Arithmetic( QStringLiteral( R"(:(.+[+\-\/*]+.+);\s*$)" ),
-                                                QRegularExpression::MultilineOption );
-  static const QRegularExpression s_Number( QStringLiteral( R"(^\s*-?[0-9.]+$)" ) );
-  for( auto Matches = s_Arithmetic.globalMatch( Text ); Matches.hasNext(); )
-  {
-    const QString Value = Matches.next().captured( 1 );
-    EXPECT_TRUE( Value.contains( "url(:/" + s_Prefix ) || s_Number.match( Value ).hasMatch() ) << Value.toStdString();
-  }
 }
 
 // The sheet on the widgets it has rules for, in their states, shown and painted with a menu

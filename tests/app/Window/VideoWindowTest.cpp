@@ -169,13 +169,15 @@ namespace
   };
 } // namespace
 
-TEST_F( VideoWindow, OpenShowsTheFirstFrameAndDescribesTheFileAndCloseEmptiesIt )
+// The open's own frame and the panel's texts; looping by default, then a walk by keys, the box,
+// the wheel and the buttons. Frames 4 and 7 are missing: a gap shows the last frame before it,
+// darkened while paused. Closing empties the window again.
+TEST_F( VideoWindow, OpenPlayLoopPauseStepSeekStopAndClose )
 {
   ExpectNoFileState();
   VRecordingSpec Spec;
-  Spec.Frames = FramesWithout( 10, { 4, 5 } );
+  Spec.Frames = FramesWithout( 10, { 4, 7 } );
   ASSERT_TRUE( Open( Recording( "first take.lvid", Spec ) ) );
-
   // Nothing has ticked yet: this is the open's own frame.
   EXPECT_EQ( m_pWindow->GetShownFrameIndex(), 0 );
   EXPECT_EQ( FrameForLevel( ShownLevel() ), 0 );
@@ -187,28 +189,15 @@ TEST_F( VideoWindow, OpenShowsTheFirstFrameAndDescribesTheFileAndCloseEmptiesIt 
   EXPECT_EQ( std::make_pair( Timebar()->maximum(), SpinBox()->maximum() ), std::make_pair( 9, 9 ) );
   // Taken from the bar's width at the open, before the labels settled the layout.
   EXPECT_NEAR( Timebar()->tickInterval(), Timebar()->width() / 10, 3 );
+  QTableWidget* pTable = m_pWindow->GetPropertiesDialog()->GetTable();
+  EXPECT_FALSE( pTable->findItems( "Recording.Description", Qt::MatchExactly ).isEmpty() );
+  EXPECT_FALSE( pTable->item( 0, 1 )->flags() & Qt::ItemIsEditable );
 
   // Playback starts by itself at every open; stepping while playing would fight the clock.
   EXPECT_TRUE( Playing() );
   EXPECT_EQ( PlayButton()->objectName() + ", " + PlayButton()->toolTip(), "Pause, Pause video" );
   EXPECT_EQ( Action( EAction::Play )->text(), "Pause" );
   EXPECT_FALSE( Action( EAction::NextFrame )->isEnabled() || Action( EAction::PreviousFrame )->isEnabled() );
-  QTableWidget* pTable = m_pWindow->GetPropertiesDialog()->GetTable();
-  EXPECT_FALSE( pTable->findItems( "Recording.Description", Qt::MatchExactly ).isEmpty() );
-  EXPECT_FALSE( pTable->item( 0, 1 )->flags() & Qt::ItemIsEditable );
-
-  m_pWindow->CloseFile();
-  ExpectNoFileState();
-  EXPECT_EQ( pTable->horizontalHeaderItem( 0 )->text(), "Property" );
-}
-
-// Looping by default, then a walk by keys, the box, the wheel and the buttons. Frames 7 and 8
-// are missing: a gap shows the last frame before it, darkened while paused.
-TEST_F( VideoWindow, PlayLoopPauseStepSeekAndStop )
-{
-  VRecordingSpec Spec;
-  Spec.Frames = FramesWithout( 10, { 7, 8 } );
-  ASSERT_TRUE( Open( Recording( "seek.lvid", Spec ) ) );
   std::uint64_t Highest = 0;
   EXPECT_TRUE( QTest::qWaitFor( [&] { return ( Highest = std::max( Highest, Frame() ) ) >= 8 && Frame() < 4; } ) );
   const QImage PauseButton = PlayButton()->grab().toImage();
@@ -218,26 +207,23 @@ TEST_F( VideoWindow, PlayLoopPauseStepSeekAndStop )
   // The button's picture follows its new name.
   EXPECT_NE( PlayButton()->grab().toImage(), PauseButton );
 
-  TypeFrame( 4 );
-  EXPECT_EQ( std::make_pair( Frame(), Timebar()->value() ), std::make_pair( std::uint64_t( 4 ), 4 ) );
-  EXPECT_EQ( FrameForLevel( ShownLevel() ), 4 );
+  TypeFrame( 3 );
+  EXPECT_EQ( std::make_pair( Frame(), Timebar()->value() ), std::make_pair( std::uint64_t( 3 ), 3 ) );
+  EXPECT_EQ( FrameForLevel( ShownLevel() ), 3 );
   Key( Qt::Key_Right );
   Key( Qt::Key_Right );
-  EXPECT_EQ( std::make_pair( Frame(), SpinBox()->value() ), std::make_pair( std::uint64_t( 6 ), 6 ) );
+  EXPECT_EQ( std::make_pair( Frame(), SpinBox()->value() ), std::make_pair( std::uint64_t( 5 ), 5 ) );
   Key( Qt::Key_Left );
-  EXPECT_EQ( FrameForLevel( ShownLevel() ), 5 );
-  for( int Delta : { 120, -120, -120 } )
+  EXPECT_EQ( m_pWindow->GetShownFrameIndex(), 3 );
+  // The warning darkens the last good picture to half.
+  EXPECT_NEAR( ShownLevel(), FrameLevel( 3 ) / 2, 6 );
+  for( int Delta : { 120, 120, -120 } )
   {
     QWheelEvent Wheel( QPointF( 50, 50 ), QPointF( 50, 50 ), QPoint(), QPoint( 0, Delta ), Qt::NoButton, Qt::NoModifier,
                        Qt::NoScrollPhase, false );
     QApplication::sendEvent( m_pWindow.get(), &Wheel );
   }
-  EXPECT_EQ( Frame(), 4u );
-
-  TypeFrame( 8 );
-  EXPECT_EQ( m_pWindow->GetShownFrameIndex(), 6 );
-  // The warning darkens the last good picture to half.
-  EXPECT_NEAR( ShownLevel(), FrameLevel( 6 ) / 2, 6 );
+  EXPECT_EQ( FrameForLevel( ShownLevel() ), 5 );
   TypeFrame( 9 );
   EXPECT_EQ( FrameForLevel( ShownLevel() ), 9 );
 
@@ -266,30 +252,28 @@ TEST_F( VideoWindow, PlayLoopPauseStepSeekAndStop )
   EXPECT_EQ( std::make_pair( Timebar()->maximum(), SpinBox()->maximum() ), std::make_pair( 0, 0 ) );
   ASSERT_TRUE( WaitForTheEnd() );
   EXPECT_EQ( FrameForLevel( ShownLevel() ), 0 );
+
+  m_pWindow->CloseFile();
+  ExpectNoFileState();
+  EXPECT_EQ( pTable->horizontalHeaderItem( 0 )->text(), "Property" );
 }
 
-// Whatever cannot be opened ends in the "Invalid file" dialog and no file; whatever survives of a
-// cut recording plays without a fault. A drop opens the first local file only.
+// Whatever cannot be opened ends in the "Invalid file" dialog and no file. A drop opens the first
+// local file only.
 TEST_F( VideoWindow, BadFilesGetTheInvalidFileDialogAndDropsOpenTheFirstLocalFile )
 {
   const std::string Good = Recording( "good.lvid" );
-  QFile Source( QString::fromStdString( Good ) );
-  ASSERT_TRUE( Source.open( QIODevice::ReadOnly ) );
-  const QByteArray Bytes = Source.readAll();
-  auto WriteFile = [this]( const QString& i_rName, const QByteArray& i_rBytes )
-  {
-    QFile File( m_Dir.filePath( i_rName ) );
-    EXPECT_TRUE( File.open( QIODevice::WriteOnly ) );
-    File.write( i_rBytes );
-    return File.fileName();
-  };
+  QFile Bad( m_Dir.filePath( "bad.lvid" ) );
+  ASSERT_TRUE( Bad.open( QIODevice::WriteOnly ) );
+  Bad.write( QByteArray( 5000, '\x5a' ) );
+  Bad.close();
   ASSERT_TRUE( Open( Good ) );
 
   QString Shown;
   VDialogCloser Closer(
       [&]( QDialog* i_pDialog )
       { Shown = i_pDialog->windowTitle() + ": " + qobject_cast< QMessageBox* >( i_pDialog )->text(); } );
-  EXPECT_FALSE( m_pWindow->OpenFile( WriteFile( "bad.lvid", QByteArray( 5000, '\x5a' ) ) ) );
+  EXPECT_FALSE( m_pWindow->OpenFile( Bad.fileName() ) );
   EXPECT_EQ( Closer.Count, 1 );
   EXPECT_EQ( Shown, "Invalid file: The video file could not be opened." );
   ExpectNoFileState();
@@ -298,16 +282,6 @@ TEST_F( VideoWindow, BadFilesGetTheInvalidFileDialogAndDropsOpenTheFirstLocalFil
   EXPECT_FALSE( m_pWindow->OpenFile( m_Dir.filePath( "absent.lvid" ) ) );
   EXPECT_EQ( Closer.Count, 3 );
   ExpectNoFileState();
-
-  // Cut in the header, in the first frames, and just before the end.
-  for( int Cut : { 16, 100, Bytes.size() / 2, Bytes.size() - 8 } )
-  {
-    SCOPED_TRACE( Cut );
-    if( m_pWindow->OpenFile( WriteFile( QString( "cut%1.lvid" ).arg( Cut ), Bytes.left( Cut ) ) ) )
-      QTest::qWait( 100 );
-    else
-      ExpectNoFileState();
-  }
 
   const QUrl First = QUrl::fromLocalFile( QString::fromStdString( Good ) );
   const QUrl Second = QUrl::fromLocalFile( QString::fromStdString( Recording( "second.lvid" ) ) );
