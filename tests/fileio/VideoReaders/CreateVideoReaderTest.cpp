@@ -29,9 +29,7 @@ namespace
         { "take.lumekimagesequence", Images },
         // One numbered image stands for its sequence.
         { "take_000123.jpg", Images },
-        { "take_000123.tiff", Images },
         { "clip.MOV", None },
-        { "clip.LVID", None },
         { "take_0001.JPG", None },
         { "notes.txt", None },
         { "clip", Images },
