@@ -226,6 +226,7 @@ namespace
         // 10 frames over a Duration of 200 ms: 50 frames a second, 2700000 ticks.
         { {}, 50.0, 1.0 },
         { { { "Lumek.External.TicksPerSecond", "25" }, { "Lumek.External.FramePeriodInTicks", "1" } }, 25.0, 1.0 },
+        { { { "Lumek.Internal.Unknown", "7" } }, 50.0, 1.0 }, // read, and not kept
         { { { Aspect, "2.5" } }, 50.0, 2.5 },
         { { { Aspect, "wide" } }, 50.0, 1.0 }, // unparsable: the value stays
     };
@@ -238,6 +239,8 @@ namespace
       ASSERT_TRUE( Reader.Open( Path ) );
       EXPECT_DOUBLE_EQ( Reader.GetVideoTiming().GetFrameRate(), FrameRate );
       EXPECT_DOUBLE_EQ( Reader.GetVideoFrameInfo().PixelAspectRatio, PixelAspectRatio );
+      std::string Unknown;
+      EXPECT_FALSE( Reader.GetInternalAttributes().GetValueAsString( "Unknown", Unknown ) );
     }
 
     ASSERT_TRUE( WriteFamilyFile( Path, s_SmallCase, {},
