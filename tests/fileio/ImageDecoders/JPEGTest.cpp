@@ -198,9 +198,7 @@ namespace
         { PixelFormat_B8G8R8, PixelFormat_B8G8R8, PixelFormat_B8G8R8 },
         { PixelFormat_R8G8B8u8, PixelFormat_R8G8B8u8, PixelFormat_R8G8B8u8 },
         { PixelFormat_B8G8R8u8, PixelFormat_B8G8R8u8, PixelFormat_B8G8R8u8 },
-        { PixelFormat_Luminance7, PixelFormat_R8G8B8, PixelFormat_R8G8B8 },
-        { PixelFormat_BayerRG8, PixelFormat_R8G8B8, PixelFormat_R8G8B8 },
-        { PixelFormat_PlanarY8U8V8, PixelFormat_R8G8B8, PixelFormat_R8G8B8 },
+        { PixelFormat_Luminance7, PixelFormat_R8G8B8, PixelFormat_R8G8B8 }, // no output of its own
     };
     for( const auto& [pPlanes, Width, Height] : Sources )
     {
