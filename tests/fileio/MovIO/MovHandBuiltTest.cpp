@@ -145,10 +145,6 @@ TEST( MovMetadata, QmdtWithBayerShowsLikeARecording )
   Settings.Saturation = 1.5f;
   Settings.GammaCorrection = 0.8f;
   ASSERT_TRUE( ZOL::WriteVideoSettings( Attributes, "", Settings ) );
-  CoreLumekTypes::VLensDistortionCalibration Lens;
-  Lens.RadialDistortionParameters = { 0.1, -0.02 };
-  Lens.RadialDistortionCentre_X = 8.5;
-  ASSERT_TRUE( ZOL::WriteLensDistortionCalibration( Attributes, "", Lens ) );
   Attributes.Set( "Camera.Name", std::string( "Lumek test camera" ) );
   ZOL::IVideoTiming Timing;
   VMovSpec Spec;

@@ -98,19 +98,13 @@ namespace MovTest
     return std::uint64_t( i_rSpec.Width ) * i_rSpec.Height * i_rSpec.BytesPerPixelTimes2 / 2;
   }
 
-  inline void Matrix( VAtomWriter& w )
-  {
-    w.U32( 0x10000 ).Zeros( 12 ).U32( 0x10000 ).Zeros( 12 ).U32( 0x40000000 );
-  }
-
   // A track's tkhd, elst, and its mdia up to the hdlr, left open.
   inline void BeginTrack( VAtomWriter& w, std::uint32_t i_Id, std::uint32_t i_MovieDuration, std::uint32_t i_Volume,
                           std::uint32_t i_Width, std::uint32_t i_Height, std::uint32_t i_Scale,
                           std::uint32_t i_Duration, const char* i_pHandler, bool i_bEmptyMdiaFirst = false )
   {
     w.Begin( "trak" ).BeginFull( "tkhd", 15 ).Zeros( 8 ).U32( i_Id ).U32( 0 ).U32( i_MovieDuration ).Zeros( 12 );
-    w.U16( i_Volume ).U16( 0 );
-    Matrix( w );
+    w.U16( i_Volume ).U16( 0 ).U32( 0x10000 ).Zeros( 12 ).U32( 0x10000 ).Zeros( 12 ).U32( 0x40000000 ); // matrix
     w.U32( i_Width << 16 ).U32( i_Height << 16 ).End();
     w.Begin( "edts" ).BeginFull( "elst" ).U32( 1 ).U32( i_MovieDuration ).U32( 0 ).U32( 0x10000 ).End().End();
     // The reader must step back out of an mdia without minf and take the next.
@@ -160,8 +154,7 @@ namespace MovTest
     w.PatchU32( MdatStart + ( s.bLargeMdatFirst ? 12 : 0 ), static_cast< std::uint32_t >( w.Size() - MdatStart ) );
 
     w.Begin( "moov" ).BeginFull( "mvhd" ).Zeros( 8 ).U32( 600 ).U32( Duration ).U32( 0x10000 ).U16( 0x100 ).Zeros( 10 );
-    Matrix( w );
-    w.Zeros( 24 ).U32( 4 ).End();
+    w.U32( 0x10000 ).Zeros( 12 ).U32( 0x10000 ).Zeros( 12 ).U32( 0x40000000 ).Zeros( 24 ).U32( 4 ).End();
     BeginTrack( w, 1, Duration, 0, s.Width, s.Height, Timescale, Duration, "vide", s.bTwoMdiaFirstEmpty );
     // The sample description, with its extensions.
     w.Begin( "minf" ).BeginFull( "vmhd", 1 ).Zeros( 8 ).End().Begin( "stbl" ).BeginFull( "stsd" ).U32( 1 );

@@ -143,7 +143,8 @@ TEST( AviTree, OpensAndCountsAsTheRulesSay )
   }
 }
 
-TEST( AviIndex, OldIndexOfHundredAgainstStandardIndexOfNinety )
+// An old index of a hundred frames against a standard index of ninety; entries that lie.
+TEST( AviIndex, EntriesBeyondTheFileFailOnlyTheirFrame )
 {
   VAviSpec Spec = GreySpec( 100 );
   Spec.StandardIndexFrames = 90;
@@ -156,10 +157,7 @@ TEST( AviIndex, OldIndexOfHundredAgainstStandardIndexOfNinety )
   for( std::uint64_t Frame = 90; Frame < 100; ++Frame )
     EXPECT_TRUE( ReadVideo( *Avi.pReader, Frame ).empty() ) << Frame;
   EXPECT_TRUE( Log.Has( "Attempting to read frame beyond end of file." ) );
-}
 
-TEST( AviIndex, DamagedEntriesFailOnlyTheirFrame )
-{
   // Frame 1's audio runs past the file by its idx1 entry: the frame fails only when its audio is
   // asked for. (Damaged video entries in either index are among the flips of AviCorruption.)
   VAviSpec Audible = GreySpec( 3 );
@@ -177,14 +175,14 @@ TEST( AviIndex, DamagedEntriesFailOnlyTheirFrame )
     EXPECT_FALSE( ReadVideo( *Damaged.pReader, i ).empty() ) << "frame " << i;
   }
   // A raw frame one byte too long fails without a word: a player asks for it again and again.
-  VAviSpec Spec = GreySpec( 2 );
+  Spec = GreySpec( 2 );
   Spec.Frames[1] = Frame( 33, 2 );
-  VOpenedAvi Avi = OpenAvi( BuildAvi( Spec ) );
-  ASSERT_TRUE( Avi.bOpened );
-  EXPECT_EQ( ReadVideo( *Avi.pReader, 0 ), Frame( 32, 1 ) );
-  LumekTest::VLogCapture Log;
-  EXPECT_TRUE( ReadVideo( *Avi.pReader, 1 ).empty() );
-  EXPECT_TRUE( Log.Records.empty() );
+  VOpenedAvi Long = OpenAvi( BuildAvi( Spec ) );
+  ASSERT_TRUE( Long.bOpened );
+  EXPECT_EQ( ReadVideo( *Long.pReader, 0 ), Frame( 32, 1 ) );
+  LumekTest::VLogCapture Quiet;
+  EXPECT_TRUE( ReadVideo( *Long.pReader, 1 ).empty() );
+  EXPECT_TRUE( Quiet.Records.empty() );
 }
 
 TEST( AviAudio, ChunksBelongToFramesByPlayTime )
@@ -196,7 +194,7 @@ TEST( AviAudio, ChunksBelongToFramesByPlayTime )
   const std::vector< std::vector< std::uint64_t > > Blocks = { { 1920, 1920 }, { 1920, 1920 }, { 7680 },
                                                                { 3840 },       { 3840 },       {} };
   // A format refused leaves every frame readable without sound. The formats taken are ffmpeg's
-  // (AviFfmpeg.AudioEveryByteOnceInOrder); IEEE float is taken in its extensible form only.
+  // (AviFfmpeg.MatchesFfprobeAndFfmpegDecodeAfterEachSeek); IEEE float is taken in its extensible form only.
   const struct
   {
     const char* Name;
