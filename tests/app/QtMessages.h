@@ -16,8 +16,6 @@ namespace AppTest
   public:
     VQtMessages() : m_Previous( qInstallMessageHandler( &Collect ) ) { s_Messages.clear(); }
     ~VQtMessages() { qInstallMessageHandler( m_Previous ); }
-    VQtMessages( const VQtMessages& ) = delete;
-    VQtMessages& operator=( const VQtMessages& ) = delete;
     std::string Text() const { return s_Messages.join( "\n" ).toStdString(); }
 
   private:

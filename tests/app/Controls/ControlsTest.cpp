@@ -193,35 +193,30 @@ TEST( ProxyStyle, LeavesTheApplicationStyleAlone )
   EXPECT_NE( pApplicationStyle->styleHint( QStyle::SH_Slider_AbsoluteSetButtons ), int( Qt::LeftButton ) );
 }
 
-// Starting from 1.23: what the slider and the text show after typing, and what finishing the
-// edit commits.
-TEST( EditSlider, TypingClampsFollowsAndCommitsOnTheGrid )
+// Typing follows on the slider, clamped, and commits on the grid when the edit is finished; the
+// file's values are shown without being committed, and wait while the user holds the slider; the
+// drag commits on release.
+TEST( EditSlider, TypingShowingAndDragging )
 {
+  // Starting from 1.23: what the slider and the text show after typing, and what is committed.
   const std::tuple< const char*, int, const char*, float > Rows[] = {
       { "abc", 123, "abc", 1.23f }, { "2.5", 250, "2.5", 2.5f }, { "1.234", 123, "1.234", 1.23f },
       { "9", 400, "4", 4.0f },      { "-2", 0, "0", 0.0f },      { "nan", 0, "0", 0.0f },
       { "inf", 400, "4", 4.0f },    { "", 123, "", 1.23f } };
   for( const auto& [Typed, Position, Shown, Committed] : Rows )
   {
-    SCOPED_TRACE( Typed );
     auto pEditor = MakeEditor();
     pEditor->SetText( "1.23" );
     QSignalSpy Changed( pEditor.get(), &VEditSlider::Changed );
     pEditor->GetLineEdit()->setText( Typed );
-    EXPECT_EQ( pEditor->GetSlider()->value(), Position );
+    EXPECT_EQ( pEditor->GetSlider()->value(), Position ) << Typed;
     EXPECT_EQ( pEditor->GetText().toStdString(), Shown );
     EXPECT_EQ( Changed.count(), 0 ) << "typing alone commits nothing";
-
     emit pEditor->GetLineEdit()->editingFinished();
-    ASSERT_EQ( Changed.count(), 1 );
-    EXPECT_FLOAT_EQ( Changed.front().front().toFloat(), Committed );
+    ASSERT_EQ( Changed.count(), 1 ) << Typed;
+    EXPECT_FLOAT_EQ( Changed.front().front().toFloat(), Committed ) << Typed;
   }
-}
 
-// The file's values are shown without being committed, and wait while the user holds the slider;
-// the drag commits on release.
-TEST( EditSlider, ShownValuesWaitForTheHandAndTheDragCommitsOnRelease )
-{
   auto pEditor = MakeEditor();
   pEditor->SetText( "1.00" );
   QSignalSpy Changed( pEditor.get(), &VEditSlider::Changed );

@@ -4,7 +4,6 @@
 
 #include "app/Controls/VClickSpinBox.h"
 #include "app/Controls/VLabelSlider.h"
-#include "app/Controls/VProxyStyle.h"
 #include "app/Style/AppStyle.h"
 #include "services/DPIUtils.h"
 #include "services/Theme/IApplicationStyling.h"
@@ -19,8 +18,6 @@
 #include <QLineEdit>
 #include <QMenuBar>
 #include <QPushButton>
-#include <QQmlComponent>
-#include <QQmlEngine>
 #include <QStandardItemModel>
 #include <QTableView>
 #include <QToolTip>
@@ -124,30 +121,6 @@ TEST( Theme, TheSheetIsScaledOnACopyAndAMissingSheetSetsNone )
   EXPECT_EQ( qApp->styleSheet(), Before );
 }
 
-// The about and legal dialogs read the theme from QML under the record's names, and cannot change it.
-TEST( Theme, QmlSingletonGivesTheValuesReadOnly )
-{
-  QQmlEngine Engine;
-  QQmlComponent Component( &Engine );
-  Component.setData( "import QtQuick 2.0\nimport Lumek.Theme 1.0\n"
-                     "Item {\n"
-                     "  property color window: Theme.Window\n"
-                     "  property int twice: Theme.ItemHeight * 2\n"
-                     "  property string font: Theme.DefaultFont\n"
-                     "  Component.onCompleted: Theme.Margin = 99\n"
-                     "  function margin() { return Theme.Margin }\n"
-                     "}\n",
-                     QUrl() );
-  std::unique_ptr< QObject > pObject( Component.create() );
-  ASSERT_TRUE( pObject ) << Component.errorString().toStdString();
-  EXPECT_EQ( pObject->property( "window" ).value< QColor >(), QColor( "#303030" ) );
-  EXPECT_EQ( pObject->property( "twice" ).toInt(), 40 );
-  EXPECT_EQ( pObject->property( "font" ).toString(), "Segoe UI" );
-  QVariant Margin;
-  QMetaObject::invokeMethod( pObject.get(), "margin", Q_RETURN_ARG( QVariant, Margin ) );
-  EXPECT_EQ( Margin.toInt(), 10 );
-}
-
 // The sheet on the widgets it has rules for, in their states, shown and painted with a menu
 // and a tool tip at three densities: Qt parses every rule without complaint, and the transport
 // buttons and the time bar grow with the density.
@@ -164,18 +137,13 @@ TEST_F( StyleSheet, QtAppliesItWithoutComplaintAtEveryDensity )
     auto* pMenuBar = new QMenuBar;
     QMenu* pMenu = pMenuBar->addMenu( "&Playback" );
     pMenu->addAction( "&Looping" )->setCheckable( true );
-    pMenu->addSeparator();
     pMenu->addAction( "Stop" )->setEnabled( false );
     auto* pTable = new QTableView;
     pTable->setModel( new QStandardItemModel( 40, 2, pTable ) );
-    pTable->setSortingEnabled( true );
     auto* pPartial = new QCheckBox( "Partial" );
     pPartial->setTristate( true );
     pPartial->setCheckState( Qt::PartiallyChecked );
     auto* pSlider = new LumekVideoViewer::VLabelSlider( Qt::Horizontal );
-    auto* pProxy = new LumekVideoViewer::VProxyStyle( pSlider->style() );
-    pProxy->setParent( pSlider );
-    pSlider->setStyle( pProxy );
     auto* pPlay = NamedButton( "Play" );
     // The controls' own rules reach their children.
     auto* pControls = new QGroupBox;
