@@ -15,6 +15,7 @@ using LumekVideoViewer::VPlayBackManager;
 
 namespace
 {
+  // A recording of i_Count frames at i_FramesPerSecond (0: no rate).
   AppTest::VRecordingSpec Spec( std::uint64_t i_Count, double i_FramesPerSecond )
   {
     AppTest::VRecordingSpec Spec;
@@ -23,34 +24,6 @@ namespace
     Spec.FramePeriodInTicks = i_FramesPerSecond > 0 ? AppTest::TicksAt( i_FramesPerSecond ) : 0;
     return Spec;
   }
-
-  // A recording of i_Count frames at i_FramesPerSecond (0: no rate), and a manager whose clock
-  // the test moves, with every signal recorded.
-  struct VClock
-  {
-    VClock( std::uint64_t i_Count, double i_FramesPerSecond )
-        : Recording( Spec( i_Count, i_FramesPerSecond ) ), Manager( &Source, [this] { return Now; } )
-    {
-      EXPECT_TRUE( Source.Open( Recording.Path ) );
-      QObject::connect( &Manager, &VPlayBackManager::FrameUpdated,
-                        [this]( int i_Frame ) { Shown.push_back( i_Frame ); } );
-      QObject::connect( &Manager, &VPlayBackManager::Stopped, [this] { ++Stops; } );
-      QObject::connect( &Manager, &VPlayBackManager::End, [this] { ++Ends; } );
-    }
-    void TickAt( double i_Milliseconds )
-    {
-      Now = i_Milliseconds;
-      Manager.PlayForward();
-    }
-
-    AppTest::VTempRecording Recording;
-    LumekVideoViewer::VVideoSource Source;
-    double Now = 0.0;
-    VPlayBackManager Manager;
-    std::vector< int > Shown;
-    int Stops = 0;
-    int Ends = 0;
-  };
 
   // Ticks as the timer gives them, from i_First to i_Last milliseconds.
   std::vector< double > Steady( double i_First, double i_Last )
@@ -102,21 +75,33 @@ TEST( PlayBackManager, ScriptedClocks )
   for( const auto& rRow : Rows )
   {
     SCOPED_TRACE( rRow.Name );
-    VClock Clock( rRow.Frames, rRow.FramesPerSecond );
-    Clock.Manager.SetDropFrame( rRow.bDropFrames );
+    const AppTest::VTempRecording Recording( Spec( rRow.Frames, rRow.FramesPerSecond ) );
+    LumekVideoViewer::VVideoSource Source;
+    ASSERT_TRUE( Source.Open( Recording.Path ) );
+    double Now = 0.0;
+    VPlayBackManager Manager( &Source, [&Now] { return Now; } );
+    std::vector< int > Shown;
+    int Ends = 0, Stops = 0;
+    QObject::connect( &Manager, &VPlayBackManager::FrameUpdated, [&]( int i_Frame ) { Shown.push_back( i_Frame ); } );
+    QObject::connect( &Manager, &VPlayBackManager::Stopped, [&] { ++Stops; } );
+    QObject::connect( &Manager, &VPlayBackManager::End, [&] { ++Ends; } );
+    Manager.SetDropFrame( rRow.bDropFrames );
     if( !rRow.bLoop )
     {
-      Clock.Manager.Loop( true ); // connected twice now, as at start-up
-      Clock.Manager.Loop( false );
+      Manager.Loop( true ); // connected twice now, as at start-up
+      Manager.Loop( false );
     }
-    Clock.Manager.Start();
+    Manager.Start();
     for( double t : rRow.Ticks )
-      if( Clock.Manager.IsPlaying() )
-        Clock.TickAt( t );
-    EXPECT_EQ( Clock.Shown, rRow.Shown );
-    EXPECT_EQ( std::make_pair( Clock.Ends, Clock.Stops ), std::make_pair( rRow.Ends, rRow.Stops ) );
-    EXPECT_EQ( Clock.Manager.IsPlaying(), rRow.bPlaying );
-    EXPECT_EQ( Clock.Manager.GetCurrentFrame(), rRow.Current );
+      if( Manager.IsPlaying() )
+      {
+        Now = t;
+        Manager.PlayForward();
+      }
+    EXPECT_EQ( Shown, rRow.Shown );
+    EXPECT_EQ( std::make_pair( Ends, Stops ), std::make_pair( rRow.Ends, rRow.Stops ) );
+    EXPECT_EQ( Manager.IsPlaying(), rRow.bPlaying );
+    EXPECT_EQ( Manager.GetCurrentFrame(), rRow.Current );
   }
 }
 
