@@ -165,8 +165,9 @@ namespace
     std::vector< JPEGUtils::VJPEGSegment > Segments;
     EXPECT_TRUE( JPEGUtils::ParseJPEG( Stream, i_rFrame.size(), Segments ) );
     VBytes Frame = { 0xFF, 0xD8 };
+    const VBytes App = { 0xFF, 0xE0, 0x00, 0x10, 'A', 'V', 'I', '1', 0, 0, 0, 0, 0, 0, 0, 0, 0, 0 };
     if( i_bWithAPP0 )
-      Frame.insert( Frame.end(), { 0xFF, 0xE0, 0x00, 0x10, 'A', 'V', 'I', '1', 0, 0, 0, 0, 0, 0, 0, 0, 0, 0 } );
+      Frame.insert( Frame.end(), App.begin(), App.end() );
     for( std::size_t i = 1; i < Segments.size(); ++i )
     {
       if( Segments[i].Marker == 0xC4 || Segments[i].Marker == 0xE0 )
