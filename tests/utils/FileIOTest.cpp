@@ -156,18 +156,16 @@ namespace
       posix_spawn_file_actions_addopen( &Actions, 3, i_rPath.c_str(), i_OpenFlags, 0644 );
       char Program[] = "sleep", Time[] = "60";
       char* Arguments[] = { Program, Time, nullptr };
-      bOk = ::posix_spawnp( &Process, "sleep", &Actions, nullptr, Arguments, environ ) == 0;
+      if( ::posix_spawnp( &Process, "sleep", &Actions, nullptr, Arguments, environ ) != 0 )
+        Process = 0;
       posix_spawn_file_actions_destroy( &Actions );
     }
-    ~VHolder() { Stop(); }
-    void Stop()
+    ~VHolder()
     {
       if( Process > 0 && ::kill( Process, SIGKILL ) == 0 )
         ::waitpid( Process, nullptr, 0 );
-      Process = 0;
     }
     pid_t Process = 0;
-    bool bOk = false;
   };
 
   // Other programs' holders are named, the writer alone as a writer, this process never; more than
@@ -177,8 +175,10 @@ namespace
     const LumekTest::VTemporaryFolder Folder;
     const std::string Path = Folder.File( "recording.lvid" );
     WriteText( Path, "abc" );
-    VHolder Writer( Path, O_WRONLY | O_APPEND ), Reader( Path, O_RDONLY );
-    ASSERT_TRUE( Writer.bOk && Reader.bOk );
+    std::vector< std::unique_ptr< VHolder > > Holders;
+    Holders.push_back( std::make_unique< VHolder >( Path, O_WRONLY | O_APPEND ) );
+    Holders.push_back( std::make_unique< VHolder >( Path, O_RDONLY ) );
+    ASSERT_TRUE( Holders[0]->Process > 0 && Holders[1]->Process > 0 );
     VFileInputStream Own;
     ASSERT_EQ( OpenInputStream( Path, Own ), ZOL::Result_Ok );
 
@@ -188,21 +188,18 @@ namespace
     EXPECT_EQ( boost::filesystem::path( Names[0] ).filename(), "sleep" ) << Names[0];
     ASSERT_TRUE( GetWritingProcesses( Path, Writers ) );
     EXPECT_EQ( Writers,
-               std::vector< std::string >{ Names[0] + " (process " + std::to_string( Writer.Process ) + ")" } );
+               std::vector< std::string >{ Names[0] + " (process " + std::to_string( Holders[0]->Process ) + ")" } );
 
-    std::vector< std::unique_ptr< VHolder > > Others;
     for( int i = 0; i < 9; ++i )
-      Others.push_back( std::make_unique< VHolder >( Path, O_RDONLY ) );
+      Holders.push_back( std::make_unique< VHolder >( Path, O_RDONLY ) );
     Names.clear();
     EXPECT_FALSE( GetLockingProcesses( Path, Names ) );
     EXPECT_TRUE( Names.empty() );
-    Others.pop_back();
+    Holders.pop_back();
     ASSERT_TRUE( GetLockingProcesses( Path, Names ) );
     EXPECT_EQ( Names.size(), 10u );
 
-    Others.clear();
-    Writer.Stop();
-    Reader.Stop();
+    Holders.clear();
     Names.clear();
     ASSERT_TRUE( GetLockingProcesses( Path, Names ) );
     EXPECT_TRUE( Names.empty() );
