@@ -76,7 +76,6 @@ namespace AppTest
     if( i_Spec.bCamera )
     {
       CoreLumekTypes::VCameraHardware Camera;
-      Camera.SerialNumber = "WT-1";
       Camera.SensorWidthInPixels = static_cast< std::uint32_t >( i_Spec.Width );
       Camera.SensorHeightInPixels = static_cast< std::uint32_t >( i_Spec.Height );
       ZOL::WriteCameraHardware( i_Spec.Attributes, Camera );

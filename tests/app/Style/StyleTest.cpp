@@ -87,7 +87,6 @@ TEST( Theme, SubstitutionGivesTheSheetQtReads )
       { "[nothing] QPushButton[flat=\"true\"]", "[nothing] QPushButton[flat=\"true\"]" },
       { "[margin][itemSpacing]px", "104px" },
       { "margin-top: -([itemHeight] - [itemPadding]) / 2;", "margin-top: -8;" },
-      { "width: 5 / 2;", "width: 2.5;" },
       { "width: Math.round([itemHeight] * 0.45);", "width: 9;" },
       // What is not arithmetic is left alone: addresses, syntax errors, infinity, text.
       { "image: url(:/a/b.svg);", "image: url(:/a/b.svg);" },

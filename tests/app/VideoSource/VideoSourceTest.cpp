@@ -71,8 +71,8 @@ TEST_F( VideoSource, AFailedOpenLeavesNoFileAndAnEmptyRecordingOpens )
   EXPECT_TRUE( LumekVideoViewer::ComposePropertyRows( Source ).empty() );
 
   ASSERT_TRUE( Open( Bayer( {} ) ) );
-  EXPECT_EQ( Source.GetFrameCount(), 0u );
-  EXPECT_EQ( Source.GetMissingFrameCount(), 0 );
+  EXPECT_EQ( std::make_pair( Source.GetFrameCount(), Source.GetMissingFrameCount() ),
+             std::make_pair( std::uint64_t( 0 ), 0 ) );
 }
 
 TEST_F( VideoSource, LensDistortionNeedsBothRecords )

@@ -101,10 +101,9 @@ TEST( FrameChoice, WildIndicesAreNotWalked )
 
 TEST( Timebar, TickIntervalGuardsAnEmptyFile )
 {
-  EXPECT_EQ( TimebarTickInterval( 700, 1 ), 700 );
-  EXPECT_EQ( TimebarTickInterval( 700, 100 ), 7 );
-  EXPECT_EQ( TimebarTickInterval( 700, 1000 ), 0 );
-  EXPECT_EQ( TimebarTickInterval( 700, 0 ), 0 );
+  // Pixels per frame: one frame spans the bar, and an empty file gives none instead of a division by 0.
+  for( const auto& [Frames, Interval] : { std::pair( 1, 700 ), { 100, 7 }, { 1000, 0 }, { 0, 0 } } )
+    EXPECT_EQ( TimebarTickInterval( 700, Frames ), Interval ) << Frames;
 }
 
 // The sample layout follows the file; rate and channels too, and the rest stays the device's.

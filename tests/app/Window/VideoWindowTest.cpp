@@ -33,6 +33,7 @@
 
 #include <gtest/gtest.h>
 
+#include <fstream>
 #include <functional>
 #include <memory>
 
@@ -152,16 +153,15 @@ namespace
 
     void ExpectNoFileState() const
     {
-      EXPECT_EQ( m_pWindow->windowTitle(), "Lumek Video Viewer" );
-      EXPECT_EQ( Label( "TimecodeLabel" ), "No file open" );
-      EXPECT_EQ( Label( "VideoLabel" ) + Label( "DecoderLabel" ), "" );
+      EXPECT_EQ( m_pWindow->windowTitle() + " | " + Label( "TimecodeLabel" ) + " | " + Label( "VideoLabel" ) +
+                     Label( "DecoderLabel" ),
+                 "Lumek Video Viewer | No file open | " );
       EXPECT_TRUE( Hidden( "AudioLabel" ) );
       EXPECT_EQ( std::make_pair( Timebar()->maximum(), Timebar()->value() ), std::make_pair( 100, 0 ) );
       EXPECT_FALSE( Timebar()->isEnabled() || SpinBox()->isEnabled() || PlayButton()->isEnabled() ||
                     Action( EAction::Play )->isEnabled() );
-      EXPECT_FALSE( m_pWindow->GetVideoSettingsDialog()->GetRevertButton()->isEnabled() );
+      EXPECT_FALSE( m_pWindow->GetVideoSettingsDialog()->GetRevertButton()->isEnabled() || Playing() );
       EXPECT_EQ( m_pWindow->GetPropertiesDialog()->GetTable()->rowCount(), 0 );
-      EXPECT_FALSE( Playing() );
     }
 
     QTemporaryDir m_Dir;
@@ -263,17 +263,15 @@ TEST_F( VideoWindow, OpenPlayLoopPauseStepSeekStopAndClose )
 TEST_F( VideoWindow, BadFilesGetTheInvalidFileDialogAndDropsOpenTheFirstLocalFile )
 {
   const std::string Good = Recording( "good.lvid" );
-  QFile Bad( m_Dir.filePath( "bad.lvid" ) );
-  ASSERT_TRUE( Bad.open( QIODevice::WriteOnly ) );
-  Bad.write( QByteArray( 5000, '\x5a' ) );
-  Bad.close();
+  const QString Bad = m_Dir.filePath( "bad.lvid" );
+  std::ofstream( Bad.toStdString() ) << std::string( 5000, 'Z' );
   ASSERT_TRUE( Open( Good ) );
 
   QString Shown;
   VDialogCloser Closer(
       [&]( QDialog* i_pDialog )
       { Shown = i_pDialog->windowTitle() + ": " + qobject_cast< QMessageBox* >( i_pDialog )->text(); } );
-  EXPECT_FALSE( m_pWindow->OpenFile( Bad.fileName() ) );
+  EXPECT_FALSE( m_pWindow->OpenFile( Bad ) );
   EXPECT_EQ( Closer.Count, 1 );
   EXPECT_EQ( Shown, "Invalid file: The video file could not be opened." );
   ExpectNoFileState();
@@ -446,8 +444,7 @@ TEST_F( VideoWindow, TheHelpMenuAnswersEveryEntry )
   QDesktopServices::setUrlHandler( "https", &Catcher, "Open" );
   Action( EAction::ViewHelp )->trigger();
   QDesktopServices::unsetUrlHandler( "https" );
-  ASSERT_EQ( Catcher.Urls.size(), 1 );
-  EXPECT_EQ( Catcher.Urls.front().path(), "/display/LVV110/" );
+  EXPECT_EQ( Catcher.Urls.size() == 1 ? Catcher.Urls.front().path() : "", "/display/LVV110/" );
 
   QString VersionLine, UpdateText, Title, Errors;
   QQuickWidget::Status Status = QQuickWidget::Null;
