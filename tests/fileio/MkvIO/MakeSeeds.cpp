@@ -24,16 +24,11 @@ int main( int i_ArgumentCount, char** i_ppArguments )
   bGood = bGood && MkvTest::WriteFamilyFile( Folder + "/odd_clusters.mkv", Case, {}, {},
                                              []( int i_Frame )
                                              {
-                                               std::vector< MkvIO::VMkvBlock > Blocks( 4 );
-                                               Blocks[0].Track = 3;
-                                               Blocks[0].Bytes = { 1, 2 };
-                                               Blocks[1].bWithBlock = i_Frame != 0;
-                                               Blocks[1].Bytes = MkvTest::VBytes( 8, 7 );
-                                               Blocks[2].Track = 2;
-                                               Blocks[2].Bytes = MkvTest::VBytes( 8, 1 );
-                                               Blocks[3].Track = 2;
-                                               Blocks[3].Bytes = MkvTest::VBytes( 16, 2 );
-                                               return Blocks;
+                                               return std::vector< MkvIO::VMkvBlock >{
+                                                   { 3, { 1, 2 } },
+                                                   { 1, MkvTest::VBytes( 8, 7 ), i_Frame != 0 },
+                                                   { 2, MkvTest::VBytes( 8, 1 ) },
+                                                   { 2, MkvTest::VBytes( 16, 2 ) } };
                                              } );
   return bGood ? 0 : 1;
 }
