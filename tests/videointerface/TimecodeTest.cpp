@@ -14,11 +14,6 @@ namespace
     return { i_Standard, std::uint8_t( i_H ), std::uint8_t( i_M ), std::uint8_t( i_S ), std::uint8_t( i_F ), 0,
              0,          i_Remainder,         i_SubFramePeriod };
   }
-
-  std::string Text( const ITimecode& i_rTimecode )
-  {
-    return i_rTimecode.ToText( 0, false, false );
-  }
 } // namespace
 
 // Labels at the carries, where counting goes wrong first, by hand: drop frame skips labels 0 and 1
@@ -51,7 +46,7 @@ TEST( TimecodeTicks, LabelsAtTheCarriesAndBackAgain )
     ITimecode Timecode = Label( rCase.Standard, 0, 0, 0, 0 );
     const std::int64_t Ticks = rCase.Frame * static_cast< std::int64_t >( Timecode.GetTicksPerFrame() ) + 7;
     ASSERT_TRUE( Timecode.SetFromTicks( Ticks ) );
-    EXPECT_EQ( rCase.Text, Text( Timecode ) );
+    EXPECT_EQ( rCase.Text, Timecode.ToText( 0, false, false ) );
     EXPECT_EQ( rCase.Days, Timecode.Days );
     EXPECT_EQ( 7u, Timecode.TickRemainder );
     Timecode.AddTicks( -Ticks );
@@ -67,28 +62,7 @@ TEST( TimecodeTicks, LabelsAtTheCarriesAndBackAgain )
   EXPECT_EQ( "", Unknown.ToText( 4, true, true ) );
 }
 
-TEST( TimecodeValid, RangesAndDroppedLabels )
-{
-  const struct
-  {
-    const char* Name;
-    ITimecode Timecode;
-    bool Valid;
-  } Cases[] = { { "dropped label 0 at minute 1", Label( 5, 0, 1, 0, 0 ), false },
-                { "the tenth minute keeps label 0", Label( 5, 0, 10, 0, 0 ), true },
-                { "non-drop keeps label 0", Label( 4, 0, 1, 0, 0 ), true },
-                { "frame 24 at film", Label( 0, 0, 0, 0, 24 ), false },
-                { "hour 24", Label( 3, 24, 0, 0, 0 ), false },
-                { "minute 60", Label( 3, 0, 60, 0, 0 ), false },
-                { "second 60", Label( 3, 0, 0, 60, 0 ), false },
-                { "remainder of a whole frame", Label( 3, 0, 0, 0, 0, 4500000 ), false },
-                { "last tick", Label( 1, 23, 59, 59, 23, 5630624 ), true },
-                { "standard 6", Label( 6, 0, 0, 0, 0 ), false } };
-  for( const auto& rCase : Cases )
-    EXPECT_EQ( rCase.Valid, rCase.Timecode.IsValid() ) << rCase.Name;
-}
-
-TEST( TimecodeText, Golden )
+TEST( TimecodeText, GoldenAndNoneOutOfRange )
 {
   const struct
   {
@@ -112,7 +86,17 @@ TEST( TimecodeText, Golden )
                 { Label( 3, 0, 0, 0, 0, 4499999 ), 4, false, false, "00:00:00:00+99" }, // truncated
                 { Label( 3, 0, 0, 0, 0, 1125007, 1125000 ), 5, false, false, "00:00:00:00 (1)r7" },
                 { Label( 3, 0, 0, 0, 0, 2250000 ), 9, true, false, "00:00:00:00 [30 fps]" }, // unknown style
-                { Label( 5, 0, 1, 0, 0 ), 4, true, false, "" } };                            // invalid
+                { Label( 1, 23, 59, 59, 23, 5630624 ), 0, false, false, "23:59:59:23" },     // the last tick
+                { Label( 4, 0, 1, 0, 0 ), 0, false, false, "00:01:00:00" },                  // not drop frame
+                // Labels out of range have no text: a dropped label, frame 24 at film, hour 24, minute
+                // 60, second 60, a remainder of a whole frame, standard 6.
+                { Label( 5, 0, 1, 0, 0 ), 4, true, false, "" },
+                { Label( 0, 0, 0, 0, 24 ), 0, false, false, "" },
+                { Label( 3, 24, 0, 0, 0 ), 0, false, false, "" },
+                { Label( 3, 0, 60, 0, 0 ), 0, false, false, "" },
+                { Label( 3, 0, 0, 60, 0 ), 0, false, false, "" },
+                { Label( 3, 0, 0, 0, 0, 4500000 ), 0, false, false, "" },
+                { Label( 6, 0, 0, 0, 0 ), 0, false, false, "" } };
   for( const auto& rCase : Cases )
     EXPECT_EQ( rCase.Text, rCase.Timecode.ToText( rCase.Style, rCase.bWithStandard, rCase.bSubFrameMark ) )
         << rCase.Text;
