@@ -446,7 +446,7 @@ TEST_F( VideoWindow, TheHelpMenuAnswersEveryEntry )
   QDesktopServices::unsetUrlHandler( "https" );
   EXPECT_EQ( Catcher.Urls.size() == 1 ? Catcher.Urls.front().path() : "", "/display/LVV110/" );
 
-  QString VersionLine, UpdateText, Title, Errors;
+  QString VersionLine, UpdateText, Title;
   QQuickWidget::Status Status = QQuickWidget::Null;
   VDialogCloser Closer(
       [&]( QDialog* i_pDialog )
@@ -459,8 +459,6 @@ TEST_F( VideoWindow, TheHelpMenuAnswersEveryEntry )
         {
           QQuickWidget* pPage = pLegal->GetQuickWidget();
           Status = pPage->status();
-          for( const QQmlError& rError : pPage->errors() )
-            Errors += rError.toString() + "\n";
           if( QObject* pTitle = pPage->rootObject()->findChild< QObject* >( "ComponentTitle" ) )
             Title = pTitle->property( "text" ).toString();
         }
@@ -472,7 +470,7 @@ TEST_F( VideoWindow, TheHelpMenuAnswersEveryEntry )
   EXPECT_TRUE( UpdateText.contains( "Unable to contact version check server." ) ) << UpdateText.toStdString();
   Action( EAction::Licenses )->trigger();
   EXPECT_EQ( Closer.Count, 3 );
-  EXPECT_EQ( Status, QQuickWidget::Ready ) << Errors.toStdString();
+  EXPECT_EQ( Status, QQuickWidget::Ready );
   EXPECT_TRUE( Title.startsWith( "Qt 5" ) ) << Title.toStdString();
 
   // Every one of these licences names its holder and disclaims warranty; a text without it is cut.
