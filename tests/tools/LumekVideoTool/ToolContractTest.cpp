@@ -66,9 +66,7 @@ namespace
   {
     const VScratch Scratch;
     const std::string Clip = WriteRecording( Scratch, "clip.lvid", {} );
-    VRecordingSpec NoFrames;
-    NoFrames.Frames.clear();
-    const std::string Empty = WriteRecording( Scratch, "empty.lvid", NoFrames );
+    const std::string Empty = WriteRecording( Scratch, "empty.lvid", { ZOL::PixelFormat_R8G8B8, 6, 4, {} } );
     WriteFileBytes( Scratch.Path( "zero.lvid" ), {} );
     const std::string Absent = Scratch.Path( "absent.lvid" );
     const std::string Unopenable = "The video file could not be opened.\n";
@@ -138,10 +136,7 @@ namespace
     {
       const std::string Name = ZOL::ToString( Format );
       SCOPED_TRACE( Name );
-      VRecordingSpec Spec;
-      Spec.Format = Format;
-      Spec.Frames = { 0, 1, 4 };
-      Spec.bAudio = true;
+      VRecordingSpec Spec{ Format, 6, 4, { 0, 1, 4 }, true };
       Spec.Settings.GammaCorrection = 1.5f;
       const std::string Input = WriteRecording( Scratch, Name + ".lvid", Spec );
       const std::string Output = Scratch.Path( Name + "-converted.lvid" );
@@ -219,9 +214,8 @@ namespace
   TEST( ToolFrames, GapsAndUnreadableFramesAreReportedAndTheRestWritten )
   {
     VScratch Scratch;
-    VRecordingSpec Spec;
-    Spec.Frames = { 0, 1, 3, std::uint64_t( 1 ) << 42 };
-    const std::string Path = WriteRecording( Scratch, "huge.lvid", Spec );
+    const std::string Path = WriteRecording( Scratch, "huge.lvid",
+                                             { ZOL::PixelFormat_R8G8B8, 6, 4, { 0, 1, 3, std::uint64_t( 1 ) << 42 } } );
     const VRun Frames = RunInProcess( { "frames", Path, Scratch.Path( "out" ) } );
     EXPECT_EQ( Frames.ExitCode, 3 );
     EXPECT_NE( Frames.Err.find( "Frame 2 is missing.\nFrames 4 to 4398046511103 are missing." ), std::string::npos )
@@ -339,10 +333,7 @@ namespace
     const VBytes Before = ReadFileBytes( Output );
     ASSERT_FALSE( Before.empty() );
     // Large enough that the conversion is still writing when the test looks.
-    VRecordingSpec Large;
-    Large.Width = 1280;
-    Large.Height = 720;
-    Large.Frames.resize( 60 );
+    VRecordingSpec Large{ ZOL::PixelFormat_R8G8B8, 1280, 720, std::vector< std::uint64_t >( 60 ) };
     std::iota( Large.Frames.begin(), Large.Frames.end(), 0 );
     const std::string LargeInput = WriteRecording( Scratch, "large.lvid", Large );
 
