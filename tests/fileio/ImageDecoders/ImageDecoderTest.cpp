@@ -116,7 +116,7 @@ namespace
     ASSERT_GT( Whole.size(), 100u );
     for( std::size_t Cut = 0; Cut < Whole.size(); ++Cut )
     {
-      const VParse Result = Parse( VBytes( Whole.begin(), Whole.begin() + static_cast< std::ptrdiff_t >( Cut ) ) );
+      const VParse Result = Parse( Damaged( Whole, Cut, 0 ) );
       EXPECT_FALSE( Result.bResult ) << "cut at " << Cut;
       EXPECT_EQ( Result.Log.size(), 1u ) << "cut at " << Cut;
     }
@@ -243,7 +243,7 @@ namespace
       {
         VLogCapture Log( "JPEGIO" );
         std::shared_ptr< IBuffer > pOutput;
-        EXPECT_FALSE( Read( VBytes( Whole.begin(), Whole.begin() + Cut ), Wish, pOutput ) ) << "cut at " << Cut;
+        EXPECT_FALSE( Read( Damaged( Whole, Cut, 0 ), Wish, pOutput ) ) << "cut at " << Cut;
         EXPECT_FALSE( pOutput ) << "cut at " << Cut;
         ASSERT_EQ( Log.Lines().size(), 1u ) << "cut at " << Cut;
         const std::string Line = Log.Lines()[0];
