@@ -6,10 +6,7 @@
 
 #include <boost/filesystem.hpp>
 
-#include <cstdint>
 #include <fstream>
-#include <string>
-#include <vector>
 
 namespace LumekTest
 {

@@ -191,9 +191,6 @@ TEST( FrameInfo, ConversionDistortionFlagFollowsTheHistory )
     ASSERT_TRUE( ReadVideoFrameInfo( Keys, Outer, Info ) );
     EXPECT_EQ( rCase.Flag, Info.HasConversionDistortion() );
   }
-  IVideoFrameInfo Single; // no history at all
-  ASSERT_TRUE( ReadVideoFrameInfo( Keys, Keys, Single ) );
-  EXPECT_FALSE( Single.HasConversionDistortion() );
 }
 
 // Audio, lens, history.
