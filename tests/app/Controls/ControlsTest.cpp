@@ -103,7 +103,6 @@ TEST( LabelSlider, PaintsMarksWhereTheFramesAre )
     const auto Steps = ComputeTickSteps( double( Maximum ) / Groove.width() );
     const float Travel = float( Groove.width() - Handle.width() );
     auto PositionOf = [&]( int i_Frame ) { return i_Frame * Travel / Maximum + float( Handle.width() / 2 ); };
-    int Checked = 0;
     for( int Frame = 0; Frame <= Maximum; Frame += Steps.Minor )
     {
       const float X = PositionOf( Frame ), Next = PositionOf( Frame + Steps.Minor );
@@ -116,33 +115,26 @@ TEST( LabelSlider, PaintsMarksWhereTheFramesAre )
       {
         EXPECT_FALSE( InkAt( ( X + Next ) / 2.0f, MiddleRow ) ) << "after frame " << Frame;
       }
-      ++Checked;
     }
-    EXPECT_GT( Checked, 0 );
   }
 }
 
 // The time bar and the frame box as the window builds them, with and without the sheet. The
 // window moves both while playing: only the user's clicks may reach the seek. With the proxy, a
-// click on the groove jumps there; the plain style pages. The bar declines the wheel, so that Qt
+// click on the groove jumps there rather than a page. The bar declines the wheel, so that Qt
 // hands a turn over it on to the window, which steps the frames.
 TEST( Controls, WindowMovesAreSilentAndClicksAreHeard )
 {
-  const std::tuple< bool, bool, int, QStyle::SubControl, int > Rows[] = {
-      { false, true, 75, QStyle::SC_SpinBoxUp, 51 },
-      { true, true, 75, QStyle::SC_SpinBoxDown, 49 },
-      { false, false, 40, QStyle::SC_SpinBoxUp, 51 } };
-  for( const auto& [bStyleSheet, bProxy, Jumped, Arrow, Stepped] : Rows )
+  const std::tuple< bool, QStyle::SubControl, int > Rows[] = { { false, QStyle::SC_SpinBoxUp, 51 },
+                                                               { true, QStyle::SC_SpinBoxDown, 49 } };
+  for( const auto& [bStyleSheet, Arrow, Stepped] : Rows )
   {
-    SCOPED_TRACE( testing::Message() << "sheet " << bStyleSheet << ", proxy " << bProxy );
+    SCOPED_TRACE( bStyleSheet ? "under the sheet" : "plain style" );
     ASSERT_TRUE( !bStyleSheet || ApplyStyleSheet() );
     VLabelSlider Slider( Qt::Horizontal );
-    if( bProxy )
-    {
-      auto* pStyle = new VProxyStyle( Slider.style() );
-      pStyle->setParent( &Slider );
-      Slider.setStyle( pStyle );
-    }
+    auto* pStyle = new VProxyStyle( Slider.style() );
+    pStyle->setParent( &Slider );
+    Slider.setStyle( pStyle );
     Slider.setTracking( false );
     Slider.setPageStep( 10 );
     Slider.setRange( 0, 100 );
@@ -157,14 +149,13 @@ TEST( Controls, WindowMovesAreSilentAndClicksAreHeard )
     QSignalSpy BoxChanged( &Box, qOverload< int >( &QSpinBox::valueChanged ) );
     Slider.setValue( 30 );
     Box.setValue( 50 );
-    EXPECT_EQ( Box.text(), "50" );
     EXPECT_EQ( SliderChanged.count() + BoxChanged.count(), 0 ) << "the window's moves";
 
     const QRect Groove = Slider.GrooveRect();
     const int Handle = Slider.HandleRect().width();
     const int X = Groove.x() + Handle / 2 + ( Groove.width() - Handle ) * 3 / 4;
     QTest::mouseClick( &Slider, Qt::LeftButton, Qt::NoModifier, QPoint( X, Groove.center().y() ) );
-    EXPECT_NEAR( Slider.value(), Jumped, 1 );
+    EXPECT_NEAR( Slider.value(), 75, 1 );
     EXPECT_EQ( SliderChanged.count(), 1 );
     QWheelEvent Wheel( QPointF( X, 5 ), QPointF( X, 5 ), QPoint(), QPoint( 0, 120 ), Qt::NoButton, Qt::NoModifier,
                        Qt::NoScrollPhase, false );

@@ -380,7 +380,6 @@ TEST_F( VideoWindow, FullScreenScaleModesKeysAndARestart )
   SendMouse( pSurface, QEvent::MouseMove, { 140, 110 }, Qt::LeftButton );
   SendMouse( pSurface, QEvent::MouseButtonRelease, { 140, 110 }, Qt::NoButton );
   ExpectMode( EAction::ScaleFreely, ScaleFreely );
-  EXPECT_FALSE( Checked( EAction::ScaleToWindow ) );
   for( Qt::WindowType Hint : { Qt::WindowMaximizeButtonHint, Qt::WindowCloseButtonHint, Qt::WindowMinimizeButtonHint } )
     EXPECT_TRUE( m_pWindow->windowFlags().testFlag( Hint ) ) << Hint;
 
