@@ -27,7 +27,6 @@ TEST( Log, FormatsOnlyWhatTheLevelLetsThroughEachValueByItsOwnType )
   LumekTest::VLogCapture Capture( "", ZOL::LogInfo );
   LUMEK_LOG( "MovIO", ZOL::LogInfoDetail, "%s", VCountingValue{ 1 } );
   EXPECT_EQ( 0, s_Formatted );
-  EXPECT_TRUE( Capture.Records.empty() );
   const int Line = __LINE__ + 1;
   LUMEK_LOG( "MovIO", ZOL::LogInfo, "%s|%s|%s|%d|%s", VCountingValue{ 2 }, 42, 2.5, std::string( "text" ),
              std::uint64_t( 1 ) << 40 );

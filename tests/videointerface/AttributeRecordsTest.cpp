@@ -139,7 +139,6 @@ TEST( AttributeRecords, EachRequiredKeyFailsItsOwnRecordAlone )
   }
 }
 
-// Frame description.
 TEST( FrameInfo, NoVideoWritesOnlyPresentFalseAndUnusableDescriptionsNothing )
 {
   IVideoAttributes Store;
@@ -193,7 +192,6 @@ TEST( FrameInfo, ConversionDistortionFlagFollowsTheHistory )
   }
 }
 
-// Audio, lens, history.
 // No audio is an answer (a history's empty records read so); zero channels and unknown formats are not.
 TEST( AudioFrameInfo, ZeroChannelsAndUnknownFormatsAreNoAudio )
 {

@@ -145,8 +145,7 @@ TEST( AttributeSerialForm, ReaderTakesWhatTheWriterNeverMakes )
   EXPECT_TRUE( Store == Expected );
 
   ASSERT_TRUE( ReadBytes( Store, VBytes().U32( 1 ).Text( "b" ).U32( 0 ).Raw( { 0x7F } ).Data, true ) );
-  bool bValue = false;
-  EXPECT_TRUE( Store.Get( "b", bValue ) && bValue );
+  EXPECT_TRUE( Store == One( "b", true ) );
   EXPECT_EQ( 0x01, Serialise( Store ).back() );
 }
 

@@ -117,7 +117,6 @@ TEST( Recycler, ManyThreadsNeverShareAnObject )
   EXPECT_EQ( 0, VCounted::s_Live );
 }
 
-// Allocators over the recycler.
 // N is 1, so the buffer released is the next one acquired on this thread: it keeps its capacity
 // and its old bytes. Buffers hold their allocator, so it outlives the reader that made it, and one
 // not owned by a shared pointer cannot hand any out.

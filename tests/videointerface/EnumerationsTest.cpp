@@ -60,7 +60,6 @@ TEST( Enumerations, ResultTexts )
     EXPECT_EQ( pText, GetResultText( Code ) ) << std::hex << Code;
 }
 
-// What the enumerations drive: frame sizes and the container chosen by a file name.
 TEST( Enumerations, BytesOfAnUncompressedFrame )
 {
   const struct
