@@ -1,15 +1,13 @@
 #pragma once
 
-// Shared by the MOV and AVI readers' and tool tests: ffmpeg's own view of a file, the two stores
-// of a recording's description that either container carries in a QMDT part, and the tool's
-// conversion of a file to a recording.
+// Shared by the MOV and AVI readers' tests: ffmpeg's own view of a file, the two stores of a
+// recording's description that either container carries in a QMDT part, and damaged files.
 
 #include "tests/support/FfmpegFixtures.h"
 #include "tests/support/LogCapture.h"
 #include "utils/MemoryStream.h"
 #include "videointerface/AttributeRecords.h"
 
-#include <cstdio>
 #include <fstream>
 #include <functional>
 #include <gtest/gtest.h>
@@ -101,32 +99,4 @@ namespace ContainerTest
       }
     }
   }
-
-#ifdef LUMEK_TOOL_PATH
-  // The tool's output, which must end with exit code 0.
-  inline std::string Tool( const std::string& i_rArguments )
-  {
-    int ExitCode = -1;
-    const std::string Out = LumekTest::RunCommand( LUMEK_TOOL_PATH " " + i_rArguments + " 2>&1", &ExitCode );
-    EXPECT_EQ( ExitCode, 0 ) << Out;
-    return Out;
-  }
-
-  // Converts the file to a recording beside it, then checks that the tool draws the same pictures
-  // from both and that i_Fact finds the same in both files' reports on each frame.
-  inline void ExpectConvertedAlike( const std::string& i_rPath, int i_Frames,
-                                    const std::function< std::string( const std::string& ) >& i_Fact )
-  {
-    const std::string Output = i_rPath + ".lvid";
-    std::remove( Output.c_str() );
-    Tool( "convert " + LumekTest::ShellQuote( i_rPath ) + " " + LumekTest::ShellQuote( Output ) );
-    for( int f = 0; f < i_Frames; ++f )
-    {
-      const auto Report = [&]( const std::string& i_rFile )
-      { return Tool( "info " + LumekTest::ShellQuote( i_rFile ) + " --compact --frame " + std::to_string( f ) ); };
-      EXPECT_EQ( i_Fact( Report( Output ) ), i_Fact( Report( i_rPath ) ) ) << "frame " << f;
-    }
-    LumekTest::ExpectSameToolFrames( LUMEK_TOOL_PATH, i_rPath, Output, i_Frames );
-  }
-#endif
 } // namespace ContainerTest

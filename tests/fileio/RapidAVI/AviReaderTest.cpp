@@ -1,5 +1,5 @@
-// Hand-built RIFF trees: each case of the chunk rules, the guards against damaged fields, the
-// audio each frame owns, timing, the dump; damaged files, hand-built and ffmpeg's, cut short and
+// Hand-built RIFF trees: each case of the chunk rules and timing, the dump, the guards against
+// damaged fields, the audio each frame owns; damaged files, hand-built and ffmpeg's, cut short and
 // with bytes flipped at many places; and files written by ffmpeg, compared with ffprobe's
 // figures and ffmpeg's own decode.
 
@@ -100,9 +100,105 @@ namespace
       { "MainHeaderOnly", []( VAviSpec& s ) { Timing( s, 0, 25, 33367 ); }, 3, "", 4504654 },
       { "NoPeriodAnywhere", []( VAviSpec& s ) { Timing( s, 0, 25, 0 ); }, 3, "", 0 },
   };
+
+  void ReadEverything( const VBytes& i_rFile )
+  {
+    VOpenedAvi Avi = OpenAvi( i_rFile );
+    std::ostringstream Dump;
+    (void)Avi.pReader->DumpFileStructure( Dump );
+    // A damaged count can promise many frames; a few past the start and the end show enough.
+    const std::uint64_t Count = Avi.pReader->GetFrameCount();
+    for( std::uint64_t i = 0; i < Count && i < 8; ++i )
+    {
+      ZOL::IVideoFrame Frame;
+      (void)Avi.pReader->ReadFrame( i, Frame, true, true );
+      (void)Avi.pReader->ReadFrame( Count - 1 - i, Frame, true, true );
+    }
+  }
+
+  // Both index kinds, audio, an AVIX part and a pad byte; or ffmpeg's files.
+  VBytes CorruptionFile( const std::string& i_rName )
+  {
+    if( i_rName == "FfmpegMjpegWithAudio" )
+      return ContainerTest::ReadFile( FfmpegAvi(
+          "CorruptMjpeg.avi", "-f lavfi -i sine=sample_rate=8000 -c:v mjpeg -c:a pcm_s16le -shortest -frames:v 3" ) );
+    if( i_rName == "FfmpegH264" )
+      return ContainerTest::ReadFile( FfmpegAvi( "CorruptH264.avi", "-c:v libx264 -bf 0 -frames:v 3" ) );
+    VAviSpec Spec = GreySpec( 6 );
+    Spec.StandardIndexFrames = 4;
+    Spec.AudioFormat = WaveFormat( 1, 2, 48000, 16 );
+    Spec.AudioChunks.assign( 6, Frame( 7680, 0x55 ) );
+    Spec.ExtendedFrames = { Frame( 32, 50 ) };
+    Spec.ExtraMoviChunks = Chunk( "JUNK", VBytes( 3 ) );
+    return BuildAvi( Spec );
+  }
+
+  class AviCorruption : public ::testing::TestWithParam< std::string >
+  {
+  };
+
+  constexpr int Width = 64;
+  constexpr int Height = 48;
+  constexpr std::uint64_t Frames = 5;
+
+  std::shared_ptr< RapidAVI::VRapidAVIReader > OpenFile( const std::string& i_rPath )
+  {
+    auto pReader = std::dynamic_pointer_cast< RapidAVI::VRapidAVIReader >( CreateVideoReader( i_rPath ) );
+    return pReader && pReader->Open( i_rPath ) ? pReader : nullptr;
+  }
+
+  struct VFfmpegCase
+  {
+    const char* Name;
+    const char* Encode;
+    ZOL::EVideoPayload Payload;
+    ZOL::EPixelFormat StoredFormat;
+    // ffmpeg's decode to compare with, in the pixel format the reader gives.
+    const char* DecodedFormat;
+    std::size_t BytesPerPixel;
+    bool bInverted;
+    // Raw frames are compared as stored; the others after decoding, within a mean difference.
+    double Tolerance;
+    // The audio stream's codec and channels; the format the reader gives.
+    const char* Audio;
+    ZOL::EAudioSampleFormat SampleFormat;
+  };
+
+  // Luma is exact between two H.264 decoders; the chroma upsampling may differ slightly. Float
+  // and samples of more than 16 bits come in the extensible form of the audio header.
+  const VFfmpegCase s_Cases[] = {
+      { "Bgr24BottomUp", "-c:v rawvideo -pix_fmt bgr24 -flipped_raw_rgb 1", ZOL::VideoPayload_Uncompressed,
+        ZOL::PixelFormat_B8G8R8, "bgr24", 3, true, 0.0, "-c:a pcm_s24le -ac 2", ZOL::AudioSampleFormat_Int24 },
+      { "Uyvy422", "-c:v rawvideo -pix_fmt uyvy422", ZOL::VideoPayload_Uncompressed, ZOL::PixelFormat_U8Y8V8Y8,
+        "uyvy422", 2, false, 0.0, "-c:a pcm_u8 -ac 1", ZOL::AudioSampleFormat_UInt8 },
+      { "H264", "-c:v libx264 -bf 0 -g 3 -pix_fmt yuv420p", ZOL::VideoPayload_VideoH264, ZOL::PixelFormat_U8Y8V8Y8,
+        "uyvy422", 2, false, 2.5, "-c:a pcm_f32le -ac 2", ZOL::AudioSampleFormat_Float32 },
+  };
+
+  // An ffmpeg frame made into the AVI1 form: its JFIF APP0 and DHT segments left out, an AVI1
+  // APP0 in second place. i_bWithAPP0 false leaves out the APP0 as well.
+  VBytes ToAVI1( const VBytes& i_rFrame, bool i_bWithAPP0 )
+  {
+    UtilsIO::VMemoryInputStream Stream( i_rFrame.data(), i_rFrame.size() );
+    std::vector< JPEGUtils::VJPEGSegment > Segments;
+    EXPECT_TRUE( JPEGUtils::ParseJPEG( Stream, i_rFrame.size(), Segments ) );
+    VBytes Frame = { 0xFF, 0xD8 };
+    const VBytes App = { 0xFF, 0xE0, 0x00, 0x10, 'A', 'V', 'I', '1', 0, 0, 0, 0, 0, 0, 0, 0, 0, 0 };
+    if( i_bWithAPP0 )
+      Frame.insert( Frame.end(), App.begin(), App.end() );
+    for( std::size_t i = 1; i < Segments.size(); ++i )
+    {
+      if( Segments[i].Marker == 0xC4 || Segments[i].Marker == 0xE0 )
+        continue;
+      const std::uint64_t End = i + 1 < Segments.size() ? Segments[i + 1].Start : i_rFrame.size();
+      Frame.insert( Frame.end(), i_rFrame.begin() + static_cast< std::ptrdiff_t >( Segments[i].Start ),
+                    i_rFrame.begin() + static_cast< std::ptrdiff_t >( End ) );
+    }
+    return Frame;
+  }
 } // namespace
 
-TEST( AviTree, OpensAndCountsAsTheRulesSay )
+TEST( AviTree, OpensCountsAndDumpsAsTheRulesSay )
 {
   for( const VTreeCase& rCase : s_TreeCases )
   {
@@ -130,6 +226,14 @@ TEST( AviTree, OpensAndCountsAsTheRulesSay )
   EXPECT_TRUE( Garbage.bOpened );
   EXPECT_EQ( Garbage.pReader->GetFrameCount(), 0u );
   EXPECT_TRUE( Log.Has( "Unknown chunk 'ZZZZ' ignored." ) );
+
+  // The chunk tree as the dump prints it, the pad byte of an odd chunk and all.
+  VAviSpec Odd = GreySpec( 1 );
+  Odd.ExtraMoviChunks = Chunk( "JUNK", VBytes( 3, 0 ) );
+  std::ostringstream Text;
+  ASSERT_TRUE( OpenAvi( BuildAvi( Odd ) ).pReader->DumpFileStructure( Text ) );
+  const VBytes Golden = ContainerTest::ReadFile( AVI_GOLDEN_FOLDER "/dump-odd-junk.txt" );
+  EXPECT_EQ( Text.str(), std::string( Golden.begin(), Golden.end() ) );
 
   // Bitmaps of positive height are stored bottom row first, whichever name they go by; the
   // other formats never are.
@@ -194,7 +298,6 @@ TEST( AviAudio, ChunksBelongToFramesByPlayTime )
 {
   // Half-frame chunks, two a frame; then a chunk of two frames, after which each chunk starts a
   // frame one frame early, and the last frame is left without audio.
-  const std::vector< std::size_t > ChunkBytes = { 1920, 1920, 1920, 1920, 7680, 3840, 3840 };
   const std::vector< std::uint64_t > ChunkOfFrame = { 0, 2, 4, 5, 6 };
   const std::vector< std::vector< std::uint64_t > > Blocks = { { 1920, 1920 }, { 1920, 1920 }, { 7680 },
                                                                { 3840 },       { 3840 },       {} };
@@ -215,7 +318,7 @@ TEST( AviAudio, ChunksBelongToFramesByPlayTime )
     SCOPED_TRACE( rFormat.Name );
     VAviSpec Spec = GreySpec( 6 );
     Spec.AudioFormat = rFormat.Format;
-    for( std::size_t Bytes : ChunkBytes )
+    for( std::size_t Bytes : { 1920, 1920, 1920, 1920, 7680, 3840, 3840 } )
       Spec.AudioChunks.push_back( Frame( Bytes, 0x80 ) );
     LumekTest::VLogCapture Log;
     VOpenedAvi Avi = OpenAvi( BuildAvi( Spec ) );
@@ -233,18 +336,6 @@ TEST( AviAudio, ChunksBelongToFramesByPlayTime )
       EXPECT_EQ( Sizes, bTaken ? Blocks[i] : std::vector< std::uint64_t >() ) << "frame " << i;
     }
   }
-}
-
-TEST( AviDump, PrintsTheChunkTree )
-{
-  VAviSpec Spec = GreySpec( 1 );
-  Spec.ExtraMoviChunks = Chunk( "JUNK", VBytes( 3, 0 ) );
-  VOpenedAvi Avi = OpenAvi( BuildAvi( Spec ) );
-  ASSERT_TRUE( Avi.bOpened );
-  std::ostringstream Text;
-  ASSERT_TRUE( Avi.pReader->DumpFileStructure( Text ) );
-  const VBytes Golden = ContainerTest::ReadFile( AVI_GOLDEN_FOLDER "/dump-odd-junk.txt" );
-  EXPECT_EQ( Text.str(), std::string( Golden.begin(), Golden.end() ) );
 }
 
 // A QMDT part describes what strf cannot, Bayer formats among them, and replaces it whole.
@@ -267,45 +358,6 @@ TEST( AviMetadata, BayerDescriptionFromTheStores )
     EXPECT_EQ( ReadVideo( *Avi.pReader, i ), Spec.Frames[i] );
 }
 
-namespace
-{
-  void ReadEverything( const VBytes& i_rFile )
-  {
-    VOpenedAvi Avi = OpenAvi( i_rFile );
-    std::ostringstream Dump;
-    (void)Avi.pReader->DumpFileStructure( Dump );
-    // A damaged count can promise many frames; a few past the start and the end show enough.
-    const std::uint64_t Count = Avi.pReader->GetFrameCount();
-    for( std::uint64_t i = 0; i < Count && i < 8; ++i )
-    {
-      ZOL::IVideoFrame Frame;
-      (void)Avi.pReader->ReadFrame( i, Frame, true, true );
-      (void)Avi.pReader->ReadFrame( Count - 1 - i, Frame, true, true );
-    }
-  }
-
-  // Both index kinds, audio, an AVIX part and a pad byte; or ffmpeg's files.
-  VBytes CorruptionFile( const std::string& i_rName )
-  {
-    if( i_rName == "FfmpegMjpegWithAudio" )
-      return ContainerTest::ReadFile( FfmpegAvi(
-          "CorruptMjpeg.avi", "-f lavfi -i sine=sample_rate=8000 -c:v mjpeg -c:a pcm_s16le -shortest -frames:v 3" ) );
-    if( i_rName == "FfmpegH264" )
-      return ContainerTest::ReadFile( FfmpegAvi( "CorruptH264.avi", "-c:v libx264 -bf 0 -frames:v 3" ) );
-    VAviSpec Spec = GreySpec( 6 );
-    Spec.StandardIndexFrames = 4;
-    Spec.AudioFormat = WaveFormat( 1, 2, 48000, 16 );
-    Spec.AudioChunks.assign( 6, Frame( 7680, 0x55 ) );
-    Spec.ExtendedFrames = { Frame( 32, 50 ) };
-    Spec.ExtraMoviChunks = Chunk( "JUNK", VBytes( 3 ) );
-    return BuildAvi( Spec );
-  }
-
-  class AviCorruption : public ::testing::TestWithParam< std::string >
-  {
-  };
-} // namespace
-
 // Every byte of the headers, then a spread over the rest.
 TEST_P( AviCorruption, CutsAndFlips )
 {
@@ -317,47 +369,6 @@ TEST_P( AviCorruption, CutsAndFlips )
 
 INSTANTIATE_TEST_SUITE_P( Files, AviCorruption, ::testing::Values( "HandBuilt", "FfmpegMjpegWithAudio", "FfmpegH264" ),
                           []( const ::testing::TestParamInfo< std::string >& i_rInfo ) { return i_rInfo.param; } );
-
-namespace
-{
-  constexpr int Width = 64;
-  constexpr int Height = 48;
-  constexpr std::uint64_t Frames = 5;
-
-  std::shared_ptr< RapidAVI::VRapidAVIReader > OpenFile( const std::string& i_rPath )
-  {
-    auto pReader = std::dynamic_pointer_cast< RapidAVI::VRapidAVIReader >( CreateVideoReader( i_rPath ) );
-    return pReader && pReader->Open( i_rPath ) ? pReader : nullptr;
-  }
-
-  struct VFfmpegCase
-  {
-    const char* Name;
-    const char* Encode;
-    ZOL::EVideoPayload Payload;
-    ZOL::EPixelFormat StoredFormat;
-    // ffmpeg's decode to compare with, in the pixel format the reader gives.
-    const char* DecodedFormat;
-    std::size_t BytesPerPixel;
-    bool bInverted;
-    // Raw frames are compared as stored; the others after decoding, within a mean difference.
-    double Tolerance;
-    // The audio stream's codec and channels; the format the reader gives.
-    const char* Audio;
-    ZOL::EAudioSampleFormat SampleFormat;
-  };
-
-  // Luma is exact between two H.264 decoders; the chroma upsampling may differ slightly. Float
-  // and samples of more than 16 bits come in the extensible form of the audio header.
-  const VFfmpegCase s_Cases[] = {
-      { "Bgr24BottomUp", "-c:v rawvideo -pix_fmt bgr24 -flipped_raw_rgb 1", ZOL::VideoPayload_Uncompressed,
-        ZOL::PixelFormat_B8G8R8, "bgr24", 3, true, 0.0, "-c:a pcm_s24le -ac 2", ZOL::AudioSampleFormat_Int24 },
-      { "Uyvy422", "-c:v rawvideo -pix_fmt uyvy422", ZOL::VideoPayload_Uncompressed, ZOL::PixelFormat_U8Y8V8Y8,
-        "uyvy422", 2, false, 0.0, "-c:a pcm_u8 -ac 1", ZOL::AudioSampleFormat_UInt8 },
-      { "H264", "-c:v libx264 -bf 0 -g 3 -pix_fmt yuv420p", ZOL::VideoPayload_VideoH264, ZOL::PixelFormat_U8Y8V8Y8,
-        "uyvy422", 2, false, 2.5, "-c:a pcm_f32le -ac 2", ZOL::AudioSampleFormat_Float32 },
-  };
-} // namespace
 
 TEST( AviFfmpeg, MatchesFfprobeAndFfmpegDecodeAfterEachSeek )
 {
@@ -462,31 +473,6 @@ TEST( AviFfmpeg, RefusedByTheirRule )
     EXPECT_TRUE( Log.Has( "Could not parse tree of AVI chunks.  File may be corrupt or unsupported." ) );
   }
 }
-
-namespace
-{
-  // An ffmpeg frame made into the AVI1 form: its JFIF APP0 and DHT segments left out, an AVI1
-  // APP0 in second place. i_bWithAPP0 false leaves out the APP0 as well.
-  VBytes ToAVI1( const VBytes& i_rFrame, bool i_bWithAPP0 )
-  {
-    UtilsIO::VMemoryInputStream Stream( i_rFrame.data(), i_rFrame.size() );
-    std::vector< JPEGUtils::VJPEGSegment > Segments;
-    EXPECT_TRUE( JPEGUtils::ParseJPEG( Stream, i_rFrame.size(), Segments ) );
-    VBytes Frame = { 0xFF, 0xD8 };
-    const VBytes App = { 0xFF, 0xE0, 0x00, 0x10, 'A', 'V', 'I', '1', 0, 0, 0, 0, 0, 0, 0, 0, 0, 0 };
-    if( i_bWithAPP0 )
-      Frame.insert( Frame.end(), App.begin(), App.end() );
-    for( std::size_t i = 1; i < Segments.size(); ++i )
-    {
-      if( Segments[i].Marker == 0xC4 || Segments[i].Marker == 0xE0 )
-        continue;
-      const std::uint64_t End = i + 1 < Segments.size() ? Segments[i + 1].Start : i_rFrame.size();
-      Frame.insert( Frame.end(), i_rFrame.begin() + static_cast< std::ptrdiff_t >( Segments[i].Start ),
-                    i_rFrame.begin() + static_cast< std::ptrdiff_t >( End ) );
-    }
-    return Frame;
-  }
-} // namespace
 
 TEST( AviMJPEG, AVI1FramesRebuiltWithTheTypicalTablesAndTheOnesRefused )
 {
