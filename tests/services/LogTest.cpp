@@ -56,12 +56,10 @@ TEST( Log, StandardErrorLineWithoutAnySink )
 // level asked for, the raw text goes out as a failure.
 TEST( Log, UnformattableMessageIsLoggedRawAsAFailure )
 {
-  const std::pair< const char*, int > Cases[] = { { "%d and %d", ZOL::LogInfo },
-                                                  { "no placeholder", ZOL::LogDetail },
-                                                  { "%1% then %", ZOL::LogWarning },
-                                                  { "100%% %q %", ZOL::LogFailure } };
-  for( const auto& [pFormat, Level] : Cases )
+  const char* const Formats[] = { "%d and %d", "no placeholder", "%1% then %", "100%% %q %" };
+  for( int Level = ZOL::LogFailure; Level < ZOL::LogFailure + 4; ++Level )
   {
+    const char* pFormat = Formats[Level - ZOL::LogFailure];
     SCOPED_TRACE( pFormat );
     LumekTest::VLogCapture Capture( "", ZOL::LogDetail );
     LUMEK_LOG( "LogTest", Level, pFormat, 1 );

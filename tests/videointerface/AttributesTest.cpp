@@ -2,7 +2,6 @@
 
 #include "tests/support/AllocationWatch.h"
 #include "tests/videointerface/AttributeTestSupport.h"
-#include "utils/MemoryStream.h"
 
 #include <gtest/gtest.h>
 
