@@ -112,18 +112,15 @@ namespace AppTest
   // A recording in the temporary folder, removed with the object.
   struct VTempRecording
   {
-    explicit VTempRecording( const VRecordingSpec& i_rSpec = {} )
-    {
-      static int s_Count = 0;
-      Path = ( std::filesystem::temp_directory_path() /
-               ( "apptest-" + std::to_string( getpid() ) + "-" + std::to_string( ++s_Count ) + ".lvid" ) )
-                 .string();
-      (void)WriteRecording( Path, i_rSpec ); // a recording not written fails to open
-    }
+    // A recording not written fails to open.
+    explicit VTempRecording( const VRecordingSpec& i_rSpec = {} ) { (void)WriteRecording( Path, i_rSpec ); }
     ~VTempRecording() { std::filesystem::remove( Path ); }
     VTempRecording( const VTempRecording& ) = delete;
-    VTempRecording& operator=( const VTempRecording& ) = delete;
 
-    std::string Path;
+    static inline int s_Count = 0;
+    const std::string Path =
+        ( std::filesystem::temp_directory_path() /
+          ( "apptest-" + std::to_string( getpid() ) + "-" + std::to_string( ++s_Count ) + ".lvid" ) )
+            .string();
   };
 } // namespace AppTest

@@ -1,7 +1,7 @@
 #pragma once
 
-// What Qt says while the object lives, warnings and worse: a sheet rule it cannot read, a picture
-// it cannot load, a painter on an empty range all end up here rather than on the console.
+// What Qt says while the object lives, warnings and worse: a sheet rule it cannot read, a painter
+// on an empty range.
 
 #include <QString>
 #include <QStringList>

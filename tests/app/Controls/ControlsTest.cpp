@@ -63,8 +63,8 @@ TEST( TickSteps, RoundStepForTheDensity )
     EXPECT_EQ( std::make_pair( Steps.Major, Steps.Minor ), std::make_pair( Major, Minor ) ) << FramesPerPixel;
   }
   // Beyond any file: capped.
-  EXPECT_EQ( ComputeTickSteps( 1e12 ).Major, std::numeric_limits< int >::max() );
-  EXPECT_EQ( ComputeTickSteps( 1e12 ).Minor, std::numeric_limits< int >::max() / 10 );
+  EXPECT_EQ( std::make_pair( ComputeTickSteps( 1e12 ).Major, ComputeTickSteps( 1e12 ).Minor ),
+             std::make_pair( std::numeric_limits< int >::max(), std::numeric_limits< int >::max() / 10 ) );
 }
 
 // The marks in the picture sit where frames fall along the handle's travel, computed here from

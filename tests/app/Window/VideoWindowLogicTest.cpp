@@ -163,4 +163,9 @@ TEST( MenuTable, KeysAreUniqueAndEveryActionHasItsMenu )
   EXPECT_EQ( Actions.size(), static_cast< std::size_t >( EAction::Count ) );
   EXPECT_EQ( ActionText( ActionRow( EAction::About ) ), "&About Lumek Video Viewer..." );
   EXPECT_EQ( ActionText( ActionRow( EAction::ViewHelp ) ), QString( "View Latest &Help on " ) + DocumentationSiteName );
+  // The documentation it opens is this release's.
+  ZOL::IApplicationVersion Version{};
+  Version.Major = 1;
+  Version.Minor = 10;
+  EXPECT_EQ( HelpUrl( Version ).path(), "/display/LVV110/" );
 }

@@ -15,7 +15,6 @@
 
 #include <QAction>
 #include <QApplication>
-#include <QDesktopServices>
 #include <QDropEvent>
 #include <QLabel>
 #include <QLineEdit>
@@ -62,18 +61,6 @@ namespace
     }
     QTimer Timer;
     int Count = 0;
-  };
-
-  // Catches what the Help menu would open in a browser.
-  class VUrlCatcher : public QObject
-  {
-    Q_OBJECT
-
-  public:
-    QList< QUrl > Urls;
-
-  public slots:
-    void Open( const QUrl& i_rUrl ) { Urls.append( i_rUrl ); }
   };
 
   void SendMouse( QWidget* i_pWidget, QEvent::Type i_Type, QPointF i_Point, Qt::MouseButtons i_Buttons )
@@ -138,10 +125,6 @@ namespace
       QApplication::setActiveWindow( m_pWindow.get() );
       QTest::keyClick( m_pWindow.get(), static_cast< Qt::Key >( i_Key ) );
     }
-    bool WaitForTheEnd()
-    {
-      return QTest::qWaitFor( [this] { return !Playing(); } );
-    }
 
     // The grey level the surface shows at a point inside the picture, off the centre where the
     // missing frame plate sits and off the outline at the edges.
@@ -179,11 +162,9 @@ TEST_F( VideoWindow, OpenPlayLoopPauseStepSeekStopAndClose )
   Spec.Frames = FramesWithout( 10, { 4, 7 } );
   ASSERT_TRUE( Open( Recording( "first take.lvid", Spec ) ) );
   // Nothing has ticked yet: this is the open's own frame.
-  EXPECT_EQ( m_pWindow->GetShownFrameIndex(), 0 );
   EXPECT_EQ( FrameForLevel( ShownLevel() ), 0 );
   EXPECT_EQ( m_pWindow->windowTitle(), "first take.lvid - Lumek Video Viewer" );
   EXPECT_EQ( Label( "VideoLabel" ), "V: 16 x 8 / Luminance8 / 25.00Hz / 10 frames (2 missing) / 0.40s" );
-  EXPECT_TRUE( Hidden( "AudioLabel" ) );
   EXPECT_TRUE( Label( "TimecodeLabel" ).startsWith( "T: " ) ) << Label( "TimecodeLabel" ).toStdString();
   EXPECT_TRUE( Label( "DecoderLabel" ).contains( " @ " ) ) << Label( "DecoderLabel" ).toStdString();
   EXPECT_EQ( std::make_pair( Timebar()->maximum(), SpinBox()->maximum() ), std::make_pair( 9, 9 ) );
@@ -239,7 +220,7 @@ TEST_F( VideoWindow, OpenPlayLoopPauseStepSeekStopAndClose )
 
   // Without looping, the end stops on the last picture and rewinds the clock.
   Action( EAction::Looping )->setChecked( false );
-  ASSERT_TRUE( WaitForTheEnd() );
+  ASSERT_TRUE( QTest::qWaitFor( [this] { return !Playing(); } ) );
   EXPECT_EQ( std::make_pair( Frame(), Timebar()->value() ), std::make_pair( std::uint64_t( 0 ), 9 ) );
   EXPECT_EQ( FrameForLevel( ShownLevel() ), 9 );
   EXPECT_EQ( PlayButton()->objectName(), "Play" );
@@ -250,7 +231,7 @@ TEST_F( VideoWindow, OpenPlayLoopPauseStepSeekStopAndClose )
   Still.Frames = { 0 };
   ASSERT_TRUE( Open( Recording( "still.lvid", Still ) ) );
   EXPECT_EQ( std::make_pair( Timebar()->maximum(), SpinBox()->maximum() ), std::make_pair( 0, 0 ) );
-  ASSERT_TRUE( WaitForTheEnd() );
+  ASSERT_TRUE( QTest::qWaitFor( [this] { return !Playing(); } ) );
   EXPECT_EQ( FrameForLevel( ShownLevel() ), 0 );
 
   m_pWindow->CloseFile();
@@ -432,19 +413,13 @@ TEST_F( VideoWindow, FullScreenScaleModesKeysAndARestart )
   EXPECT_FALSE( Hidden( "InfoPanel" ) );
   ASSERT_TRUE( Open( Recording( "restart.lvid" ) ) );
   EXPECT_TRUE( m_pWindow->GetGLWidget()->GetDecoderName().contains( "Software" ) );
-  EXPECT_TRUE( WaitForTheEnd() );
+  EXPECT_TRUE( QTest::qWaitFor( [this] { return !Playing(); } ) );
 }
 
-// The documentation of this release, its version, an answer to the user's update check even with
-// no server to ask (the error dialog), and the legal page with the theme and every licence.
+// This release's version, an answer to the user's update check even with no server to ask (the
+// error dialog), and the legal page with the theme and every licence.
 TEST_F( VideoWindow, TheHelpMenuAnswersEveryEntry )
 {
-  VUrlCatcher Catcher;
-  QDesktopServices::setUrlHandler( "https", &Catcher, "Open" );
-  Action( EAction::ViewHelp )->trigger();
-  QDesktopServices::unsetUrlHandler( "https" );
-  EXPECT_EQ( Catcher.Urls.size() == 1 ? Catcher.Urls.front().path() : "", "/display/LVV110/" );
-
   QString VersionLine, UpdateText, Title;
   QQuickWidget::Status Status = QQuickWidget::Null;
   VDialogCloser Closer(
@@ -484,5 +459,3 @@ TEST_F( VideoWindow, TheHelpMenuAnswersEveryEntry )
   }
   EXPECT_EQ( Names.join( ", " ), "Qt 5, Boost, libebml, libmatroska, libjpeg-turbo, OpenH264, ImageMagick, RapidXml" );
 }
-
-#include "VideoWindowTest.moc"
