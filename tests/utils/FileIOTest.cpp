@@ -28,7 +28,7 @@ namespace
       // Only an error without a code of its own is worth a line.
       const LumekTest::VLogCapture Log( "System" );
       EXPECT_EQ( ErrnoToResult( EEXIST ), ZOL::Result_AlreadyPresent );
-      EXPECT_EQ( ErrnoToResult( ENOTSUP ), ZOL::Result_NotSupported );
+      EXPECT_EQ( ErrnoToResult( EPERM ), ZOL::Result_NotPermitted );
       EXPECT_EQ( ErrnoToResult( ENOSPC ), ZOL::Result_FileIOFailure );
       EXPECT_EQ( Log.Messages, std::vector< std::string >{ "Std error code: " + std::to_string( ENOSPC ) } );
     }

@@ -145,7 +145,9 @@ namespace
                                             ZOL::GetResultText( ZOL::Result_FileIOFailure ) +
                                             "), falling back to a standard input file stream." ) );
       std::uint64_t Size = 1;
-      EXPECT_TRUE( Kind != "plain" || ( pStream->GetSize( Size ) && Size == 0 ) );
+      std::uint8_t Byte = 0;
+      EXPECT_TRUE( Kind != "plain" ||
+                   ( pStream->GetSize( Size ) && Size == 0 && !pStream->Read( &Byte, 1 ) && pStream->IsAtEnd() ) );
     }
   }
 } // namespace

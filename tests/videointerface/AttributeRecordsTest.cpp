@@ -97,11 +97,11 @@ TEST( AttributeRecords, EveryRecordReadsBackAsWritten )
   EXPECT_EQ( InterlacedFormat_Unspecified, Read.Frame.InterlacedFormat );
   EXPECT_EQ( 2, Read.Frame.TwiceOffsetX );
 
-  // No vertical offset of either kind, a width beyond a signed one, or an unknown format name
+  // No horizontal offset of either kind, a width beyond a signed one, or an unknown format name
   // fails the frame.
   IVideoAttributes NoOffset = Store, Wide = Store, Unknown = Store;
-  NoOffset.Remove( "VideoFrameInfo.ImageY" );
-  NoOffset.Remove( "VideoFrameInfo.TwiceOffsetY" );
+  NoOffset.Remove( "VideoFrameInfo.ImageX" );
+  NoOffset.Remove( "VideoFrameInfo.TwiceOffsetX" );
   Wide.Set( "VideoFrameInfo.ImageWidth", 0x80000000u );
   Unknown.Set( "VideoFrameInfo.PixelFormat", "bayerGB8" ); // names compare exactly
   const IVideoAttributes* const Broken[] = { &NoOffset, &Wide, &Unknown };
@@ -184,7 +184,7 @@ TEST( FrameInfo, ConversionDistortionFlagFollowsTheHistory )
     if( rCase.bOwnLens )
       Outer.Set( "LensDistortionCalibration.RadialModel", 0 ); // any type counts
     if( rCase.bGapBeforeTheLens )
-      Outer.Remove( "ConversionRecord.0.Container" );
+      Outer.Remove( "ConversionRecord.0.VideoFrameInfo.PixelFormat" );
     IVideoFrameInfo Info;
     Info.Flags = rCase.Flag ? 0u : static_cast< std::uint32_t >( IVideoFrameInfo::Flag_HasConversionDistortion );
     ASSERT_TRUE( ReadVideoFrameInfo( Keys, Outer, Info ) );

@@ -112,7 +112,6 @@ TEST( AttributeSerialForm, MatchesTheByteLayoutInKeyOrder )
   Store.Set( "c", std::int64_t( -2 ) );
   Store.Set( "d", -2.0 );
   Store.Set( "\xc3", std::int8_t( 90 ) ); // keys sort as unsigned bytes: after every ASCII key
-
   VBytes Expected;
   Expected.U32( 7 );
   Expected.Text( "" ).U32( 9 ).Raw( { 0x00, 0x00, 0xC0, 0xBF } );
@@ -135,14 +134,12 @@ TEST( AttributeSerialForm, ReaderTakesWhatTheWriterNeverMakes )
   IVideoAttributes Store = One( "stale", 1 );
   ASSERT_TRUE( ReadBytes( Store, VBytes().U32( 0 ).Data, true ) );
   EXPECT_TRUE( Store.Empty() );
-
   VBytes Unordered;
   Unordered.U32( 3 ).Text( "z" ).U32( 3 ).U32( 1 ).Text( "a" ).U32( 3 ).U32( 2 ).Text( "z" ).U32( 7 ).U32( 3 );
   ASSERT_TRUE( ReadBytes( Store, Unordered.Data, true ) );
   IVideoAttributes Expected = One( "a", 2 );
   Expected.Set( "z", 3u );
   EXPECT_TRUE( Store == Expected );
-
   ASSERT_TRUE( ReadBytes( Store, VBytes().U32( 1 ).Text( "b" ).U32( 0 ).Raw( { 0x7F } ).Data, true ) );
   EXPECT_TRUE( Store == One( "b", true ) );
   EXPECT_EQ( 0x01, Serialise( Store ).back() );

@@ -25,6 +25,7 @@ TEST( Enumerations, EveryTableLooksUpBothWaysExactlyAndFallsBackOutsideItsRows )
       const std::string Name = rRow.Name;
       EXPECT_EQ( rRow.Value, rTable.FromName( Name ) );
       EXPECT_STREQ( rRow.Name, rTable.ToName( rRow.Value, "fallback" ) );
+      EXPECT_STREQ( rRow.Description, rTable.ToDescription( rRow.Value ) );
       EXPECT_FALSE( rTable.FromName( Name + " " ) ) << Name;
       EXPECT_FALSE( rTable.FromName( Name.substr( 0, Name.size() - 1 ) ) ) << Name;
       EXPECT_FALSE( rTable.FromName( std::string_view( Name.c_str(), Name.size() + 1 ) ) ) << Name; // with its zero

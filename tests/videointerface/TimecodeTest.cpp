@@ -37,8 +37,8 @@ TEST( TimecodeTicks, LabelsAtTheCarriesAndBackAgain )
                 { DF, 2589408 * 3 + 1800, "00:01:00;02", 3 },
                 { DF, -1, "23:59:59;29", -1 },
                 { TimecodeStandard_30, -1, "23:59:59:29", -1 },
-                { TimecodeStandard_23_98, 24 * 86400 - 1, "23:59:59:23", 0 },
                 { TimecodeStandard_25, 25 * 86400 * 2 + 26, "00:00:01:01", 2 } };
+  EXPECT_EQ( 2589408ull * 4504500, Label( DF, 0, 0, 0, 0 ).GetTicksPerDay() ) << "drop frame skips 2592 labels a day";
   for( const auto& rCase : Cases )
   {
     SCOPED_TRACE( std::to_string( rCase.Standard ) + ", frame " + std::to_string( rCase.Frame ) );
@@ -84,6 +84,7 @@ TEST( TimecodeText, GoldenAndNoneOutOfRange )
                 { Label( 3, 0, 0, 0, 0, 45000 ), 4, true, false, "00:00:00:00+01 [30 fps]" },
                 { Label( 3, 0, 0, 0, 0, 4499999 ), 4, false, false, "00:00:00:00+99" }, // truncated
                 { Label( 3, 0, 0, 0, 0, 1125007, 1125000 ), 5, false, false, "00:00:00:00 (1)r7" },
+                { Label( 3, 0, 0, 0, 0, 2250000, 1125000 ), 5, false, false, "00:00:00:00 (2)" },
                 { Label( 3, 0, 0, 0, 0, 2250000 ), 9, true, false, "00:00:00:00 [30 fps]" }, // unknown style
                 { Label( 1, 23, 59, 59, 23, 5630624 ), 0, false, false, "23:59:59:23" },     // the last tick
                 { Label( 4, 0, 1, 0, 0 ), 0, false, false, "00:01:00:00" },                  // not drop frame
