@@ -30,9 +30,8 @@ namespace
         OpenBytes( Reader, i_rBytes ) ? std::min< std::uint64_t >( Reader.GetFrameCount(), 16 ) : 0;
     for( std::uint64_t f = 0; f < Count; ++f )
     {
-      std::shared_ptr< ZOL::IBuffer > pVideo;
-      ZOL::IAudioBuffers Audio;
-      static_cast< void >( Reader.ReadFrameData( f, pVideo, Audio, true, true ) );
+      ZOL::IVideoFrame Frame;
+      static_cast< void >( Reader.ReadFrame( f, Frame, true, true ) );
     }
   }
 

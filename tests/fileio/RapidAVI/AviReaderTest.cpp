@@ -12,6 +12,7 @@
 #include <gtest/gtest.h>
 
 using namespace AviTest;
+using namespace ContainerTest;
 
 namespace
 {
@@ -57,7 +58,7 @@ namespace
   const VTreeCase s_TreeCases[] = {
       { "Plain", []( VAviSpec& ) {}, 3, "" },
       { "UnknownRiffFormAfterGoodPart",
-        []( VAviSpec& s ) { s.Trailer = Riff( "WAVE", { Chunk( "data", VBytes( 6 ) ) } ); }, 3,
+        []( VAviSpec& s ) { s.Trailer = List( "WAVE", { Chunk( "data", VBytes( 6 ) ) }, "RIFF" ); }, 3,
         "Unknown RIFF chunk 'WAVE' ignored." },
       { "Creator511", []( VAviSpec& s ) { s.ExtraHeaderChunks = Info( "ISFT", std::string( 510, 'x' ) ); }, 3,
         "AVI file created by: " + std::string( 510, 'x' ) },
@@ -90,7 +91,7 @@ namespace
         []( VAviSpec& s )
         {
           s.StandardIndexFrames = 3;
-          s.ExtendedFrames = { Frame( 32, 4 ), Frame( 32, 5 ) };
+          s.ExtendedFrames = { VBytes( 32, 4 ), VBytes( 32, 5 ) };
         },
         5, "" },
       // Without a stream period the main header's rate gives it.
@@ -120,15 +121,15 @@ namespace
   VBytes CorruptionFile( const std::string& i_rName )
   {
     if( i_rName == "FfmpegMjpegWithAudio" )
-      return ContainerTest::ReadFile( FfmpegAvi(
+      return ReadFile( FfmpegAvi(
           "CorruptMjpeg.avi", "-f lavfi -i sine=sample_rate=8000 -c:v mjpeg -c:a pcm_s16le -shortest -frames:v 3" ) );
     if( i_rName == "FfmpegH264" )
-      return ContainerTest::ReadFile( FfmpegAvi( "CorruptH264.avi", "-c:v libx264 -bf 0 -frames:v 3" ) );
+      return ReadFile( FfmpegAvi( "CorruptH264.avi", "-c:v libx264 -bf 0 -frames:v 3" ) );
     VAviSpec Spec = GreySpec( 6 );
     Spec.StandardIndexFrames = 4;
     Spec.AudioFormat = WaveFormat( 1, 2, 48000, 16 );
-    Spec.AudioChunks.assign( 6, Frame( 7680, 0x55 ) );
-    Spec.ExtendedFrames = { Frame( 32, 50 ) };
+    Spec.AudioChunks.assign( 6, VBytes( 7680, 0x55 ) );
+    Spec.ExtendedFrames = { VBytes( 32, 50 ) };
     Spec.ExtraMoviChunks = Chunk( "JUNK", VBytes( 3 ) );
     return BuildAvi( Spec );
   }
@@ -212,7 +213,7 @@ TEST( AviTree, OpensCountsAndDumpsAsTheRulesSay )
     EXPECT_TRUE( rCase.LogLine.empty() || Log.Has( rCase.LogLine ) ) << rCase.LogLine;
     ASSERT_EQ( Avi.pReader->GetFrameCount(), rCase.FrameCount );
     for( std::uint64_t i = 0; i < rCase.FrameCount; ++i )
-      EXPECT_EQ( ReadVideo( *Avi.pReader, i ), Frame( 32, static_cast< std::uint8_t >( i + 1 ) ) ) << "frame " << i;
+      EXPECT_EQ( ReadVideo( *Avi.pReader, i ), VBytes( 32, static_cast< std::uint8_t >( i + 1 ) ) ) << "frame " << i;
   }
   // An ix00 whose count runs past its chunk, and a file that is no RIFF at all.
   VAviSpec Spec = GreySpec( 3 );
@@ -232,7 +233,7 @@ TEST( AviTree, OpensCountsAndDumpsAsTheRulesSay )
   Odd.ExtraMoviChunks = Chunk( "JUNK", VBytes( 3, 0 ) );
   std::ostringstream Text;
   ASSERT_TRUE( OpenAvi( BuildAvi( Odd ) ).pReader->DumpFileStructure( Text ) );
-  const VBytes Golden = ContainerTest::ReadFile( AVI_GOLDEN_FOLDER "/dump-odd-junk.txt" );
+  const VBytes Golden = ReadFile( AVI_GOLDEN_FOLDER "/dump-odd-junk.txt" );
   EXPECT_EQ( Text.str(), std::string( Golden.begin(), Golden.end() ) );
 
   // Bitmaps of positive height are stored bottom row first, whichever name they go by; the
@@ -243,7 +244,7 @@ TEST( AviTree, OpensCountsAndDumpsAsTheRulesSay )
     VAviSpec Positive;
     Bitmap( Positive, FourCC, FourCC == RapidAVI::MakeFourCC( "YUY2" ) ? 16 : 32 );
     Positive.StrfHeight = 4;
-    Positive.Frames = { Frame( 8 * 4 * Positive.Bits / 8, 1 ) };
+    Positive.Frames = { VBytes( 8 * 4 * Positive.Bits / 8, 1 ) };
     Positive.OldIndexFrames = 1;
     VOpenedAvi Avi = OpenAvi( BuildAvi( Positive ) );
     ASSERT_TRUE( Avi.bOpened );
@@ -262,7 +263,7 @@ TEST( AviIndex, EntriesBeyondTheFileFailOnlyTheirFrame )
   ASSERT_TRUE( Avi.bOpened );
   EXPECT_EQ( Avi.pReader->GetFrameCount(), 100u );
   EXPECT_TRUE( Avi.pReader->HasFrame( 99 ) );
-  EXPECT_EQ( ReadVideo( *Avi.pReader, 89 ), Frame( 32, 90 ) );
+  EXPECT_EQ( ReadVideo( *Avi.pReader, 89 ), VBytes( 32, 90 ) );
   for( std::uint64_t Frame = 90; Frame < 100; ++Frame )
     EXPECT_TRUE( ReadVideo( *Avi.pReader, Frame ).empty() ) << Frame;
   EXPECT_TRUE( Log.Has( "Attempting to read frame beyond end of file." ) );
@@ -271,7 +272,7 @@ TEST( AviIndex, EntriesBeyondTheFileFailOnlyTheirFrame )
   // asked for. (Damaged video entries in either index are among the flips of AviCorruption.)
   VAviSpec Audible = GreySpec( 3 );
   Audible.AudioFormat = WaveFormat( 1, 1, 48000, 16 );
-  Audible.AudioChunks.assign( 3, Frame( 3840, 0x80 ) );
+  Audible.AudioChunks.assign( 3, VBytes( 3840, 0x80 ) );
   VBytes File = BuildAvi( Audible );
   Patch( File, "idx1", 4 * 16 + 12, 0x40000F00, 4 );
   VOpenedAvi Damaged = OpenAvi( File );
@@ -285,10 +286,10 @@ TEST( AviIndex, EntriesBeyondTheFileFailOnlyTheirFrame )
   }
   // A raw frame one byte too long fails without a word: a player asks for it again and again.
   Spec = GreySpec( 2 );
-  Spec.Frames[1] = Frame( 33, 2 );
+  Spec.Frames[1] = VBytes( 33, 2 );
   VOpenedAvi Long = OpenAvi( BuildAvi( Spec ) );
   ASSERT_TRUE( Long.bOpened );
-  EXPECT_EQ( ReadVideo( *Long.pReader, 0 ), Frame( 32, 1 ) );
+  EXPECT_EQ( ReadVideo( *Long.pReader, 0 ), VBytes( 32, 1 ) );
   LumekTest::VLogCapture Quiet;
   EXPECT_TRUE( ReadVideo( *Long.pReader, 1 ).empty() );
   EXPECT_TRUE( Quiet.Records.empty() );
@@ -319,7 +320,7 @@ TEST( AviAudio, ChunksBelongToFramesByPlayTime )
     VAviSpec Spec = GreySpec( 6 );
     Spec.AudioFormat = rFormat.Format;
     for( std::size_t Bytes : { 1920, 1920, 1920, 1920, 7680, 3840, 3840 } )
-      Spec.AudioChunks.push_back( Frame( Bytes, 0x80 ) );
+      Spec.AudioChunks.push_back( VBytes( Bytes, 0x80 ) );
     LumekTest::VLogCapture Log;
     VOpenedAvi Avi = OpenAvi( BuildAvi( Spec ) );
     ASSERT_TRUE( Avi.bOpened );
@@ -345,7 +346,7 @@ TEST( AviMetadata, BayerDescriptionFromTheStores )
   Attributes.Set( "Recording.Take", std::string( "Take 7" ) );
   ZOL::IVideoTiming Timing;
   VAviSpec Spec = GreySpec( 4 );
-  Spec.Trailer = Riff( "QMDT", { ContainerTest::BayerStores( 8, 4, Attributes, Timing ) } );
+  Spec.Trailer = List( "QMDT", { BayerStores( 8, 4, Attributes, Timing ) }, "RIFF" );
   VOpenedAvi Avi = OpenAvi( BuildAvi( Spec ) );
   ASSERT_TRUE( Avi.bOpened );
   EXPECT_EQ( Avi.pReader->GetVideoFrameInfo().PixelFormat, ZOL::PixelFormat_BayerGB8 );
@@ -364,7 +365,7 @@ TEST_P( AviCorruption, CutsAndFlips )
   const VBytes File = CorruptionFile( GetParam() );
   if( File.empty() )
     GTEST_SKIP() << "no fixture";
-  ContainerTest::CutsAndFlips( File, 0, 512, std::max< std::size_t >( 1, File.size() / 300 ), ReadEverything );
+  CutsAndFlips( File, 0, 512, std::max< std::size_t >( 1, File.size() / 300 ), ReadEverything );
 }
 
 INSTANTIATE_TEST_SUITE_P( Files, AviCorruption, ::testing::Values( "HandBuilt", "FfmpegMjpegWithAudio", "FfmpegH264" ),
@@ -382,7 +383,6 @@ TEST( AviFfmpeg, MatchesFfprobeAndFfmpegDecodeAfterEachSeek )
                                             rCase.Encode + " " + rCase.Audio + " -frames:v 5" );
     auto pReader = OpenFile( Path );
     ASSERT_TRUE( pReader );
-    using ContainerTest::Probe;
     EXPECT_EQ( pReader->GetFrameCount(), std::stoull( Probe( Path, "stream=nb_frames" ) ) );
     EXPECT_DOUBLE_EQ( pReader->GetVideoTiming().GetFrameRate(), 25.0 );
     EXPECT_EQ( pReader->GetVideoPayload(), rCase.Payload );
@@ -401,7 +401,7 @@ TEST( AviFfmpeg, MatchesFfprobeAndFfmpegDecodeAfterEachSeek )
     ASSERT_EQ( Expected.size(), FrameBytes * Frames );
     // In the order a viewer jumping back through the file reads them.
     std::vector< std::uint64_t > Order;
-    for( const auto& rGroup : ContainerTest::GroupsLastFirst( Path ) )
+    for( const auto& rGroup : GroupsLastFirst( Path ) )
       Order.insert( Order.end(), rGroup.begin(), rGroup.end() );
     ASSERT_EQ( Order.size(), Frames );
     for( const std::uint64_t i : Order )
@@ -435,7 +435,7 @@ TEST( AviFfmpeg, MatchesFfprobeAndFfmpegDecodeAfterEachSeek )
         Audio.insert( Audio.end(), pBlock->GetData(), pBlock->GetData() + pBlock->GetSize() );
       }
     }
-    const VBytes Stored = ContainerTest::StreamCopy( Path, "a:0" );
+    const VBytes Stored = StreamCopy( Path, "a:0" );
     EXPECT_FALSE( Stored.empty() );
     EXPECT_TRUE( Audio == Stored ) << Audio.size() << " bytes against " << Stored.size();
   }

@@ -39,6 +39,7 @@ namespace AviTest
     return VLE().Text( i_rId ).U32( i_rPayload.size() ).Append( i_rPayload ).Zeros( i_rPayload.size() % 2 ).Bytes;
   }
 
+  // A LIST, or with i_rId "RIFF" a part of the file.
   inline VBytes List( const std::string& i_rType, const std::vector< VBytes >& i_rChildren,
                       const std::string& i_rId = "LIST" )
   {
@@ -49,11 +50,6 @@ namespace AviTest
     return Chunk( i_rId, Payload.Bytes );
   }
 
-  inline VBytes Riff( const std::string& i_rForm, const std::vector< VBytes >& i_rChildren )
-  {
-    return List( i_rForm, i_rChildren, "RIFF" );
-  }
-
   // Plain PCM's 16 bytes, as ffmpeg writes them.
   inline VBytes WaveFormat( std::uint16_t i_Tag, std::uint16_t i_Channels, std::uint32_t i_Rate, std::uint16_t i_Bits )
   {
@@ -61,12 +57,6 @@ namespace AviTest
     return Chunk(
         "strf",
         VLE().U16( i_Tag ).U16( i_Channels ).U32( i_Rate ).U32( i_Rate * Group ).U16( Group ).U16( i_Bits ).Bytes );
-  }
-
-  // A frame of i_Size bytes, every byte i_Value.
-  inline VBytes Frame( std::size_t i_Size, std::uint8_t i_Value )
-  {
-    return VBytes( i_Size, i_Value );
   }
 
   struct VAviSpec
@@ -100,7 +90,7 @@ namespace AviTest
   {
     VAviSpec Spec;
     for( int i = 0; i < i_Frames; ++i )
-      Spec.Frames.push_back( Frame( 32, static_cast< std::uint8_t >( i + 1 ) ) );
+      Spec.Frames.push_back( VBytes( 32, static_cast< std::uint8_t >( i + 1 ) ) );
     Spec.OldIndexFrames = i_Frames;
     return Spec;
   }
@@ -171,14 +161,14 @@ namespace AviTest
         Add( "01wb", rAudio );
       Parts.push_back( Chunk( "idx1", Entries.Bytes ) );
     }
-    VLE File{ Riff( "AVI ", Parts ) };
+    VLE File{ List( "AVI ", Parts, "RIFF" ) };
     if( !s.ExtendedFrames.empty() )
     {
       const std::uint64_t ListPosition = File.Bytes.size() + 12;
       VEntries Extended, None;
       const VLE Chunks = MoviChunks( ListPosition, {}, s.ExtendedFrames, {}, int( s.ExtendedFrames.size() ),
                                      ListPosition, Extended, None );
-      File.Append( Riff( "AVIX", { List( "movi", { Chunks.Bytes } ) } ) );
+      File.Append( List( "AVIX", { List( "movi", { Chunks.Bytes } ) }, "RIFF" ) );
     }
     return File.Append( s.Trailer ).Bytes;
   }
