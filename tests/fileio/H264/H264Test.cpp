@@ -1,10 +1,6 @@
-// H.264: the RBSP reader and writer, the stream forms and unit inspection, and libx264's
-// parameter sets read and written back bit for bit (hand-computed codes and bytes, ffmpeg-made
-// units, and the counts a stream gives refused before they size anything); the decoder object,
-// and the video source that reaches any frame by decoding forward from the key frame before it,
-// against ffmpeg's own decode of the same libx264 streams. The streams are made by ffmpeg in the
-// run and cut into access units; a reader serves them from memory, so that the video source can
-// be driven without a container that stores H.264.
+// H.264: the RBSP reader and writer, stream forms, unit descriptions and libx264's parameter sets
+// written back bit for bit; the decoder and the video source against ffmpeg's decode. libx264
+// streams are cut into access units, which a reader serves from memory to the video source.
 
 #include "app/VideoSource/VVideoSource.h"
 #include "fileio/H264IO/VH264Decoder.h"
@@ -74,14 +70,13 @@ namespace
 
   // A libx264 stream without B-frames, a key frame every i_KeyInterval frames and an access
   // unit delimiter before each unit, so that it can be cut without parsing slices.
-  VH264Stream MakeH264Stream( std::int32_t i_Width, std::int32_t i_Height, int i_Frames, int i_KeyInterval = 30,
-                              const std::string& i_rEncoderArguments = "-profile:v baseline",
-                              const std::string& i_rPixelFormat = "yuv420p" )
+  VH264Stream MakeH264Stream( std::int32_t i_Width, std::int32_t i_Height, int i_Frames, int i_KeyInterval,
+                              const std::string& i_rEncoderArguments = "-profile:v baseline" )
   {
     const std::string Size = std::to_string( i_Width ) + "x" + std::to_string( i_Height );
     const std::string Key = std::to_string( i_KeyInterval );
     std::istringstream Words( "-f lavfi -i testsrc2=size=" + Size + ":rate=25 -frames:v " + std::to_string( i_Frames ) +
-                              " -pix_fmt " + i_rPixelFormat + " -c:v libx264 -bf 0 -g " + Key + " -keyint_min " + Key +
+                              " -pix_fmt yuv420p -c:v libx264 -bf 0 -g " + Key + " -keyint_min " + Key +
                               " -sc_threshold 0 " + i_rEncoderArguments + " -bsf:v h264_metadata=aud=insert" );
     VH264Stream Stream{ FfmpegFixture( "h264_" + Size + "_" + std::to_string( i_Frames ) + ".h264",
                                        { std::istream_iterator< std::string >( Words ), {} } ),
@@ -106,11 +101,9 @@ namespace
   std::vector< VBytes > ExpectedUYVYFrames( const VH264Stream& i_rStream )
   {
     const VBytes Planar = FfmpegDecode( i_rStream.Path, "yuv420p" );
-    const std::size_t W = static_cast< std::size_t >( i_rStream.Width );
-    const std::size_t H = static_cast< std::size_t >( i_rStream.Height );
-    const std::size_t FrameSize = W * H * 3 / 2;
+    const std::size_t W = i_rStream.Width, H = i_rStream.Height, FrameSize = W * H * 3 / 2;
     std::vector< VBytes > Frames;
-    for( std::size_t Offset = 0; FrameSize > 0 && Offset + FrameSize <= Planar.size(); Offset += FrameSize )
+    for( std::size_t Offset = 0; Offset + FrameSize <= Planar.size(); Offset += FrameSize )
     {
       const std::uint8_t* pY = Planar.data() + Offset;
       const std::uint8_t* pU = pY + W * H;
@@ -326,16 +319,14 @@ namespace
     if( !HaveFfmpeg() )
       GTEST_SKIP() << "ffmpeg is not installed";
     const VH264Stream Stream = MakeH264Stream( 64, 48, 12, 5 );
-    ASSERT_FALSE( Stream.AccessUnits.empty() );
+    ASSERT_EQ( Stream.AccessUnits.size(), 12u );
     for( const VBytes& rUnit : Stream.AccessUnits )
     {
-      const std::vector< VBytes > Units = SplitNALUnits( rUnit );
       const auto pPrefixed = Prefixed( rUnit );
-      ASSERT_TRUE( pPrefixed );
-      EXPECT_EQ( Bytes( *pPrefixed ), JoinNALUnits( Units, true ) );
+      EXPECT_EQ( Bytes( pPrefixed ), JoinNALUnits( SplitNALUnits( rUnit ), true ) );
       std::shared_ptr< ZOL::IBuffer > pAnnexB;
       ASSERT_TRUE( LengthPrefixedToAnnexB( pPrefixed->GetData(), pPrefixed->GetSize(), pAnnexB, *s_pAllocator ) );
-      EXPECT_EQ( Bytes( *pAnnexB ), JoinNALUnits( Units, false ) );
+      EXPECT_EQ( Bytes( pAnnexB ), JoinNALUnits( SplitNALUnits( rUnit ), false ) );
     }
     // Key frames every 5: the IDR slice and the parameter sets are found in both forms.
     const auto pKey = Prefixed( Stream.AccessUnits[5] );
@@ -507,9 +498,8 @@ namespace
     ZOL::IVideoFrameInfo Info;
   };
 
-  class H264Decoder : public ::testing::Test
+  struct H264Decoder : ::testing::Test
   {
-  protected:
     void SetUp() override
     {
       if( !HaveFfmpeg() )
@@ -534,20 +524,18 @@ namespace
         ASSERT_TRUE( Frame.bDecoded ) << i;
         EXPECT_EQ( std::tie( Frame.Info.ImageWidth, Frame.Info.ImageHeight, Frame.Info.PixelFormat ),
                    std::tuple( Width, Height, ZOL::PixelFormat_U8Y8V8Y8 ) );
-        EXPECT_EQ( Bytes( *Frame.pOutput ), Expected[i] ) << "frame " << i;
+        EXPECT_EQ( Bytes( Frame.pOutput ), Expected[i] ) << "frame " << i;
       }
       // The other packing when asked for, U8Y8V8Y8 for any other wish.
       VBytes Swapped = Expected[0];
       for( std::size_t i = 0; i + 1 < Swapped.size(); i += 2 )
         std::swap( Swapped[i], Swapped[i + 1] );
       const VDecode Other( Stream.AccessUnits[0], ZOL::PixelFormat_Y8U8Y8V8 );
-      ASSERT_TRUE( Other.bDecoded );
-      EXPECT_EQ( Other.Info.PixelFormat, ZOL::PixelFormat_Y8U8Y8V8 );
-      EXPECT_EQ( Bytes( *Other.pOutput ), Swapped );
+      EXPECT_EQ( std::tuple( Other.bDecoded, Other.Info.PixelFormat, Bytes( Other.pOutput ) ),
+                 std::tuple( true, ZOL::PixelFormat_Y8U8Y8V8, Swapped ) );
       const VDecode Any( Stream.AccessUnits[0], ZOL::PixelFormat_R8G8B8 );
-      ASSERT_TRUE( Any.bDecoded );
-      EXPECT_EQ( Any.Info.PixelFormat, ZOL::PixelFormat_U8Y8V8Y8 );
-      EXPECT_EQ( Bytes( *Any.pOutput ), Expected[0] );
+      EXPECT_EQ( std::tuple( Any.bDecoded, Any.Info.PixelFormat, Bytes( Any.pOutput ) ),
+                 std::tuple( true, ZOL::PixelFormat_U8Y8V8Y8, Expected[0] ) );
     }
   }
 

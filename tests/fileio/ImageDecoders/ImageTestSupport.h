@@ -8,6 +8,8 @@
 #include "videointerface/BufferAllocators.h"
 #include "videointerface/IVideoFrameInfo.h"
 
+#include <gtest/gtest.h>
+
 #include <algorithm>
 #include <filesystem>
 #include <fstream>
@@ -56,18 +58,14 @@ namespace LumekTest
   {
   public:
     VTempFolder() { std::filesystem::create_directories( m_Path ); }
-    ~VTempFolder()
-    {
-      std::error_code Error;
-      std::filesystem::remove_all( m_Path, Error );
-    }
+    ~VTempFolder() { std::filesystem::remove_all( m_Path, m_Error ); }
     VTempFolder( const VTempFolder& ) = delete;
     VTempFolder& operator=( const VTempFolder& ) = delete;
-
     const std::string& Path() const { return m_Path; }
     std::string operator/( const std::string& i_rName ) const { return m_Path + "/" + i_rName; }
 
   private:
+    std::error_code m_Error;
     std::string m_Path =
         ( std::filesystem::temp_directory_path() / ( "lumek-test-" + std::to_string( std::random_device()() ) ) )
             .string();
@@ -83,26 +81,22 @@ namespace LumekTest
     return i_pBuffer ? Bytes( *i_pBuffer ) : VBytes();
   }
 
-  // The largest and the mean difference of the bytes of i_rExpected and those at the start of
-  // i_rGot, for decoders that may round their own way.
-  struct VDifference
+  // Whether the bytes at the start of i_rGot differ from i_rExpected by at most i_Largest and on
+  // average by at most i_Mean, for decoders that may round their own way.
+  inline ::testing::AssertionResult Near( const VBytes& i_rExpected, const ZOL::IBufferConst& i_rGot, int i_Largest,
+                                          double i_Mean )
   {
     int Largest = 0;
-    double Mean = 0.0;
-  };
-
-  inline VDifference Difference( const VBytes& i_rExpected, const ZOL::IBufferConst& i_rGot )
-  {
-    VDifference Result;
     double Sum = 0.0;
     for( std::size_t i = 0; i < i_rExpected.size() && i < i_rGot.GetSize(); ++i )
     {
-      const int Difference = std::abs( int( i_rExpected[i] ) - int( i_rGot.GetData()[i] ) );
-      Result.Largest = std::max( Result.Largest, Difference );
-      Sum += Difference;
+      Largest = std::max( Largest, std::abs( int( i_rExpected[i] ) - int( i_rGot.GetData()[i] ) ) );
+      Sum += std::abs( int( i_rExpected[i] ) - int( i_rGot.GetData()[i] ) );
     }
-    Result.Mean = i_rExpected.empty() ? 0.0 : Sum / static_cast< double >( i_rExpected.size() );
-    return Result;
+    const double Mean = i_rExpected.empty() ? 0.0 : Sum / static_cast< double >( i_rExpected.size() );
+    if( Largest <= i_Largest && Mean <= i_Mean )
+      return ::testing::AssertionSuccess();
+    return ::testing::AssertionFailure() << "largest difference " << Largest << ", mean " << Mean;
   }
 
 #ifdef LUMEK_SEED_DIR

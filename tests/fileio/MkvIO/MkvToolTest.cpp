@@ -12,13 +12,10 @@ using namespace MkvTest;
 
 namespace
 {
-  int RunTool( const std::string& i_rCommand, const std::string& i_rFirst, const std::string& i_rSecond = "" )
+  int RunTool( const std::string& i_rArguments )
   {
     int ExitCode = -1;
-    LumekTest::RunCommand( LumekTest::ShellQuote( LUMEK_TOOL_PATH ) + " " + i_rCommand + " " +
-                               LumekTest::ShellQuote( i_rFirst ) +
-                               ( i_rSecond.empty() ? "" : " " + LumekTest::ShellQuote( i_rSecond ) ) + " 2>&1",
-                           &ExitCode );
+    RunCommand( ShellQuote( LUMEK_TOOL_PATH ) + " " + i_rArguments + " 2>&1", &ExitCode );
     return ExitCode;
   }
 
@@ -28,7 +25,7 @@ namespace
     const VTempFolder Folder;
     const std::string Input = Folder / "convert.mkv", Output = Folder / "converted.lvid";
     ASSERT_TRUE( WriteFamilyFile( Input, Case ) );
-    ASSERT_EQ( RunTool( "convert", Input, Output ), 0 );
+    ASSERT_EQ( RunTool( "convert " + ShellQuote( Input ) + " " + ShellQuote( Output ) ), 0 );
     LumekVideo::VReader Reader;
     ASSERT_TRUE( Reader.Open( Output ) );
     ASSERT_EQ( Reader.GetFrameCount(), static_cast< std::uint64_t >( Case.Frames ) );
@@ -52,7 +49,7 @@ namespace
   {
     const VTempFolder Folder;
     const std::string Output = Folder / "sample.mkv";
-    ASSERT_EQ( RunTool( "make-sample --width 32 --height 16 --frames 4 --fps 25", Output ), 0 );
+    ASSERT_EQ( RunTool( "make-sample --width 32 --height 16 --frames 4 --fps 25 " + ShellQuote( Output ) ), 0 );
     MkvIO::VMkvReader Reader;
     ASSERT_TRUE( Reader.Open( Output ) );
     EXPECT_EQ( Reader.GetFrameCount(), 4u );
@@ -61,6 +58,6 @@ namespace
     EXPECT_DOUBLE_EQ( Reader.GetVideoTiming().GetFrameRate(), 25.0 );
     EXPECT_EQ( Reader.GetAudioFrameInfo().SampleFormat, ZOL::AudioSampleFormat_Int16 );
     // A Bayer sample has no Matroska form: refused, not silently changed.
-    EXPECT_NE( RunTool( "make-sample --format BayerGB8 --frames 2", Output ), 0 );
+    EXPECT_NE( RunTool( "make-sample --format BayerGB8 --frames 2 " + ShellQuote( Output ) ), 0 );
   }
 } // namespace
