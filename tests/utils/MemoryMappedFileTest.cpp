@@ -75,6 +75,7 @@ namespace
     EXPECT_EQ( Across, std::vector< std::uint8_t >( &m_Bytes[s_Page - 1], &m_Bytes[s_Page + 1] ) );
     Stream.Close();
     EXPECT_TRUE( Log.Has( "VMemoryMappedInputStream stats: 5 swaps, 4 pages in file." ) );
+    ASSERT_EQ( Stream.Open( m_Path ), ZOL::Result_Ok ) << "open again, and closed on the way out";
   }
 
   // Another program cutting and regrowing the file while it is read: a cut can land between the
