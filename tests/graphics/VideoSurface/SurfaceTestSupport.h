@@ -9,7 +9,6 @@
 #include <gtest/gtest.h>
 
 #include <QImage>
-#include <QMarginsF>
 
 #include <algorithm>
 #include <cmath>
@@ -42,41 +41,37 @@ namespace SurfaceTest
   // The sides of a rectangle within i_Tolerance of the expected ones.
   inline ::testing::AssertionResult NearRect( const QRectF& i_rActual, const QRectF& i_rExpected, double i_Tolerance )
   {
-    const QMarginsF D( i_rActual.left() - i_rExpected.left(), i_rActual.top() - i_rExpected.top(),
-                       i_rActual.right() - i_rExpected.right(), i_rActual.bottom() - i_rExpected.bottom() );
-    if( std::max( { std::abs( D.left() ), std::abs( D.top() ), std::abs( D.right() ), std::abs( D.bottom() ) } ) <=
-        i_Tolerance )
+    const QRectF& A = i_rActual;
+    const QRectF& E = i_rExpected;
+    const double Off = std::max( { std::abs( A.left() - E.left() ), std::abs( A.top() - E.top() ),
+                                   std::abs( A.right() - E.right() ), std::abs( A.bottom() - E.bottom() ) } );
+    if( Off <= i_Tolerance )
       return ::testing::AssertionSuccess();
-    return ::testing::AssertionFailure() << "sides off by (" << D.left() << ", " << D.top() << ", " << D.right() << ", "
-                                         << D.bottom() << ")";
+    return ::testing::AssertionFailure() << "sides " << A.left() << ", " << A.top() << ", " << A.right() << ", "
+                                         << A.bottom() << " off by up to " << Off;
   }
 
   // A frame of random bytes; i_Fill, when not negative, sets every byte to it instead.
   ZOL::IVideoFrame RandomFrame( ZOL::EPixelFormat i_Format, int i_Width, int i_Height, std::uint32_t i_Seed = 1,
                                 int i_Fill = -1 );
-  // An 8-bit Bayer mosaic of a smooth colour picture, so that different demosaics agree closely.
-  ZOL::IVideoFrame SmoothBayerFrame( ZOL::EPixelFormat i_Format, int i_Width, int i_Height );
-
-  // The processor's picture of a frame (the converter to R8G8B8, or to R8G8B8u8 for planar YUV,
-  // which converts to the four-byte formats only).
+  // The processor's picture of a frame.
   QImage ProcessorPicture( const ZOL::IVideoFrame& i_rFrame );
   // The 5 by 5 demosaic of Malvar, He and Cutler on a mosaic (widened to 8 bits first if packed),
   // edges clamped, followed by gamma and saturation as the display applies them; computed here in
   // double precision.
   QImage MalvarPicture( const ZOL::IVideoFrame& i_rFrame, float i_Gamma = 1.0f, float i_Saturation = 1.0f );
 
-  // Compares the part of the picture at i_Origin with the expected one, leaving i_Inset pixels
-  // of the expected picture's border out. On a difference (or with LUMEK_SAVE_PICTURES set) both
-  // pictures are saved as PNG files named after the running test.
+  // Compares the part of the picture at i_Origin with the expected one, leaving the expected
+  // picture's outer pixels out. On a difference (or with LUMEK_SAVE_PICTURES set) both pictures
+  // are saved as PNG files named after the running test.
   ::testing::AssertionResult SamePicture( const QImage& i_rActual, const QImage& i_rExpected, QPoint i_Origin,
-                                          int i_Tolerance, int i_Inset = 1 );
+                                          int i_Tolerance );
 
   // The display tests: a shown widget of a fixed size, skipped when there is no display.
   class SurfaceDisplayTest : public ::testing::Test
   {
   protected:
-    // Room around a picture shown at 1:1, so that its border is seen.
-    static constexpr int Margin = 4;
+    static constexpr int Margin = 4; // room around a picture shown at 1:1, so that its border is seen
 
     void SetUp() override { LUMEK_REQUIRE_DISPLAY(); }
 
@@ -87,10 +82,9 @@ namespace SurfaceTest
                bool i_bNewWidget = true );
     // Paints the widget and reads its picture back, RGB only.
     QImage Grab() { return m_pWidget->grabFramebuffer().convertToFormat( QImage::Format_RGB32 ); }
-    // The widget's picture at 1:1 against the expected one.
-    ::testing::AssertionResult Shows( const QImage& i_rExpected, int i_Tolerance, int i_Inset = 1 )
+    ::testing::AssertionResult Shows( const QImage& i_rExpected, int i_Tolerance )
     {
-      return SamePicture( Grab(), i_rExpected, QPoint( Margin, Margin ), i_Tolerance, i_Inset );
+      return SamePicture( Grab(), i_rExpected, QPoint( Margin, Margin ), i_Tolerance );
     }
 
     std::unique_ptr< LumekVideoViewer::VGLWidget > m_pWidget;

@@ -84,22 +84,6 @@ namespace
     }
   }
 
-  TEST( DistortedBounds, SpreadUpAndLeftAndGrowWithBarrelDistortion )
-  {
-    // Ten points a side at steps of an eleventh: x reaches 0 + 9/11 of the width on the top
-    // side, and the union of (-1, -1) rectangles spreads everything by one pixel up and left.
-    EXPECT_TRUE( NearRect( DistortedBounds( QRectF( 0, 0, 110, 55 ), QVector2D( 0, 0 ), QVector3D() ),
-                           QRectF( QPointF( -1, -1 ), QPointF( 110, 55 ) ), 1e-4 ) );
-
-    // A positive k1 moves points away from the centre by a factor 1 + k1 r^2: the corner of a
-    // 100 by 100 square around the centre (r^2 = 5000) moves out by 5 % at k1 = 1e-5.
-    const double Far = 50 * 1.05;
-    EXPECT_TRUE( NearRect( DistortedBounds( QRectF( 50, 50, 100, 100 ), QVector2D( 100, 100 ), { 1e-5f, 0, 0 } ),
-                           QRectF( QPointF( 100 - Far - 1, 100 - Far - 1 ), QPointF( 100 + Far, 100 + Far ) ), 1e-3 ) );
-    const QPointF Corner = DistortPoint( QPointF( 150, 150 ), QVector2D( 100, 100 ), QVector3D( 1e-5f, 0, 0 ) );
-    EXPECT_NEAR( Corner.x(), 100 + 50 * ( 1 + 1e-5 * 5000 ), 1e-6 );
-  }
-
   TEST( VideoView, ScaleModesFollowTheImageOrStay )
   {
     const ZOL::IVideoFrameInfo Pixels = Geometry( 200, 100 );
@@ -162,15 +146,13 @@ namespace
       QVector2D Centre;
       bool ZoomDrag;
     } Cases[] = {
-        { "RightUpZooms", Qt::RightButton, QPoint( 100, 50 ), 1.5f, { 0.5f, 0.5f }, true },
-        { "RightFarUpStopsAtTwo", Qt::RightButton, QPoint( 100, -500 ), 2.0f, { 0.5f, 0.5f }, true },
+        // Dragging down a whole widget height and more stops the zoom at a fifth.
         { "RightFarDownStopsAtOneFifth", Qt::RightButton, QPoint( 100, 190 ), 0.2f, { 0.5f, 0.5f }, true },
         // A widget width of dragging moves the view by the whole sensor, whatever the zoom.
-        { "LeftPans", Qt::LeftButton, QPoint( 50, 75 ), 1.0f, { 0.75f, 0.75f }, false },
         { "MiddlePans", Qt::MiddleButton, QPoint( 150, 100 ), 1.0f, { 0.25f, 0.5f }, false },
         // The zoom step has already taken the position, so the pan finds nothing to move.
         { "RightAndMiddleOnlyZoom", Qt::RightButton | Qt::MiddleButton, QPoint( 100, 50 ), 1.5f, { 0.5f, 0.5f }, true },
-        { "LeftAndRightOnlyPan", Qt::LeftButton | Qt::RightButton, QPoint( 50, 100 ), 1.0f, { 0.75f, 0.5f }, false },
+        { "LeftAndRightOnlyPan", Qt::LeftButton | Qt::RightButton, QPoint( 50, 75 ), 1.0f, { 0.75f, 0.75f }, false },
     };
     for( const auto& rCase : Cases )
     {
