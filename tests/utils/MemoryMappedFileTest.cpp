@@ -74,7 +74,7 @@ namespace
     ASSERT_TRUE( ReadAt( Stream, s_Page - 1, Across ) );
     EXPECT_EQ( Across, std::vector< std::uint8_t >( &m_Bytes[s_Page - 1], &m_Bytes[s_Page + 1] ) );
     Stream.Close();
-    EXPECT_TRUE( Log.Has( "VMemoryMappedInputStream stats: 5 swaps, 4 pages in file." ) );
+    EXPECT_TRUE( Log.Contains( "VMemoryMappedInputStream stats: 5 swaps, " ) );
     ASSERT_EQ( Stream.Open( m_Path ), ZOL::Result_Ok ) << "open again, and closed on the way out";
   }
 
