@@ -108,15 +108,12 @@ namespace
       const std::uint8_t* pY = Planar.data() + Offset;
       const std::uint8_t* pU = pY + W * H;
       const std::uint8_t* pV = pU + W * H / 4;
-      VBytes Frame( W * H * 2 );
+      VBytes Frame;
       for( std::size_t y = 0; y < H; ++y )
         for( std::size_t x = 0; x < W; x += 2 )
         {
-          std::uint8_t* o = &Frame[( y * W + x ) * 2];
-          o[0] = pU[( y / 2 ) * ( W / 2 ) + x / 2];
-          o[1] = pY[y * W + x];
-          o[2] = pV[( y / 2 ) * ( W / 2 ) + x / 2];
-          o[3] = pY[y * W + x + 1];
+          const std::size_t C = ( y / 2 ) * ( W / 2 ) + x / 2;
+          Frame.insert( Frame.end(), { pU[C], pY[y * W + x], pV[C], pY[y * W + x + 1] } );
         }
       Frames.push_back( std::move( Frame ) );
     }
@@ -211,14 +208,9 @@ namespace
 
   TEST( BitStream, EmulationPreventionIsRemovedAndRestored )
   {
-    struct VCase
-    {
-      const char* Name;
-      VBytes Stored, Clean;
-      // What the writer makes of the clean bytes: it escapes only where the reader would drop.
-      VBytes Written;
-    };
-    const VCase Cases[] = {
+    // Stored, clean, and what the writer makes of the clean bytes: it escapes only where the
+    // reader would drop.
+    const std::tuple< const char*, VBytes, VBytes, VBytes > Cases[] = {
         { "FollowedByFourIsNoEscape", { 0, 0, 3, 4 }, { 0, 0, 3, 4 }, { 0, 0, 3, 3, 4 } },
         { "FollowedByOneIsAnEscape", { 0, 0, 3, 1, 7 }, { 0, 0, 1, 7 }, { 0, 0, 3, 1, 7 } },
         { "EscapeAtTheEnd", { 0, 0, 3, 1 }, { 0, 0, 1 }, { 0, 0, 1 } },
@@ -227,14 +219,14 @@ namespace
         { "EscapedThree", { 0, 0, 3, 3, 5 }, { 0, 0, 3, 5 }, { 0, 0, 3, 3, 5 } },
         { "NoZeroPair", { 0, 1, 3, 1 }, { 0, 1, 3, 1 }, { 0, 1, 3, 1 } },
     };
-    for( const VCase& rCase : Cases )
+    for( const auto& [pName, rStored, rClean, rWritten] : Cases )
     {
-      SCOPED_TRACE( rCase.Name );
-      EXPECT_EQ( Clean( rCase.Stored ), rCase.Clean );
+      SCOPED_TRACE( pName );
+      EXPECT_EQ( Clean( rStored ), rClean );
       VBytes Restored;
-      InsertEmulationPrevention( rCase.Clean.data(), rCase.Clean.size(), Restored );
-      EXPECT_EQ( Restored, rCase.Written );
-      EXPECT_EQ( Clean( Restored ), rCase.Clean );
+      InsertEmulationPrevention( rClean.data(), rClean.size(), Restored );
+      EXPECT_EQ( Restored, rWritten );
+      EXPECT_EQ( Clean( Restored ), rClean );
     }
   }
 
@@ -360,13 +352,12 @@ namespace
   TEST( DescribeNALUnit, NamesEachKindOfUnit )
   {
     std::ostringstream Text;
-    const VBytes Slice = { 0x41, 0x9A }; // non-IDR, first_mb 0, slice_type 5 (P)
-    DescribeNALUnit( Slice.data(), Slice.size(), Text, 2, std::nullopt );
-    // SEI with one pic_timing message of one byte and one unregistered message of one byte.
-    const VBytes SEI = { 0x06, 0x01, 0x01, 0x10, 0x05, 0x01, 0x77, 0x80 };
-    DescribeNALUnit( SEI.data(), SEI.size(), Text, 0, std::nullopt );
-    const VBytes Garbage = { 0x88 };
-    DescribeNALUnit( Garbage.data(), Garbage.size(), Text, 0, std::nullopt );
+    // A non-IDR slice (first_mb 0, slice_type 5, P), indented; an SEI with a pic_timing and an
+    // unregistered message of one byte each; a unit with the forbidden bit set.
+    for( const auto& [rUnit, Indent] :
+         { std::pair( VBytes{ 0x41, 0x9A }, 2 ),
+           std::pair( VBytes{ 0x06, 0x01, 0x01, 0x10, 0x05, 0x01, 0x77, 0x80 }, 0 ), std::pair( VBytes{ 0x88 }, 0 ) } )
+      DescribeNALUnit( rUnit.data(), rUnit.size(), Text, Indent, std::nullopt );
     EXPECT_EQ( Text.str(), "  CodedSliceNonIDR:\n"
                            "    Type: PSlice5\n"
                            "SEI:\n"

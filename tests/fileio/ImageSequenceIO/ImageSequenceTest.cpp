@@ -36,18 +36,14 @@ namespace
              0,    0,   40,  0,   0,    0,    30,   8,    2, 0, 0, 0,  0,   0,   0,   0 };
   }
 
-  // A descriptor of a 48 x 32 sequence at 25 frames a second with this pattern and count.
-  ImageSequenceIO::VDescriptor MakeDescriptor( const std::string& i_rPattern, std::uint32_t i_FrameCount,
-                                               std::uint32_t i_IndexPad = 8, std::uint32_t i_NumberPad = 8 )
+  // A descriptor of a 48 x 32 sequence at 25 frames a second: pattern, pad widths, frame count.
+  ImageSequenceIO::VDescriptor MakeDescriptor( const ImageSequenceIO::VSequenceInfo& i_rSequence )
   {
     ImageSequenceIO::VDescriptor Descriptor;
     Descriptor.FrameInfo = FrameInfo( 48, 32, ZOL::PixelFormat_R8G8B8 );
     Descriptor.FrameInfo.PixelAspectRatio = 1.0;
     Descriptor.Timing.FramePeriodInTicks = Descriptor.Timing.TicksPerSecond / 25;
-    Descriptor.Sequence.FileNamePattern = i_rPattern;
-    Descriptor.Sequence.FrameCount = i_FrameCount;
-    Descriptor.Sequence.FrameIndexPadWidth = i_IndexPad;
-    Descriptor.Sequence.FrameNumberPadWidth = i_NumberPad;
+    Descriptor.Sequence = i_rSequence;
     return Descriptor;
   }
 
@@ -110,7 +106,7 @@ namespace
       SCOPED_TRACE( rCase.Name );
       VTempFolder Folder;
       ImageSequenceIO::VDescriptor Descriptor =
-          MakeDescriptor( rCase.Pattern, rCase.FrameCount, rCase.IndexPad, rCase.NumberPad );
+          MakeDescriptor( { rCase.Pattern, rCase.IndexPad, rCase.NumberPad, rCase.FrameCount } );
       // 01:02:03:04 at 30 fps, frames at 60 Hz: every other frame is half a timecode frame on.
       if( std::string( rCase.Pattern ).find( "%TIMECODE%" ) != std::string::npos )
       {
@@ -158,7 +154,8 @@ namespace
   TEST( SequencePattern, ExtremeIndices )
   {
     VTempFolder Folder;
-    ASSERT_TRUE( WriteDescriptor( Folder / "g.lumekimagesequence", MakeDescriptor( "g%FRAME%.png", 4000000000u, 1 ) ) );
+    ASSERT_TRUE(
+        WriteDescriptor( Folder / "g.lumekimagesequence", MakeDescriptor( { "g%FRAME%.png", 1, 8, 4000000000u } ) ) );
     WriteWholeFile( Folder / "g5.png", "g5.png" );
     WriteWholeFile( Folder / "g3999999998.png", "g3999999998.png" );
     WriteWholeFile( Folder / "g4000000000.png", "beyond the count" );
@@ -224,7 +221,7 @@ namespace
 
     // An image without a readable size, or none at all, opens nothing.
     VTempFolder Folder;
-    WriteWholeFile( Folder / "bad_01.png", std::string( "not a png" ) );
+    WriteWholeFile( Folder / "bad_01.png", "not a png" );
     VImageSequenceReader Reader;
     for( const std::string& rPath :
          { Folder / "bad_01.png", Folder / "absent_01.png", std::string( "/no/such/x_01.png" ) } )
@@ -236,8 +233,8 @@ namespace
     VTempFolder Folder;
     for( const char* pFile : { "shot_0001.png", "shot_0002.png", "shot_0004.png" } )
       WriteWholeFile( Folder / pFile, PngHeader() );
-    ASSERT_TRUE(
-        WriteDescriptor( Folder / "shot.lumekimagesequence", MakeDescriptor( "shot_%FRAME_NUMBER%.png", 10, 8, 4 ) ) );
+    ASSERT_TRUE( WriteDescriptor( Folder / "shot.lumekimagesequence",
+                                  MakeDescriptor( { "shot_%FRAME_NUMBER%.png", 8, 4, 10 } ) ) );
     VImageSequenceReader Reader;
     ASSERT_TRUE( Reader.Open( Folder / "shot_0002.png" ) );
     EXPECT_EQ( std::tuple( Reader.GetDescriptorPath(), Reader.GetFrameCount(), Reader.GetVideoFrameInfo().ImageWidth,
@@ -245,7 +242,8 @@ namespace
                std::tuple( Folder / "shot.lumekimagesequence", 10u, 48, 25.0, 3u ) );
 
     // A descriptor of other files is not the run's.
-    ASSERT_TRUE( WriteDescriptor( Folder / "shot.lumekimagesequence", MakeDescriptor( "shot_%FRAME%.jpg", 10 ) ) );
+    ASSERT_TRUE(
+        WriteDescriptor( Folder / "shot.lumekimagesequence", MakeDescriptor( { "shot_%FRAME%.jpg", 8, 8, 10 } ) ) );
     ASSERT_TRUE( Reader.Open( Folder / "shot_0002.png" ) );
     EXPECT_EQ( std::tuple( Reader.GetDescriptorPath(), Reader.GetFrameCount(), Reader.GetVideoFrameInfo().ImageWidth ),
                std::tuple( "", 4u, 40 ) );
@@ -305,7 +303,7 @@ namespace
       const bool bGrey = std::string( pStored ) == "gray";
       VTempFolder Folder;
       const std::string Pattern = std::string( "take_%FRAME%" ) + pExtension;
-      ImageSequenceIO::VDescriptor Descriptor = MakeDescriptor( Pattern, 3, 4 );
+      ImageSequenceIO::VDescriptor Descriptor = MakeDescriptor( { Pattern, 4, 8, 3 } );
       Descriptor.Timecode = { ZOL::TimecodeStandard_25, 10 };
       ASSERT_TRUE( WriteDescriptor( Folder / "take_.lumekimagesequence", Descriptor ) );
       // Frame 1 is left out: a missing frame.
@@ -362,11 +360,9 @@ namespace
     for( const char* pPattern : { "t_%FRAME%.png", "t_%TIMECODE%.png" } )
     {
       SCOPED_TRACE( pPattern );
-      ImageSequenceIO::VDescriptor Descriptor = MakeDescriptor( pPattern, 3, 2, 2 );
+      ImageSequenceIO::VDescriptor Descriptor = MakeDescriptor( { pPattern, 2, 2, 3 } );
       if( std::string( pPattern ).find( "%TIMECODE%" ) != std::string::npos )
-      {
         Descriptor.Timecode = { ZOL::TimecodeStandard_30, 1 };
-      }
       ZOL::IVideoAttributes FrameKeys, Attributes;
       ASSERT_TRUE( ImageSequenceIO::MakeDescriptorStores( Descriptor, FrameKeys, Attributes ) );
       UtilsIO::VMemoryStream Stream;

@@ -18,42 +18,6 @@ using VBlock = MkvIO::VMkvBlock;
 
 namespace
 {
-  void ExpectReadsBack( const std::string& i_rPath, const VFamilyCase& i_rCase, const VBytes& i_rJPEG )
-  {
-    MkvIO::VMkvReader Reader;
-    ASSERT_TRUE( Reader.Open( i_rPath ) );
-    EXPECT_EQ( Reader.GetFrameCount(), static_cast< std::uint64_t >( i_rCase.Frames ) );
-    EXPECT_EQ( Reader.GetVideoPayload(), i_rCase.bJPEG ? ZOL::VideoPayload_ImageJPEG : ZOL::VideoPayload_Uncompressed );
-    const ZOL::IVideoFrameInfo& rVideo = Reader.GetVideoFrameInfo();
-    EXPECT_EQ( std::tie( rVideo.ImageWidth, rVideo.ImageHeight, rVideo.PixelFormat ),
-               std::tie( i_rCase.Width, i_rCase.Height, i_rCase.Format ) );
-    const ZOL::IAudioFrameInfo Audio = AudioInfo( i_rCase );
-    EXPECT_EQ( Reader.GetAudioPayload(), Audio.IsUsable() ? ZOL::AudioPayload_Uncompressed : ZOL::AudioPayload_None );
-    EXPECT_EQ( Reader.GetAudioFrameInfo(), Audio );
-    // The tags carry the timing, the timecode and the settings exactly.
-    EXPECT_EQ( Reader.GetVideoTiming(), s_Timing );
-    EXPECT_EQ( Reader.GetTimecode(), s_StartTimecode );
-    EXPECT_EQ( std::tie( Reader.GetVideoSettings().Saturation, Reader.GetVideoSettings().GammaCorrection ),
-               std::tuple( 0.75f, 1.25f ) );
-    std::string WritingApp;
-    EXPECT_TRUE( Reader.GetAttributes().Get( "Matroska.WritingApp", WritingApp ) && WritingApp == "LumekVideoViewer" );
-
-    for( int Frame = 0; Frame <= i_rCase.Frames; ++Frame )
-    {
-      std::shared_ptr< ZOL::IBuffer > pVideo;
-      ZOL::IAudioBuffers Blocks;
-      ASSERT_EQ( Reader.ReadFrameData( Frame, pVideo, Blocks, true, true ), Frame < i_rCase.Frames ) << Frame;
-      if( Frame == i_rCase.Frames )
-        break;
-      EXPECT_EQ( Bytes( pVideo ), i_rCase.bJPEG ? i_rJPEG : RawFrame( i_rCase, Frame ) ) << Frame;
-      ASSERT_EQ( Blocks.size(), Audio.IsUsable() ? 1u : 0u ) << Frame;
-      EXPECT_TRUE( Blocks.empty() || Bytes( Blocks[0] ) == AudioBlock( i_rCase, Frame ) ) << Frame;
-    }
-    EXPECT_TRUE( Reader.HasFrame( i_rCase.Frames - 1 ) && !Reader.HasFrame( i_rCase.Frames ) );
-    EXPECT_EQ( Reader.FindStoredFrameAtOrBefore( 1000 ), std::optional< std::uint64_t >( i_rCase.Frames - 1 ) );
-    EXPECT_EQ( Reader.FindStoredFrameAtOrAfter( i_rCase.Frames ), std::nullopt );
-  }
-
   // Each test writes its files as one path in a folder of its own.
   class MkvReader : public ::testing::Test
   {
@@ -84,7 +48,39 @@ namespace
     {
       SCOPED_TRACE( std::string( pFfmpegFormat ) + ( Case.bJPEG ? " JPEG " : " " ) + pAudioCodec );
       ASSERT_TRUE( WriteFamilyFile( Path, Case, JPEG ) );
-      ExpectReadsBack( Path, Case, JPEG );
+      MkvIO::VMkvReader Reader;
+      ASSERT_TRUE( Reader.Open( Path ) );
+      EXPECT_EQ( Reader.GetFrameCount(), static_cast< std::uint64_t >( Case.Frames ) );
+      EXPECT_EQ( Reader.GetVideoPayload(), Case.bJPEG ? ZOL::VideoPayload_ImageJPEG : ZOL::VideoPayload_Uncompressed );
+      const ZOL::IVideoFrameInfo& rVideo = Reader.GetVideoFrameInfo();
+      EXPECT_EQ( std::tie( rVideo.ImageWidth, rVideo.ImageHeight, rVideo.PixelFormat ),
+                 std::tie( Case.Width, Case.Height, Case.Format ) );
+      const ZOL::IAudioFrameInfo Audio = AudioInfo( Case );
+      EXPECT_EQ( Reader.GetAudioPayload(), Audio.IsUsable() ? ZOL::AudioPayload_Uncompressed : ZOL::AudioPayload_None );
+      EXPECT_EQ( Reader.GetAudioFrameInfo(), Audio );
+      // The tags carry the timing, the timecode and the settings exactly.
+      EXPECT_EQ( Reader.GetVideoTiming(), s_Timing );
+      EXPECT_EQ( Reader.GetTimecode(), s_StartTimecode );
+      EXPECT_EQ( std::tie( Reader.GetVideoSettings().Saturation, Reader.GetVideoSettings().GammaCorrection ),
+                 std::tuple( 0.75f, 1.25f ) );
+      std::string WritingApp;
+      EXPECT_TRUE( Reader.GetAttributes().Get( "Matroska.WritingApp", WritingApp ) &&
+                   WritingApp == "LumekVideoViewer" );
+
+      for( int Frame = 0; Frame <= Case.Frames; ++Frame )
+      {
+        std::shared_ptr< ZOL::IBuffer > pVideo;
+        ZOL::IAudioBuffers Blocks;
+        ASSERT_EQ( Reader.ReadFrameData( Frame, pVideo, Blocks, true, true ), Frame < Case.Frames ) << Frame;
+        if( Frame == Case.Frames )
+          break;
+        EXPECT_EQ( Bytes( pVideo ), Case.bJPEG ? JPEG : RawFrame( Case, Frame ) ) << Frame;
+        ASSERT_EQ( Blocks.size(), Audio.IsUsable() ? 1u : 0u ) << Frame;
+        EXPECT_TRUE( Blocks.empty() || Bytes( Blocks[0] ) == AudioBlock( Case, Frame ) ) << Frame;
+      }
+      EXPECT_TRUE( Reader.HasFrame( Case.Frames - 1 ) && !Reader.HasFrame( Case.Frames ) );
+      EXPECT_EQ( Reader.FindStoredFrameAtOrBefore( 1000 ), std::optional< std::uint64_t >( Case.Frames - 1 ) );
+      EXPECT_EQ( Reader.FindStoredFrameAtOrAfter( Case.Frames ), std::nullopt );
 
       // One audio block a frame.
       EXPECT_EQ( Ffprobe( Path, { "-count_frames", "-show_entries",
