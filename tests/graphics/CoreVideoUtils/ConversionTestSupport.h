@@ -39,25 +39,19 @@ namespace CoreVideoUtilsTest
     return Result;
   }
 
-  // Converts with a fresh converter; the target is sized for the format and starts as 0xCD.
-  inline bool Convert( const Bytes& i_rSource, std::int32_t i_Width, std::int32_t i_Height, ZOL::EPixelFormat i_From,
-                       ZOL::EPixelFormat i_To, Bytes& o_rTarget,
-                       EInstructionSet i_Set = CoreVideoUtils::BestInstructionSet(),
-                       const ZOL::IVideoSettings& i_rSettings = ZOL::IVideoSettings() )
+  // The frame converted by a fresh converter into a target that starts as 0xCD, or nothing when
+  // the conversion fails.
+  inline Bytes Converted( const Bytes& i_rSource, std::int32_t i_Width, std::int32_t i_Height, ZOL::EPixelFormat i_From,
+                          ZOL::EPixelFormat i_To, EInstructionSet i_Set = CoreVideoUtils::BestInstructionSet(),
+                          const ZOL::IVideoSettings& i_rSettings = ZOL::IVideoSettings() )
   {
-    o_rTarget.assign( CoreVideoUtils::FrameSizeInBytes( i_Width, i_Height, i_To ), 0xCD );
+    Bytes Target( CoreVideoUtils::FrameSizeInBytes( i_Width, i_Height, i_To ), 0xCD );
     CoreVideoUtils::VPixelFormatConverter Converter;
     Converter.SetInstructionSet( i_Set );
     Converter.SetVideoSettings( i_rSettings );
     return Converter.Convert( Info( i_Width, i_Height, i_From ), i_rSource.data(), i_rSource.size(), i_To,
-                              o_rTarget.data(), o_rTarget.size() );
-  }
-
-  // The converted frame, or nothing when the conversion fails.
-  inline Bytes MustConvert( const Bytes& i_rSource, std::int32_t i_Width, std::int32_t i_Height,
-                            ZOL::EPixelFormat i_From, ZOL::EPixelFormat i_To )
-  {
-    Bytes Result;
-    return Convert( i_rSource, i_Width, i_Height, i_From, i_To, Result ) ? Result : Bytes();
+                              Target.data(), Target.size() )
+               ? Target
+               : Bytes();
   }
 } // namespace CoreVideoUtilsTest

@@ -1,5 +1,6 @@
 // Tiny frames whose converted pixels were worked out by hand (or, for the YUV products, with a
-// calculator and checked against the floating-point constants to within one step).
+// calculator and checked against the floating-point constants to within one step), and the
+// vector forms held to the scalar rule's bytes on whole frames of random content.
 
 #include "ConversionTestSupport.h"
 
@@ -35,13 +36,11 @@ namespace
                            50, 60, 42, 25, 20, 70, 40, 25, 52, 80, 30, 90, 40 };
 
   // One 10-bit row of two pixels: U 360, Y 324, V 960, Y 580, padded to 48 pixels.
+  // Little-endian words: 0x3C051168 = V << 20 | Y << 10 | U, then Y alone.
   Bytes TenBitRow()
   {
-    Bytes Row( 128, 0 );
-    const std::uint32_t Words[2] = { 0x3C051168u, 580u };
-    for( int w = 0; w < 2; ++w )
-      for( int b = 0; b < 4; ++b )
-        Row[4 * w + b] = static_cast< std::uint8_t >( Words[w] >> ( 8 * b ) );
+    Bytes Row = { 0x68, 0x11, 0x05, 0x3C, 0x44, 0x02 };
+    Row.resize( 128 );
     return Row;
   }
 
@@ -110,11 +109,37 @@ namespace
   {
     for( const VHandCase& rCase : s_HandCases )
       for( const EInstructionSet Set : SupportedSets() )
-      {
-        Bytes Target;
-        ASSERT_TRUE( Convert( rCase.Source, rCase.Width, rCase.Height, rCase.From, rCase.To, Target, Set ) )
+        EXPECT_EQ( Converted( rCase.Source, rCase.Width, rCase.Height, rCase.From, rCase.To, Set ), rCase.Expected )
             << rCase.Name << " " << CoreVideoUtils::ToString( Set );
-        EXPECT_EQ( Target, rCase.Expected ) << rCase.Name << " " << CoreVideoUtils::ToString( Set );
+  }
+
+  TEST( VectorForms, EqualTheScalarRule )
+  {
+    const std::pair< EPixelFormat, EPixelFormat > Pairs[] = {
+        { PixelFormat_BayerRG8, PixelFormat_R8G8B8 },       { PixelFormat_BayerGB8, PixelFormat_R8G8B8 },
+        { PixelFormat_BayerGR8, PixelFormat_B8G8R8 },       { PixelFormat_BayerBG8, PixelFormat_R8G8B8u8 },
+        { PixelFormat_BayerGB7, PixelFormat_B8G8R8u8 },     { PixelFormat_BayerGB6, PixelFormat_Luminance8 },
+        { PixelFormat_U8Y8V8Y8, PixelFormat_R8G8B8 },       { PixelFormat_Y8U8Y8V8, PixelFormat_R8G8B8 },
+        { PixelFormat_PlanarY8U8V8, PixelFormat_R8G8B8u8 }, { PixelFormat_PlanarR8G8B8, PixelFormat_Luminance8 },
+        { PixelFormat_R5G6B5, PixelFormat_Luminance8 },
+    };
+    // Sizes that leave every kind of remainder of the vector widths.
+    const std::pair< int, int > Sizes[] = { { 1, 1 }, { 19, 2 }, { 101, 9 }, { 1921, 3 } };
+    // Gamma and saturation on, so that Bayer targets also run the colour correction's vector form.
+    ZOL::IVideoSettings Settings;
+    Settings.GammaCorrection = 1.7f;
+    Settings.Saturation = 0.6f;
+    for( const auto& [From, To] : Pairs )
+      for( const auto& [W, H] : Sizes )
+      {
+        const Bytes Source = RandomBytes( CoreVideoUtils::FrameSizeInBytes( W, H, From ), W * 31 + H );
+        const Bytes Scalar = Converted( Source, W, H, From, To, EInstructionSet::Scalar, Settings );
+        ASSERT_FALSE( Scalar.empty() );
+        for( const EInstructionSet Set : SupportedSets() )
+          ASSERT_EQ( Converted( Source, W, H, From, To, Set, Settings ), Scalar )
+              << CoreVideoUtils::ToString( Set ) << " " << ToString( From ) << " to " << ToString( To ) << " " << W
+              << "x" << H;
       }
   }
+
 } // namespace

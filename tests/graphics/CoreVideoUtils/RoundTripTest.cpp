@@ -40,12 +40,12 @@ namespace
         SCOPED_TRACE( std::string( ToString( rTrip.From ) ) + " via " + ToString( rTrip.Via ) + " " +
                       std::to_string( W ) + "x" + std::to_string( H ) );
         const Bytes Source = RandomBytes( CoreVideoUtils::FrameSizeInBytes( W, H, rTrip.From ), W * 7 + H );
-        const Bytes Via = MustConvert( Source, W, H, rTrip.From, rTrip.Via );
+        const Bytes Via = Converted( Source, W, H, rTrip.From, rTrip.Via );
         ASSERT_FALSE( Via.empty() );
         Bytes Expected = Source;
         for( std::size_t i = 0; i < Expected.size(); ++i )
           Expected[i] &= rTrip.Mask[i % rTrip.Step];
-        EXPECT_EQ( MustConvert( Via, W, H, rTrip.Via, rTrip.From ), Expected );
+        EXPECT_EQ( Converted( Via, W, H, rTrip.Via, rTrip.From ), Expected );
       }
   }
 
