@@ -263,6 +263,8 @@ TEST( AviIndex, EntriesBeyondTheFileFailOnlyTheirFrame )
   ASSERT_TRUE( Avi.bOpened );
   EXPECT_EQ( Avi.pReader->GetFrameCount(), 100u );
   EXPECT_TRUE( Avi.pReader->HasFrame( 99 ) );
+  EXPECT_EQ( Avi.pReader->FindStoredFrameAtOrAfter( 99 ), std::optional< std::uint64_t >( 99 ) );
+  EXPECT_FALSE( Avi.pReader->FindStoredFrameAtOrAfter( 100 ) );
   EXPECT_EQ( ReadVideo( *Avi.pReader, 89 ), VBytes( 32, 90 ) );
   for( std::uint64_t Frame = 90; Frame < 100; ++Frame )
     EXPECT_TRUE( ReadVideo( *Avi.pReader, Frame ).empty() ) << Frame;
