@@ -63,10 +63,7 @@ namespace
   // every stage compiles, is in one pair, and each pair links once.
   TEST_F( ShaderResourcesTest, EveryStageCompilesAndEveryProgramLinks )
   {
-    LumekTest::VLogCapture Log( "CoreGraphics" );
-    VResources Resources( false, QDir::currentPath() );
-    Resources.Load();
-    EXPECT_FALSE( Log.Contains( "Failed" ) );
+    VResources& Resources = *m_pResources;
     // Each vertex stage, then the fragment stages it is linked with.
     const char* const Programs[] = { "Video VideoRaw VideoBayer VideoLuminance VideoYUV UniformColour ImageSet",
                                      "Simple UniformColour",

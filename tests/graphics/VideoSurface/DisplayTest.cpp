@@ -20,23 +20,9 @@
 namespace
 {
   using namespace SurfaceTest;
-  using LumekVideoViewer::Hardware;
+  using Hardware;
+  using VGLWidget;
   using LumekVideoViewer::Software;
-  using LumekVideoViewer::VGLWidget;
-
-  int Clamp8( double i_Value )
-  {
-    return int( std::lround( std::clamp( i_Value, 0.0, 255.0 ) ) );
-  }
-
-  // The colours of the mosaic's 2 by 2 tile, row by row; BayerGB8 for its packed forms too.
-  const char* BayerTile( ZOL::EPixelFormat i_Format )
-  {
-    return i_Format == ZOL::PixelFormat_BayerRG8   ? "RGGB"
-           : i_Format == ZOL::PixelFormat_BayerGR8 ? "GRBG"
-           : i_Format == ZOL::PixelFormat_BayerBG8 ? "BGGR"
-                                                   : "GBRG";
-  }
 
   std::vector< std::uint8_t > Convert( const ZOL::IVideoFrame& i_rFrame, ZOL::EPixelFormat i_To )
   {
@@ -88,6 +74,11 @@ namespace
         Format == ZOL::PixelFormat_BayerGB7 || Format == ZOL::PixelFormat_BayerGB6
             ? Convert( i_rFrame, ZOL::PixelFormat_BayerGB8 )
             : std::vector< std::uint8_t >( pData, pData + W * H );
+    // The colours of the mosaic's 2 by 2 tile, row by row; BayerGB8 for its packed forms too.
+    const char* pTile = Format == ZOL::PixelFormat_BayerRG8   ? "RGGB"
+                        : Format == ZOL::PixelFormat_BayerGR8 ? "GRBG"
+                        : Format == ZOL::PixelFormat_BayerBG8 ? "BGGR"
+                                                              : "GBRG";
     auto P = [&]( int x, int y ) { return Mosaic[std::clamp( y, 0, H - 1 ) * W + std::clamp( x, 0, W - 1 )] / 255.0; };
     auto Channel = []( char i_Colour ) { return i_Colour == 'R' ? 0 : i_Colour == 'G' ? 1 : 2; };
     QImage Picture( W, H, QImage::Format_RGB32 );
@@ -100,8 +91,8 @@ namespace
         const double FarHorizontal = P( x - 2, y ) + P( x + 2, y ), FarVertical = P( x, y - 2 ) + P( x, y + 2 );
         const double Far = FarHorizontal + FarVertical;
         // The site's own colour, and the other colour of its row.
-        const char Site = BayerTile( Format )[( y & 1 ) * 2 + ( x & 1 )];
-        const char Beside = BayerTile( Format )[( y & 1 ) * 2 + ( ~x & 1 )];
+        const char Site = pTile[( y & 1 ) * 2 + ( x & 1 )];
+        const char Beside = pTile[( y & 1 ) * 2 + ( ~x & 1 )];
         double Colour[3];
         Colour[Channel( Site )] = C;
         if( Site == 'G' ) // each chroma from the neighbours in its row, or in its column
@@ -121,7 +112,9 @@ namespace
           Grey += std::max( rValue, 0.0 ) / 3;
         }
         const double Amount = std::min( 1.0 - i_Saturation, 1.0 );
-        auto Shown = [&]( int i ) { return Clamp8( ( Colour[i] + ( Grey - Colour[i] ) * Amount ) * 255.0 ); };
+        auto Shown = [&]( int i ) {
+          return int( std::lround( std::clamp( ( Colour[i] + ( Grey - Colour[i] ) * Amount ) * 255.0, 0.0, 255.0 ) ) );
+        };
         Picture.setPixel( x, y, qRgb( Shown( 0 ), Shown( 1 ), Shown( 2 ) ) );
       }
     return Picture;
@@ -168,9 +161,9 @@ namespace
 
     void SetUp() override { LUMEK_REQUIRE_DISPLAY(); }
 
-    LumekVideoViewer::VGLWidget& MakeWidget( int i_Width, int i_Height )
+    VGLWidget& MakeWidget( int i_Width, int i_Height )
     {
-      m_pWidget = std::make_unique< LumekVideoViewer::VGLWidget >();
+      m_pWidget = std::make_unique< VGLWidget >();
       m_pWidget->setFixedSize( i_Width, i_Height );
       m_pWidget->show();
       EXPECT_TRUE( QTest::qWaitForWindowExposed( m_pWidget.get() ) );
@@ -178,7 +171,7 @@ namespace
     }
     // A widget Margin larger than the frame on each side, showing it at 1:1; a new one, or the
     // last one resized, as the viewer's widget is given frames of one format after another.
-    void Show( const ZOL::IVideoFrame& i_rFrame, LumekVideoViewer::EDecoder i_Decoder = LumekVideoViewer::Hardware,
+    void Show( const ZOL::IVideoFrame& i_rFrame, LumekVideoViewer::EDecoder i_Decoder = Hardware,
                bool i_bNewWidget = true )
     {
       const ZOL::IVideoFrameInfo& rInfo = i_rFrame.VideoFrameInfo;
@@ -190,7 +183,7 @@ namespace
         MakeWidget( Size.width(), Size.height() );
       m_pWidget->SetScaleMode( LumekVideoViewer::ScaleOneToOne );
       // A new widget starts in Hardware mode, as the viewer's does.
-      if( bReuse || i_Decoder != LumekVideoViewer::Hardware )
+      if( bReuse || i_Decoder != Hardware )
         m_pWidget->SetDecoder( i_Decoder );
       m_pWidget->PrepareFrame( 0, rInfo, i_rFrame, false );
     }
@@ -201,7 +194,7 @@ namespace
       return SamePicture( Grab(), i_rExpected, QPoint( Margin, Margin ), i_Tolerance );
     }
 
-    std::unique_ptr< LumekVideoViewer::VGLWidget > m_pWidget;
+    std::unique_ptr< VGLWidget > m_pWidget;
   };
 
   using PixelFormatDisplayTest = SurfaceDisplayTest;
