@@ -20,9 +20,9 @@
 namespace
 {
   using namespace SurfaceTest;
-  using Hardware;
-  using VGLWidget;
+  using LumekVideoViewer::Hardware;
   using LumekVideoViewer::Software;
+  using LumekVideoViewer::VGLWidget;
 
   std::vector< std::uint8_t > Convert( const ZOL::IVideoFrame& i_rFrame, ZOL::EPixelFormat i_To )
   {
