@@ -79,10 +79,7 @@ namespace
       const Bytes Displayed =
           Converted( Source, W, H, rCase.From, rCase.To, CoreVideoUtils::BestInstructionSet(), Display );
       ASSERT_FALSE( Plain.empty() || Displayed.empty() );
-      if( rCase.bCorrected )
-      {
-        ASSERT_TRUE( Corrector.Apply( W, H, rCase.To, Plain.data() ) );
-      }
+      ASSERT_TRUE( !rCase.bCorrected || Corrector.Apply( W, H, rCase.To, Plain.data() ) );
       EXPECT_EQ( Displayed, Plain ) << ToString( rCase.From ) << " to " << ToString( rCase.To );
       if( rCase.To != PixelFormat_R8G8B8u8 )
         continue;

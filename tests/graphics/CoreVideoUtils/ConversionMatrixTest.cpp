@@ -221,12 +221,12 @@ namespace
     return ( i_rStream[i / 8] >> ( 7 - i % 8 ) ) & 1u;
   }
 
-  // The packed forms' second method: samples read and written one bit at a time. Runs start and
-  // end inside a byte, and one is too short for a whole group of the stream's 8-byte reads.
+  // The packed forms' second method: samples read and written one bit at a time. Runs start on a
+  // byte and inside one; a lone sample ends before the first whole group of eight.
   TEST( PackedSamples, UnpackAndPackMatchTheBitByBitRule )
   {
     for( unsigned Bits : { 6u, 7u } )
-      for( const auto& [First, Count] : { std::make_pair( 0, 8 ), std::make_pair( 5, 1001 ), std::make_pair( 13, 9 ) } )
+      for( const auto& [First, Count] : { std::make_pair( 0, 33 ), std::make_pair( 5, 1 ), std::make_pair( 5, 1001 ) } )
       {
         SCOPED_TRACE( std::to_string( Bits ) + " bits, first " + std::to_string( First ) + ", count " +
                       std::to_string( Count ) );
