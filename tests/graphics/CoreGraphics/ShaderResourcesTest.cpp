@@ -116,13 +116,11 @@ namespace
       return Directory.filePath( i_rName );
     };
     const QString BrokenPath = Write( "Broken.glsl", "void main() { gl_FragColor = undeclared; }\n" );
-    {
-      LumekTest::VLogCapture Log( "CoreGraphics" );
-      m_pResources->AddShaderFile( "Broken", BrokenPath, VShader::Kind_Fragment );
-      m_pResources->AddShaderFile( "Absent", Directory.filePath( "Absent.glsl" ), VShader::Kind_Fragment );
-      EXPECT_TRUE( Log.Contains( "Shader Failed To Compile<" + BrokenPath.toStdString() + "> Log=<" ) );
-      EXPECT_TRUE( Log.Contains( "Failed to open " + Directory.filePath( "Absent.glsl" ).toStdString() ) );
-    }
+    LumekTest::VLogCapture Log( "CoreGraphics" );
+    m_pResources->AddShaderFile( "Broken", BrokenPath, VShader::Kind_Fragment );
+    m_pResources->AddShaderFile( "Absent", Directory.filePath( "Absent.glsl" ), VShader::Kind_Fragment );
+    EXPECT_TRUE( Log.Contains( "Shader Failed To Compile<" + BrokenPath.toStdString() + "> Log=<" ) );
+    EXPECT_TRUE( Log.Contains( "Failed to open " + Directory.filePath( "Absent.glsl" ).toStdString() ) );
     for( const char* pFragment : { "Broken", "Absent" } )
       EXPECT_EQ( m_pResources->GetProgram( "Video", pFragment ), nullptr ) << pFragment;
     EXPECT_EQ( m_pResources->GetProgram( "NoSuchStage", "VideoRaw" ), nullptr );
