@@ -42,7 +42,6 @@ namespace
       QSize Sensor;
     } Cases[] = {
         { "FillsTheSensor", Geometry( 64, 48 ), QRectF( 0, 0, 64, 48 ), QSize( 64, 48 ) },
-        { "Offset", Geometry( 20, 10, 10, 6 ), QRectF( 5, 3, 20, 10 ), QSize( 30, 16 ) },
         // An odd twice-offset states a half pixel.
         { "HalfPixel", Geometry( 20, 10, 3, 0 ), QRectF( 1.5, 0, 20, 10 ), QSize( 23, 10 ) },
         // Binned by two: each image pixel covers two sensor pixels.
