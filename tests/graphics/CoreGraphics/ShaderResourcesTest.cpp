@@ -24,6 +24,7 @@
 
 namespace
 {
+  using CoreGraphics::MurmurHash3_32;
   using CoreGraphics::VResources;
   using CoreGraphics::VShader;
   using CoreGraphics::VShaderProgram;
@@ -63,7 +64,6 @@ namespace
   // every stage compiles, is in one pair, and each pair links once.
   TEST_F( ShaderResourcesTest, EveryStageCompilesAndEveryProgramLinks )
   {
-    VResources& Resources = *m_pResources;
     // Each vertex stage, then the fragment stages it is linked with.
     const char* const Programs[] = { "Video VideoRaw VideoBayer VideoLuminance VideoYUV UniformColour ImageSet",
                                      "Simple UniformColour",
@@ -84,20 +84,19 @@ namespace
       for( const QString& rFragment : Stages.mid( 1 ) )
       {
         Fragment.insert( rFragment );
-        std::shared_ptr< VShaderProgram > pLinked = Resources.GetProgram( Stages[0], rFragment );
+        std::shared_ptr< VShaderProgram > pLinked = m_pResources->GetProgram( Stages[0], rFragment );
         EXPECT_TRUE( pLinked && pLinked->IsLinked() ) << pProgram << " " << rFragment.toStdString();
-        EXPECT_EQ( Resources.GetProgram( Stages[0], rFragment ), pLinked ) << "a pair is linked once";
+        EXPECT_EQ( m_pResources->GetProgram( Stages[0], rFragment ), pLinked ) << "a pair is linked once";
       }
     }
-    EXPECT_EQ( Resources.GetShaderNames( VShader::Kind_Vertex ), QStringList( Vertex.begin(), Vertex.end() ) );
-    EXPECT_EQ( Resources.GetShaderNames( VShader::Kind_Fragment ), QStringList( Fragment.begin(), Fragment.end() ) );
+    EXPECT_EQ( m_pResources->GetShaderNames( VShader::Kind_Vertex ), QStringList( Vertex.begin(), Vertex.end() ) );
+    EXPECT_EQ( m_pResources->GetShaderNames( VShader::Kind_Fragment ),
+               QStringList( Fragment.begin(), Fragment.end() ) );
 
     // Uniforms are found by name and by the hash of the name.
-    const std::shared_ptr< VShaderProgram > pVideo = Resources.GetProgram( "Video", "VideoBayer" );
+    const std::shared_ptr< VShaderProgram > pVideo = m_pResources->GetProgram( "Video", "VideoBayer" );
     for( const char* pName : { "u_View2D", "u_FirstRed", "t_DiffuseTexture", "u_NotThere" } )
-      EXPECT_EQ( pVideo->UniformLocationByHash( CoreGraphics::MurmurHash3_32( pName ) ),
-                 pVideo->UniformLocation( pName ) )
-          << pName;
+      EXPECT_EQ( pVideo->UniformLocationByHash( MurmurHash3_32( pName ) ), pVideo->UniformLocation( pName ) ) << pName;
     EXPECT_GE( pVideo->UniformLocation( "u_FirstRed" ), 0 );
     EXPECT_EQ( pVideo->UniformLocation( "u_NotThere" ), -1 );
   }

@@ -1,9 +1,8 @@
-// The processor's conversions: tiny frames whose converted pixels were worked out by hand (or,
-// for the YUV products, with a calculator and checked against the floating-point constants to
-// within one step); the vector forms held to the scalar rule's bytes; which pairs of formats
-// convert and what bad sizes do; the conversions defined as compositions of others; 4:2:0 planes
-// packed to 4:2:2; round trips that lose exactly the bits the narrower format cannot hold; and the
-// colour corrector.
+// The processor's conversions: tiny frames converted by hand (the YUV products with a calculator,
+// checked against the floating-point constants to within one step), the vector forms against the
+// scalar rule, the pairs that convert and what bad sizes do, compositions, 4:2:0 planes packed to
+// 4:2:2, round trips that lose exactly the bits the narrower format cannot hold, and the colour
+// corrector.
 
 #include "graphics/CoreVideoUtils/DisplayConversion.h"
 #include "graphics/CoreVideoUtils/PixelFormatConverter.h"
@@ -96,12 +95,12 @@ namespace
 
   // One 10-bit row of two pixels: U 360, Y 324, V 960, Y 580, padded to 48 pixels.
   // Little-endian words: 0x3C051168 = V << 20 | Y << 10 | U, then Y alone.
-  Bytes TenBitRow()
+  const Bytes s_TenBitRow = []
   {
     Bytes Row = { 0x68, 0x11, 0x05, 0x3C, 0x44, 0x02 };
     Row.resize( 128 );
     return Row;
-  }
+  }();
 
   // clang-format off
   const VHandCase s_HandCases[] = {
@@ -148,8 +147,8 @@ namespace
       { "U8Y8V8Y8_to_Luminance8", 2, 1, PixelFormat_U8Y8V8Y8, { 90, 81, 240, 145 }, PixelFormat_Luminance8,
         { 81, 145 } },
       { "U8Y8V8Y8_to_U10Y10V10Y10", 2, 1, PixelFormat_U8Y8V8Y8, { 90, 81, 240, 145 }, PixelFormat_U10Y10V10Y10,
-        TenBitRow() },
-      { "U10Y10V10Y10_to_R8G8B8", 2, 1, PixelFormat_U10Y10V10Y10, TenBitRow(), PixelFormat_R8G8B8,
+        s_TenBitRow },
+      { "U10Y10V10Y10_to_R8G8B8", 2, 1, PixelFormat_U10Y10V10Y10, s_TenBitRow, PixelFormat_R8G8B8,
         { 238, 14, 13, 255, 78, 77 } },
       { "Luminance7_to_Luminance8", 8, 1, PixelFormat_Luminance7, { 0x02, 0x08, 0x18, 0x40, 0xA1, 0x83, 0x88 },
         PixelFormat_Luminance8, { 2, 4, 6, 8, 10, 12, 14, 16 } },
@@ -311,8 +310,7 @@ namespace
     Converter.SetLensDistortionCorrectionEnabled( false );
     EXPECT_TRUE( Log.Lines().empty() );
     Converter.SetLensDistortionCorrectionEnabled( true );
-    Converter.SetLensDistortionCalibration( CoreLumekTypes::VCameraHardware(),
-                                            CoreLumekTypes::VLensDistortionCalibration() );
+    Converter.SetLensDistortionCalibration( {}, {} );
     EXPECT_EQ( Log.Lines(),
                std::vector< std::string >( 2, "3 Lens distortion correction not supported in software converter." ) );
   }

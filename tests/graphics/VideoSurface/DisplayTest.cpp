@@ -184,7 +184,6 @@ namespace
         m_pWidget->SetDecoder( i_Decoder );
       m_pWidget->PrepareFrame( 0, rInfo, i_rFrame, false );
     }
-    // Paints the widget and reads its picture back, RGB only.
     QImage Grab() { return m_pWidget->grabFramebuffer().convertToFormat( QImage::Format_RGB32 ); }
     ::testing::AssertionResult Shows( const QImage& i_rExpected, int i_Tolerance )
     {
@@ -294,9 +293,8 @@ namespace
       QImage Twice = Plain.convertToFormat( QImage::Format_RGB888 );
       CoreVideoUtils::VColourCorrector Corrector;
       Corrector.Set( Settings );
-      for( int Time = 0; Time < 2; ++Time )
-        for( int y = 0; y < Twice.height(); ++y )
-          Corrector.Apply( Twice.width(), 1, PixelFormat_R8G8B8, Twice.scanLine( y ) );
+      for( int Time = 0; Time < 2; ++Time ) // rows of 120 bytes, so the lines lie end to end
+        Corrector.Apply( Twice.width(), Twice.height(), PixelFormat_R8G8B8, Twice.bits() );
       EXPECT_TRUE( Shows( Twice, 0 ) );
     }
 
