@@ -412,12 +412,6 @@ namespace ZOL
     return true;
   }
 
-  void IVideoAttributes::Merge( const IVideoAttributes& i_rOther )
-  {
-    for( const auto& rEntry : i_rOther.m_Values )
-      m_Values[rEntry.first] = rEntry.second;
-  }
-
   bool IVideoAttributes::WriteTo( IOutputStream& i_rStream ) const
   {
     if( m_Values.size() > std::numeric_limits< std::uint32_t >::max() )

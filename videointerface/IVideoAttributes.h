@@ -99,8 +99,6 @@ namespace ZOL
     bool operator!=( const IVideoAttributes& i_rOther ) const { return !( *this == i_rOther ); }
     // Every entry of the other store is here with an equal value.
     bool ContainsAllOf( const IVideoAttributes& i_rOther ) const;
-    // Copies every entry of the other store here, replacing equal keys.
-    void Merge( const IVideoAttributes& i_rOther );
 
     // The serial form: a count, then key length, key, tag and value for each entry in map order.
     [[nodiscard]] bool WriteTo( IOutputStream& i_rStream ) const;
