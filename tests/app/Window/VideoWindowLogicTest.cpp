@@ -105,6 +105,19 @@ TEST( Timebar, TickIntervalGuardsAnEmptyFile )
     EXPECT_EQ( TimebarTickInterval( 700, Frames ), Interval ) << Frames;
 }
 
+// An offset needs a sensor to place it on; gamma and saturation act on raw Bayer frames only.
+TEST( Surface, OffsetsNeedASensorAndSettingsNeedRawBayer )
+{
+  ZOL::IVideoFrameInfo File;
+  File.TwiceOffsetX = 6;
+  File.TwiceOffsetY = 4;
+  EXPECT_EQ( SurfaceGeometry( File, {} ).TwiceOffsetX, 0 );
+  EXPECT_EQ( SurfaceGeometry( File, { "", "", "", "", 64, 48, 1.0 } ).TwiceOffsetY, 4 );
+  EXPECT_TRUE( HasDisplaySettings( ZOL::VideoPayload_Uncompressed, ZOL::PixelFormat_BayerGB8 ) );
+  EXPECT_FALSE( HasDisplaySettings( ZOL::VideoPayload_ImageJPEG, ZOL::PixelFormat_BayerGB8 ) );
+  EXPECT_FALSE( HasDisplaySettings( ZOL::VideoPayload_Uncompressed, ZOL::PixelFormat_R8G8B8 ) );
+}
+
 // The sample layout, rate and channels follow the file, and the rest stays the device's; only
 // the first block of a frame with usable sound is written.
 TEST( AudioOutput, FormatAndBlockFollowTheFile )

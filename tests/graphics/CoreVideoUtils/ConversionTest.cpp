@@ -150,6 +150,8 @@ namespace
         s_TenBitRow },
       { "U10Y10V10Y10_to_R8G8B8", 2, 1, PixelFormat_U10Y10V10Y10, s_TenBitRow, PixelFormat_R8G8B8,
         { 238, 14, 13, 255, 78, 77 } },
+      { "U10Y10V10Y10_to_Luminance8", 2, 1, PixelFormat_U10Y10V10Y10, s_TenBitRow, PixelFormat_Luminance8,
+        { 81, 145 } },
       { "Luminance7_to_Luminance8", 8, 1, PixelFormat_Luminance7, { 0x02, 0x08, 0x18, 0x40, 0xA1, 0x83, 0x88 },
         PixelFormat_Luminance8, { 2, 4, 6, 8, 10, 12, 14, 16 } },
       { "Luminance6_to_R8G8B8", 4, 1, PixelFormat_Luminance6, { 0x04, 0x20, 0xC4 }, PixelFormat_R8G8B8,
