@@ -84,7 +84,7 @@ namespace
                         i_Height,
                         {} };
     // Each access unit starts at its delimiter (type 9), which stays in the unit.
-    for( const VBytes& rUnit : SplitNALUnits( ReadWholeFile( Stream.Path ) ) )
+    for( const VBytes& rUnit : SplitNALUnits( ReadFileBytes( Stream.Path ) ) )
     {
       if( rUnit.empty() )
         continue;

@@ -74,7 +74,7 @@ namespace
       const VParse Result = Parse( Bytes );
       EXPECT_TRUE( Result.bResult ) << pGolden;
       UtilsIO::VMemoryInputStream Stream( Bytes.data(), Bytes.size() );
-      const VBytes Expected = ReadWholeFile( std::string( JPEG_GOLDEN_FOLDER ) + "/" + pGolden );
+      const VBytes Expected = ReadFileBytes( std::string( JPEG_GOLDEN_FOLDER ) + "/" + pGolden );
       EXPECT_EQ( JPEGUtils::DumpJPEG( Result.Segments, Stream ), std::string( Expected.begin(), Expected.end() ) );
     }
   }
@@ -198,7 +198,7 @@ namespace
     for( const auto& [pPlanes, Width, Height] : Sources )
     {
       const std::string Path = MakeJPEG( pPlanes, Width, Height );
-      const VBytes JPEG = ReadWholeFile( Path );
+      const VBytes JPEG = ReadFileBytes( Path );
       ASSERT_FALSE( JPEG.empty() ) << Path;
       const VBytes Planes = FfmpegDecode( Path, pPlanes );
       const bool b420 = std::string( pPlanes ) == "yuvj420p", bPacked422 = !b420 && Width % 2 == 0;
@@ -373,7 +373,7 @@ namespace
       // The container declares the frame as its colour format; a grey image delivers less.
       IVideoFrameInfo Info = FrameInfo( Width, Height, PixelFormat_R8G8B8 );
       std::shared_ptr< IBuffer > pFrame;
-      const bool bDecoded = DecodeFrame( Payload, ReadWholeFile( Path ), Info, pFrame );
+      const bool bDecoded = DecodeFrame( Payload, ReadFileBytes( Path ), Info, pFrame );
       if( Delivered == PixelFormat_Unspecified )
       {
         EXPECT_FALSE( bDecoded );

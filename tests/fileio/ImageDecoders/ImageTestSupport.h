@@ -4,6 +4,7 @@
 // a temporary folder, the bytes of a buffer, the distance between two pictures, the committed
 // seeds and the frame a container would declare.
 
+#include "tests/support/Files.h"
 #include "tests/support/LogCapture.h"
 #include "videointerface/BufferAllocators.h"
 #include "videointerface/IVideoFrameInfo.h"
@@ -23,24 +24,6 @@ namespace LumekTest
   inline std::shared_ptr< ZOL::IBufferAllocator > MakeFrameAllocator()
   {
     return std::make_shared< ZOL::VFrameBufferAllocator >();
-  }
-
-  inline VBytes ReadWholeFile( const std::string& i_rPath )
-  {
-    std::ifstream File( i_rPath, std::ios::binary );
-    return VBytes( std::istreambuf_iterator< char >( File ), std::istreambuf_iterator< char >() );
-  }
-
-  inline bool WriteWholeFile( const std::string& i_rPath, const VBytes& i_rBytes )
-  {
-    std::ofstream File( i_rPath, std::ios::binary | std::ios::trunc );
-    File.write( reinterpret_cast< const char* >( i_rBytes.data() ), static_cast< std::streamsize >( i_rBytes.size() ) );
-    return File.good();
-  }
-
-  inline bool WriteWholeFile( const std::string& i_rPath, const std::string& i_rText )
-  {
-    return WriteWholeFile( i_rPath, VBytes( i_rText.begin(), i_rText.end() ) );
   }
 
   // The bytes cut at i_Position when i_Flip is zero, else whole with the byte there XORed with it.
@@ -103,7 +86,7 @@ namespace LumekTest
   // A file of the committed fuzz seeds, by its path below fuzz/seeds.
   inline VBytes Seed( const std::string& i_rName )
   {
-    return ReadWholeFile( std::string( LUMEK_SEED_DIR ) + "/" + i_rName );
+    return ReadFileBytes( std::string( LUMEK_SEED_DIR ) + "/" + i_rName );
   }
 #endif
 

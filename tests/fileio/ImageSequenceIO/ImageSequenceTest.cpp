@@ -116,7 +116,7 @@ namespace
       ASSERT_TRUE(
           WriteDescriptor( Folder / ( std::string( rCase.Descriptor ) + ".lumekimagesequence" ), Descriptor ) );
       for( const std::string& rFile : Words( rCase.Files ) )
-        WriteWholeFile( Folder / rFile, rFile );
+        WriteFileBytes( Folder / rFile, rFile );
       const std::string Opened = Folder / rCase.Opened;
       // Names with a placeholder choose the sequence reader, whether or not they then open.
       if( Opened.find( "%FRAME" ) != std::string::npos )
@@ -156,9 +156,9 @@ namespace
     VTempFolder Folder;
     ASSERT_TRUE(
         WriteDescriptor( Folder / "g.lumekimagesequence", MakeDescriptor( { "g%FRAME%.png", 1, 8, 4000000000u } ) ) );
-    WriteWholeFile( Folder / "g5.png", "g5.png" );
-    WriteWholeFile( Folder / "g3999999998.png", "g3999999998.png" );
-    WriteWholeFile( Folder / "g4000000000.png", "beyond the count" );
+    WriteFileBytes( Folder / "g5.png", "g5.png" );
+    WriteFileBytes( Folder / "g3999999998.png", "g3999999998.png" );
+    WriteFileBytes( Folder / "g4000000000.png", "beyond the count" );
     VImageSequenceReader Reader;
     ASSERT_TRUE( Reader.Open( Folder / "g.lumekimagesequence" ) );
     using VFound = std::optional< std::uint64_t >;
@@ -204,7 +204,7 @@ namespace
       SCOPED_TRACE( rCase.Name );
       VTempFolder Folder;
       for( const std::string& rFile : Words( rCase.Files ) )
-        WriteWholeFile( Folder / rFile, PngHeader() );
+        WriteFileBytes( Folder / rFile, PngHeader() );
       const auto pReader = CreateVideoReader( Folder / rCase.Opened );
       auto* pSequence = dynamic_cast< VImageSequenceReader* >( pReader.get() );
       ASSERT_TRUE( pSequence );
@@ -221,7 +221,7 @@ namespace
 
     // An image without a readable size, or none at all, opens nothing.
     VTempFolder Folder;
-    WriteWholeFile( Folder / "bad_01.png", "not a png" );
+    WriteFileBytes( Folder / "bad_01.png", "not a png" );
     VImageSequenceReader Reader;
     for( const std::string& rPath :
          { Folder / "bad_01.png", Folder / "absent_01.png", std::string( "/no/such/x_01.png" ) } )
@@ -232,7 +232,7 @@ namespace
   {
     VTempFolder Folder;
     for( const char* pFile : { "shot_0001.png", "shot_0002.png", "shot_0004.png" } )
-      WriteWholeFile( Folder / pFile, PngHeader() );
+      WriteFileBytes( Folder / pFile, PngHeader() );
     ASSERT_TRUE( WriteDescriptor( Folder / "shot.lumekimagesequence",
                                   MakeDescriptor( { "shot_%FRAME_NUMBER%.png", 8, 4, 10 } ) ) );
     VImageSequenceReader Reader;
@@ -312,7 +312,7 @@ namespace
       {
         const std::string Suffix = std::to_string( Frame ) + pExtension;
         const std::string Fixture = MakeImage( std::string( "sequence-" ) + pStored + Suffix, pStored, "48x32", Frame );
-        WriteWholeFile( Folder / ( "take_000" + Suffix ), ReadWholeFile( Fixture ) );
+        WriteFileBytes( Folder / ( "take_000" + Suffix ), ReadFileBytes( Fixture ) );
         Expected[Frame] = FfmpegDecode( Fixture, bGrey ? "gray" : "rgb24" );
         ASSERT_FALSE( Expected[Frame].empty() );
       }
@@ -355,7 +355,7 @@ namespace
   {
     VTempFolder Folder;
     for( const char* pName : { "t_00.png", "t_01.png", "t_0102030400.png" } )
-      WriteWholeFile( Folder / pName, std::string( "\x89PNG\r\n\x1a\n not really" ) );
+      WriteFileBytes( Folder / pName, std::string( "\x89PNG\r\n\x1a\n not really" ) );
     const VLogCapture Quiet;
     for( const char* pPattern : { "t_%FRAME%.png", "t_%TIMECODE%.png" } )
     {
@@ -378,7 +378,7 @@ namespace
             ReadAll( Reader );
         }
       // The same through a file: a cut descriptor on disk.
-      WriteWholeFile( Folder / "t.lumekimagesequence", VBytes( Bytes.begin(), Bytes.begin() + Bytes.size() / 2 ) );
+      WriteFileBytes( Folder / "t.lumekimagesequence", VBytes( Bytes.begin(), Bytes.begin() + Bytes.size() / 2 ) );
       EXPECT_FALSE( Reader.Open( Folder / "t.lumekimagesequence" ) );
     }
   }
@@ -393,7 +393,7 @@ namespace
          { std::pair( ".jpg", "yuvj420p" ), std::pair( ".png", "rgb24" ), std::pair( ".tiff", "rgb24" ) } )
     {
       SCOPED_TRACE( pExtension );
-      const VBytes Image = ReadWholeFile( MakeImage( std::string( "damaged" ) + pExtension, pPixelFormat, "24x16" ) );
+      const VBytes Image = ReadFileBytes( MakeImage( std::string( "damaged" ) + pExtension, pPixelFormat, "24x16" ) );
       ASSERT_FALSE( Image.empty() );
       const std::string Name = Folder / ( std::string( "d_0" ) + pExtension );
       // Steps that reach every part of a small file without a run per byte.
@@ -401,7 +401,7 @@ namespace
       VImageSequenceReader Reader;
       for( std::size_t Position = 0; Position <= Image.size(); Position += Step )
         for( const std::uint8_t Flip : { 0x00, 0xA5 } )
-          if( WriteWholeFile( Name, Damaged( Image, Position, Flip ) ) && Reader.Open( Name ) )
+          if( WriteFileBytes( Name, Damaged( Image, Position, Flip ) ) && Reader.Open( Name ) )
             ReadAll( Reader );
     }
   }

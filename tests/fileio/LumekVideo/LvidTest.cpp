@@ -245,12 +245,12 @@ namespace
   {
     VTempDir Dir;
     const std::string Path = Dir.File( "kept.lvid" );
-    ASSERT_TRUE( WriteFile( Path, VBytes{ 1, 2, 3 } ) );
+    ASSERT_TRUE( WriteFileBytes( Path, VBytes{ 1, 2, 3 } ) );
     LumekVideo::VWriter Writer;
     // Neither call may touch the file that is there.
     EXPECT_FALSE( Writer.Create( Path, ZOL::IVideoFrameInfo(), ZOL::IAudioFrameInfo(), {} ) );
     EXPECT_FALSE( Writer.Create( Path, s_SmallVideo, ZOL::IAudioFrameInfo(), {}, 0 ) );
-    EXPECT_EQ( ReadFile( Path ), ( VBytes{ 1, 2, 3 } ) );
+    EXPECT_EQ( ReadFileBytes( Path ), ( VBytes{ 1, 2, 3 } ) );
     EXPECT_FALSE( Writer.Create( Dir.File( "no/such/folder.lvid" ), s_SmallVideo, ZOL::IAudioFrameInfo(), {} ) );
 
     ASSERT_TRUE( Writer.Create( Path, s_SmallVideo, ZOL::IAudioFrameInfo(), {} ) );

@@ -5,6 +5,7 @@
 
 #include "fileio/LumekVideo/VReader.h"
 #include "fileio/LumekVideo/VWriter.h"
+#include "tests/support/Files.h"
 #include "utils/MemoryStream.h"
 #include "videointerface/AttributeRecords.h"
 #include "videointerface/IVideoAttributes.h"
@@ -254,16 +255,6 @@ namespace LumekVideoTest
     boost::system::error_code Error;
   };
 
-  inline bool WriteFile( const std::string& i_rPath, const VBytes& i_rBytes )
-  {
-    std::ofstream Stream( i_rPath, std::ios::binary | std::ios::trunc );
-    Stream.write( reinterpret_cast< const char* >( i_rBytes.data() ),
-                  static_cast< std::streamsize >( i_rBytes.size() ) );
-    return static_cast< bool >( Stream );
-  }
-  inline VBytes ReadFile( const std::string& i_rPath )
-  {
-    std::ifstream Stream( i_rPath, std::ios::binary );
-    return VBytes( std::istreambuf_iterator< char >( Stream ), std::istreambuf_iterator< char >() );
-  }
+  using LumekTest::ReadFileBytes;
+  using LumekTest::WriteFileBytes;
 } // namespace LumekVideoTest

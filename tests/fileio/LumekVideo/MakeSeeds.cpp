@@ -46,7 +46,7 @@ int main( int argc, char** argv )
       Seed += 2;
     }
     const VBytes Bytes = WriteToMemory( rSeed.Video, rSeed.Audio, Frames, rSeed.Alignment );
-    if( Bytes.empty() || !WriteFile( std::string( argv[1] ) + "/" + rSeed.Name, Bytes ) )
+    if( Bytes.empty() || !WriteFileBytes( std::string( argv[1] ) + "/" + rSeed.Name, Bytes ) )
     {
       std::cerr << "cannot write " << rSeed.Name << "\n";
       return 1;

@@ -33,7 +33,7 @@ namespace
     // One small JPEG for every MJPEG frame, made by ffmpeg.
     const std::string JPEGPath = FfmpegFixture( "mkv_frame.jpg", { "-f", "lavfi", "-i", "testsrc=size=16x8:rate=1",
                                                                    "-frames:v", "1", "-pix_fmt", "yuvj420p" } );
-    const VBytes JPEG = ReadWholeFile( JPEGPath );
+    const VBytes JPEG = ReadFileBytes( JPEGPath );
     ASSERT_FALSE( JPEG.empty() );
     // The case, and ffmpeg's names of its pixel format and audio codec.
     const std::tuple< VFamilyCase, const char*, const char* > Rows[] = {
@@ -149,7 +149,7 @@ namespace
     MkvIO::VMkvReader Reader;
     EXPECT_FALSE( Reader.Open( Folder / "absent.mkv" ) );
     EXPECT_TRUE( Log.Has( "File could not be opened." ) );
-    ASSERT_TRUE( WriteWholeFile( Path, std::string( 300, 'x' ) ) );
+    ASSERT_TRUE( WriteFileBytes( Path, std::string( 300, 'x' ) ) );
     EXPECT_FALSE( Reader.Open( Path ) );
     EXPECT_TRUE( Log.Has( "EbmlHead missing." ) );
   }
@@ -244,7 +244,7 @@ namespace
   TEST_F( MkvReader, SurvivesEveryCutAndFlip )
   {
     ASSERT_TRUE( WriteFamilyFile( Path, s_SmallCase ) );
-    const VBytes Original = ReadWholeFile( Path );
+    const VBytes Original = ReadFileBytes( Path );
     ASSERT_GT( Original.size(), 100u );
     const VLogCapture Quiet;
     for( std::size_t Position = 0; Position < Original.size(); ++Position )

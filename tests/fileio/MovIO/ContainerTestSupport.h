@@ -4,6 +4,7 @@
 // recording's description that either container carries in a QMDT part, and damaged files.
 
 #include "tests/support/FfmpegFixtures.h"
+#include "tests/support/Files.h"
 #include "tests/support/LogCapture.h"
 #include "utils/MemoryStream.h"
 #include "videointerface/AttributeRecords.h"
@@ -48,12 +49,7 @@ namespace ContainerTest
     return std::vector< std::vector< std::uint64_t > >( Groups.rbegin(), Groups.rend() );
   }
 
-  // The whole file's bytes; empty when it cannot be read.
-  inline VBytes ReadFile( const std::string& i_rPath )
-  {
-    std::ifstream In( i_rPath, std::ios::binary );
-    return VBytes( std::istreambuf_iterator< char >( In ), {} );
-  }
+  using LumekTest::ReadFileBytes;
 
   // ffmpeg's own demuxing of one stream ("v:0", "a:0"): the stored bytes of its packets.
   inline VBytes StreamCopy( const std::string& i_rPath, const std::string& i_rStream )
@@ -61,7 +57,7 @@ namespace ContainerTest
     const std::string Output = i_rPath + "." + i_rStream[0] + ".bin";
     LumekTest::RunCommand( "ffmpeg -y -v error -i " + LumekTest::ShellQuote( i_rPath ) + " -map 0:" + i_rStream +
                            " -c copy -f data " + LumekTest::ShellQuote( Output ) );
-    return ReadFile( Output );
+    return ReadFileBytes( Output );
   }
   // A Bayer GB 8 frame store and 100 Hz timing written to io_rAttributes, both stores serialised.
   inline VBytes BayerStores( int i_Width, int i_Height, ZOL::IVideoAttributes& io_rAttributes,

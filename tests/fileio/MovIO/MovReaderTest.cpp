@@ -214,7 +214,7 @@ TEST( MovAtomTree, DumpShowsTheTreeAndTheSizeOneOfA64BitMdat )
   ASSERT_TRUE( OpenBytes( Reader, Bytes ) );
   std::ostringstream Dump;
   ASSERT_TRUE( Reader.DumpFileStructure( Dump ) );
-  const VBytes Golden = ReadFile( MOV_GOLDEN_FOLDER "/dump-timecode-track.txt" );
+  const VBytes Golden = ReadFileBytes( MOV_GOLDEN_FOLDER "/dump-timecode-track.txt" );
   EXPECT_EQ( Dump.str(), std::string( Golden.begin(), Golden.end() ) );
 
   // A size past the file's end ends its container where the file ends, inside or outside.

@@ -121,10 +121,10 @@ namespace
   VBytes CorruptionFile( const std::string& i_rName )
   {
     if( i_rName == "FfmpegMjpegWithAudio" )
-      return ReadFile( FfmpegAvi(
+      return ReadFileBytes( FfmpegAvi(
           "CorruptMjpeg.avi", "-f lavfi -i sine=sample_rate=8000 -c:v mjpeg -c:a pcm_s16le -shortest -frames:v 3" ) );
     if( i_rName == "FfmpegH264" )
-      return ReadFile( FfmpegAvi( "CorruptH264.avi", "-c:v libx264 -bf 0 -frames:v 3" ) );
+      return ReadFileBytes( FfmpegAvi( "CorruptH264.avi", "-c:v libx264 -bf 0 -frames:v 3" ) );
     VAviSpec Spec = GreySpec( 6 );
     Spec.StandardIndexFrames = 4;
     Spec.AudioFormat = WaveFormat( 1, 2, 48000, 16 );
@@ -233,7 +233,7 @@ TEST( AviTree, OpensCountsAndDumpsAsTheRulesSay )
   Odd.ExtraMoviChunks = Chunk( "JUNK", VBytes( 3, 0 ) );
   std::ostringstream Text;
   ASSERT_TRUE( OpenAvi( BuildAvi( Odd ) ).pReader->DumpFileStructure( Text ) );
-  const VBytes Golden = ReadFile( AVI_GOLDEN_FOLDER "/dump-odd-junk.txt" );
+  const VBytes Golden = ReadFileBytes( AVI_GOLDEN_FOLDER "/dump-odd-junk.txt" );
   EXPECT_EQ( Text.str(), std::string( Golden.begin(), Golden.end() ) );
 
   // Bitmaps of positive height are stored bottom row first, whichever name they go by; the

@@ -67,7 +67,7 @@ namespace
     const VScratch Scratch;
     const std::string Clip = WriteRecording( Scratch, "clip.lvid", {} );
     const std::string Empty = WriteRecording( Scratch, "empty.lvid", { ZOL::PixelFormat_R8G8B8, 6, 4, {} } );
-    WriteFileBytes( Scratch.Path( "zero.lvid" ), {} );
+    WriteFileBytes( Scratch.Path( "zero.lvid" ), VBytes() );
     const std::string Absent = Scratch.Path( "absent.lvid" );
     const std::string Unopenable = "The video file could not be opened.\n";
     const std::string Sample = "lumekvideotool make-sample: ";

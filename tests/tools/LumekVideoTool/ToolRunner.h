@@ -5,6 +5,7 @@
 
 #include "fileio/LumekVideo/VWriter.h"
 #include "tests/support/FfmpegFixtures.h"
+#include "tests/support/Files.h"
 #include "tests/support/LogCapture.h"
 #include "tools/LumekVideoTool/FrameEncoding.h"
 #include "tools/LumekVideoTool/ToolCommands.h"
@@ -27,16 +28,8 @@ namespace LumekVideoToolTest
 {
   using VBytes = std::vector< std::uint8_t >;
 
-  inline VBytes ReadFileBytes( const std::string& i_rPath )
-  {
-    std::ifstream File( i_rPath, std::ios::binary );
-    return VBytes( std::istreambuf_iterator< char >( File ), std::istreambuf_iterator< char >() );
-  }
-  inline void WriteFileBytes( const std::string& i_rPath, const VBytes& i_rBytes )
-  {
-    std::ofstream File( i_rPath, std::ios::binary );
-    File.write( reinterpret_cast< const char* >( i_rBytes.data() ), static_cast< std::streamsize >( i_rBytes.size() ) );
-  }
+  using LumekTest::ReadFileBytes;
+  using LumekTest::WriteFileBytes;
 
   // A folder of its own for each test, removed at the end.
   struct VScratch
@@ -156,6 +149,9 @@ namespace LumekVideoToolTest
     Timecode.Hours = 1;
     ZOL::WriteTimecode( Attributes, Timecode );
     Attributes.Set( "Test.Note", "written by the tool's tests" );
+    // A camera and its lens, which a conversion must carry over.
+    ZOL::WriteCameraHardware( Attributes, { "urn:lumek:cam:7", "7", "V5", "Vantage 5", 64, 48, 1.0 } );
+    ZOL::WriteLensDistortionCalibration( Attributes, "", { ZOL::RadialModel_Lumek2Parameter, { 0.2, -0.05 }, 3, 2 } );
 
     const std::string Path = i_rScratch.Path( i_rName );
     LumekVideo::VWriter Writer;
