@@ -4,8 +4,10 @@
 // byte for byte with a golden copy.
 
 #include <cstdint>
+#include <filesystem>
 #include <fstream>
 #include <iterator>
+#include <random>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -30,4 +32,22 @@ namespace LumekTest
   {
     return WriteFileBytes( i_rPath, { reinterpret_cast< const char* >( i_rBytes.data() ), i_rBytes.size() } );
   }
+
+  // A folder of its own under the temporary folder, removed with everything in it.
+  class VTempFolder
+  {
+  public:
+    VTempFolder() { std::filesystem::create_directories( m_Path ); }
+    ~VTempFolder() { std::filesystem::remove_all( m_Path, m_Error ); }
+    VTempFolder( const VTempFolder& ) = delete;
+    VTempFolder& operator=( const VTempFolder& ) = delete;
+    std::string Path() const { return m_Path.string(); }
+    std::string File( const std::string& i_rName ) const { return ( m_Path / i_rName ).string(); }
+    std::string operator/( const std::string& i_rName ) const { return File( i_rName ); }
+
+  private:
+    std::error_code m_Error;
+    const std::filesystem::path m_Path =
+        std::filesystem::temp_directory_path() / ( "lumek-test-" + std::to_string( std::random_device()() ) );
+  };
 } // namespace LumekTest

@@ -5,6 +5,7 @@
 
 #include "services/Log.h"
 
+#include <algorithm>
 #include <string>
 #include <vector>
 
@@ -39,17 +40,13 @@ namespace LumekTest
 
     bool Has( const std::string& i_rMessage ) const
     {
-      for( const std::string& rMessage : Messages )
-        if( rMessage == i_rMessage )
-          return true;
-      return false;
+      return std::find( Messages.begin(), Messages.end(), i_rMessage ) != Messages.end();
     }
     bool Contains( const std::string& i_rText ) const
     {
-      for( const std::string& rMessage : Messages )
-        if( rMessage.find( i_rText ) != std::string::npos )
-          return true;
-      return false;
+      return std::any_of( Messages.begin(), Messages.end(),
+                          [&]( const std::string& rMessage )
+                          { return rMessage.find( i_rText ) != std::string::npos; } );
     }
 
     // Each record as its level and message: "2 Unsupported video payload format 'Unspecified'."

@@ -32,7 +32,7 @@ namespace
       EXPECT_EQ( ErrnoToResult( ENOSPC ), ZOL::Result_FileIOFailure );
       EXPECT_EQ( Log.Messages, std::vector< std::string >{ "Std error code: " + std::to_string( ENOSPC ) } );
     }
-    const LumekTest::VTemporaryFolder Folder;
+    const LumekTest::VTempFolder Folder;
     VFileInputStream Input;
     EXPECT_EQ( OpenInputStream( Folder.File( "absent.lvid" ), Input ), ZOL::Result_FileNotFound );
     EXPECT_EQ( OpenInputStream( Folder.Path(), Input ), ZOL::Result_InvalidType );
@@ -54,7 +54,7 @@ namespace
 
   TEST( FileStreams, WrittenBytesReadBack )
   {
-    const LumekTest::VTemporaryFolder Folder;
+    const LumekTest::VTempFolder Folder;
     const std::string Path = Folder.File( "round.bin" );
     const auto Bytes = LumekTest::PatternBytes( 10000 );
     {
@@ -87,7 +87,7 @@ namespace
   // replace a file unless asked.
   TEST( FileOperations, RemoveCopyAndMove )
   {
-    const LumekTest::VTemporaryFolder Folder;
+    const LumekTest::VTempFolder Folder;
     const std::string A = Folder.File( "a" ), B = Folder.File( "b" ), C = Folder.File( "c" );
     WriteText( A, "a" );
     WriteText( B, "b" );
@@ -119,7 +119,7 @@ namespace
     for( VReplace Replace : { &ReplaceFile, &ReplaceFileAtomic } )
     {
       SCOPED_TRACE( Replace == &ReplaceFile ? "ReplaceFile" : "ReplaceFileAtomic" );
-      const LumekTest::VTemporaryFolder Folder;
+      const LumekTest::VTempFolder Folder;
       const std::string Old = Folder.File( "out.lvid" ), New = Folder.File( "out.lvid.partial" ),
                         Backup = Folder.File( "out.lvid.bak" );
       WriteText( Old, "old" );
@@ -171,7 +171,7 @@ namespace
   // ten holders give no names at all.
   TEST( LockingProcesses, NamesEveryHolderAndOnlyTheWriterAsWriterNeverThisProcess )
   {
-    const LumekTest::VTemporaryFolder Folder;
+    const LumekTest::VTempFolder Folder;
     const std::string Path = Folder.File( "recording.lvid" );
     WriteText( Path, "abc" );
     std::vector< std::unique_ptr< VHolder > > Holders;

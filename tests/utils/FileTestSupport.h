@@ -2,6 +2,7 @@
 
 // Files and log lines for the file layer's tests.
 
+#include "tests/support/Files.h"
 #include "tests/support/LogCapture.h"
 
 #include <boost/filesystem.hpp>
@@ -10,19 +11,6 @@
 
 namespace LumekTest
 {
-  // A folder of its own for each test, removed with everything in it.
-  struct VTemporaryFolder
-  {
-    const boost::filesystem::path m_Path =
-        boost::filesystem::temp_directory_path() / boost::filesystem::unique_path( "fileio-%%%%-%%%%-%%%%" );
-    boost::system::error_code m_Error;
-
-    VTemporaryFolder() { boost::filesystem::create_directories( m_Path ); }
-    ~VTemporaryFolder() { boost::filesystem::remove_all( m_Path, m_Error ); }
-    std::string File( const std::string& i_rName ) const { return ( m_Path / i_rName ).string(); }
-    std::string Path() const { return m_Path.string(); }
-  };
-
   // Bytes that differ at every position within a page, so a byte read from the wrong offset shows.
   inline std::vector< std::uint8_t > PatternBytes( std::uint64_t i_Size )
   {

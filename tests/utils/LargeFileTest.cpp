@@ -24,7 +24,7 @@ namespace
 // Written past 4 GB through the class and read back through the system.
 TEST( LargeFile, PositionsBeyondFourGigabytesOnASparseFile )
 {
-  const LumekTest::VTemporaryFolder Folder;
+  const LumekTest::VTempFolder Folder;
   const std::string Path = Folder.File( "sparse.bin" );
   constexpr std::int64_t Size = 5ll << 30, Marker = ( 4ll << 30 ) + 12345;
   const int Descriptor = open( Path.c_str(), O_CREAT | O_RDWR | O_TRUNC, 0600 );
@@ -52,7 +52,7 @@ TEST( LargeFile, PositionsBeyondFourGigabytesOnASparseFile )
 // everything; a second open keeps the first file.
 TEST( LargeFile, AFailedReadStaysFailedUntilASeekAndAClosedFileFailsEverything )
 {
-  const LumekTest::VTemporaryFolder Folder;
+  const LumekTest::VTempFolder Folder;
   const std::string Path = Folder.File( "ten.bin" ), Other = Folder.File( "other.bin" );
   WriteText( Path, "0123456789" );
   WriteText( Other, "other" );

@@ -34,7 +34,7 @@ namespace
              io_rStream.Read( o_rBytes.data(), o_rBytes.size() );
     }
 
-    const LumekTest::VTemporaryFolder m_Folder;
+    const LumekTest::VTempFolder m_Folder;
     const std::string m_Path = m_Folder.File( "mapped.bin" );
     std::vector< std::uint8_t > m_Bytes;
   };

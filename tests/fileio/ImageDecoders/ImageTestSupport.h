@@ -36,24 +36,6 @@ namespace LumekTest
     return Bytes;
   }
 
-  // A fresh temporary folder that goes with everything in it.
-  class VTempFolder
-  {
-  public:
-    VTempFolder() { std::filesystem::create_directories( m_Path ); }
-    ~VTempFolder() { std::filesystem::remove_all( m_Path, m_Error ); }
-    VTempFolder( const VTempFolder& ) = delete;
-    VTempFolder& operator=( const VTempFolder& ) = delete;
-    const std::string& Path() const { return m_Path; }
-    std::string operator/( const std::string& i_rName ) const { return m_Path + "/" + i_rName; }
-
-  private:
-    std::error_code m_Error;
-    std::string m_Path =
-        ( std::filesystem::temp_directory_path() / ( "lumek-test-" + std::to_string( std::random_device()() ) ) )
-            .string();
-  };
-
   inline VBytes Bytes( const ZOL::IBufferConst& i_rBuffer )
   {
     return VBytes( i_rBuffer.GetData(), i_rBuffer.GetData() + i_rBuffer.GetSize() );

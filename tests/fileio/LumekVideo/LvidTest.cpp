@@ -119,7 +119,7 @@ namespace
         { 100000, PatternBytes( 15, 2 ), PatternBytes( 8, 3 ) },
         { 3, PatternBytes( 15, 4 ), {} }, // no sound in a recording with sound
     };
-    VTempDir Dir;
+    VTempFolder Dir;
     const std::string Path = Dir.File( "large.lvid" );
     {
       // Never closed: destruction finishes the recording.
@@ -243,7 +243,7 @@ namespace
 
   TEST( LvidWriter, RefusesWhatItCannotRecordAndFailsCloseOnAFullDisc )
   {
-    VTempDir Dir;
+    VTempFolder Dir;
     const std::string Path = Dir.File( "kept.lvid" );
     ASSERT_TRUE( WriteFileBytes( Path, VBytes{ 1, 2, 3 } ) );
     LumekVideo::VWriter Writer;
@@ -276,7 +276,7 @@ namespace
 
     LumekVideo::VReader Reader;
     EXPECT_FALSE( Reader.Open( Dir.File( "missing.lvid" ) ) );
-    EXPECT_FALSE( Reader.Open( Dir.Path.string() ) );
+    EXPECT_FALSE( Reader.Open( Dir.Path() ) );
     ASSERT_TRUE( Reader.Open( Path ) );
     EXPECT_EQ( Reader.GetFrameCount(), 1u );
   }

@@ -244,17 +244,7 @@ namespace LumekVideoTest
     return Result;
   }
 
-  // A folder of its own under the temp folder, removed with everything in it.
-  struct VTempDir
-  {
-    VTempDir() { boost::filesystem::create_directories( Path ); }
-    ~VTempDir() { boost::filesystem::remove_all( Path, Error ); }
-    std::string File( const std::string& i_rName ) const { return ( Path / i_rName ).string(); }
-    const boost::filesystem::path Path =
-        boost::filesystem::temp_directory_path() / boost::filesystem::unique_path( "lvid-test-%%%%-%%%%-%%%%" );
-    boost::system::error_code Error;
-  };
-
   using LumekTest::ReadFileBytes;
+  using LumekTest::VTempFolder;
   using LumekTest::WriteFileBytes;
 } // namespace LumekVideoTest
