@@ -337,6 +337,11 @@ namespace
     const VBytes Input = { 0xAA, 0, 0, 1, 0x09, 0xF0, 0, 0, 0, 1, 0x67, 0x42, 0, 0, 1, 0x68 };
     EXPECT_EQ( Bytes( *Prefixed( Input ) ), JoinNALUnits( { { 0x09, 0xF0 }, { 0x67, 0x42 }, { 0x68 } }, true ) );
 
+    // A list of one buffer is handed back uncopied; the shared start code is 00 00 00 01.
+    VBufferList One = { StartCodeBuffer() };
+    EXPECT_EQ( JoinBuffers( One, *s_pAllocator ), StartCodeBuffer() );
+    EXPECT_EQ( Bytes( *StartCodeBuffer() ), ( VBytes{ 0, 0, 0, 1 } ) );
+
     // Lengths that do not walk exactly to the end are refused, at every cut.
     std::shared_ptr< ZOL::IBuffer > pOut;
     EXPECT_TRUE( LengthPrefixedToAnnexB( nullptr, 0, pOut, *s_pAllocator ) && pOut && pOut->GetSize() == 0 );

@@ -280,6 +280,7 @@ TEST( MovFfmpeg, MatchesFfprobeAndFfmpeg )
     MovIO::VMovReader Reader;
     ASSERT_TRUE( Reader.Open( Path ) ) << testing::PrintToString( Log.Lines() );
     EXPECT_EQ( Reader.GetFrameCount(), std::stoull( Probe( Path, "stream=nb_frames" ) ) );
+    EXPECT_EQ( Reader.FindStoredFrameAtOrBefore( 1u << 30 ), std::optional( Reader.GetFrameCount() - 1 ) );
     EXPECT_EQ( Reader.GetVideoPayload(), rCase.Payload );
     EXPECT_EQ( Reader.GetVideoFrameInfo().ImageWidth, 64 );
     EXPECT_EQ( Reader.GetVideoFrameInfo().ImageHeight, 48 );
